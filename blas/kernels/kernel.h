@@ -1,0 +1,31 @@
+// How a kernel source names what it defines.
+//
+// Every source below blas/kernels is compiled once per tier, with QTB_TIER set to the tier's name. All of it stands in
+// namespace qtb::QTB_TIER { namespace { ... } }, except the named procedures, which QTB_KERNEL defines.
+#pragma once
+
+#include "blas/shapes.h"
+#include "blas/tiers.h"
+
+#if !defined(QTB_TIER)
+#error "a kernel source is compiled per tier: QTB_TIER names the tier"
+#endif
+
+#define QTB_TIER_PASTE(left, tier, right) left##tier##right
+#define QTB_TIER_EXPAND(left, tier, right) QTB_TIER_PASTE(left, tier, right)
+
+// qtb_blas_<tier>_<name>.
+#define QTB_TIER_NAME(name) QTB_TIER_EXPAND(qtb_blas_, QTB_TIER, _##name)
+
+namespace qtb::QTB_TIER {
+namespace {
+// The tier of this build, for if constexpr.
+constexpr ProcessorTier this_tier = QTB_TIER_EXPAND(tier_, QTB_TIER, );
+}  // namespace
+}  // namespace qtb::QTB_TIER
+
+// The procedure qtb_blas_<tier>_x<name> of a shape and type, whose body is a call of body with the same arguments.
+// In parentheses a body may hold commas: QTB_KERNEL(daxpy, axpy, double, (update<double, 4>)).
+#define QTB_KERNEL(name, shape, T, body)                                \
+  extern "C" QTB_HIDDEN QTB_FUNCTION(shape, T, QTB_TIER_NAME(x##name)); \
+  extern "C" QTB_FUNCTION(shape, T, QTB_TIER_NAME(x##name)) { return body(QTB_ARGS(shape)); }

@@ -1,0 +1,20 @@
+# The tiers' instruction sets. Flags stand here and nowhere else; blas/tiers.h has the list of tiers in the same order.
+#
+# -mno-popcnt and its kin keep out what a compiler would add on its own to the instruction set that the tier names.
+set(QTB_TIERS def sse3 ssse3 sse42 avx)
+set(QTB_TIER_FLAGS_def   -march=x86-64)
+set(QTB_TIER_FLAGS_sse3  -march=x86-64 -msse3)
+set(QTB_TIER_FLAGS_ssse3 -march=x86-64 -mssse3)
+set(QTB_TIER_FLAGS_sse42 -march=x86-64 -msse4.2 -mno-popcnt -mno-crc32)
+# The avx tier's kernels are those of sse42; only the double-precision GEMM kernel is built with the wider encoding.
+set(QTB_TIER_FLAGS_avx   -march=x86-64 -msse4.2 -mno-popcnt -mno-crc32)
+
+# qtb_add_tiers(source...): one object library qtb_<tier> per tier, each of all the sources.
+function(qtb_add_tiers)
+  foreach(tier IN LISTS QTB_TIERS)
+    add_library(qtb_${tier} OBJECT ${ARGN})
+    target_link_libraries(qtb_${tier} PRIVATE qtb_options)
+    target_compile_definitions(qtb_${tier} PRIVATE QTB_TIER=${tier})
+    target_compile_options(qtb_${tier} PRIVATE ${QTB_TIER_FLAGS_${tier}} -fno-exceptions -fno-rtti)
+  endforeach()
+endfunction()

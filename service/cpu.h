@@ -1,0 +1,24 @@
+// Which processor this is, as far as the library asks: the tier, and the tests behind it.
+#pragma once
+
+#include "blas/tiers.h"
+#include "blas/types.h"
+
+extern "C" {
+
+// The tier of this process, 0 to 4 (ProcessorTier). Decided at the first call, from QTB_DEBUG_CPU_TYPE or the
+// processor, and kept; later calls are a load and a test. Never fails.
+QTB_HIDDEN ProcessorTier qtb_serv_cpu_detect();
+
+// Tests of the processor, each 1 or 0, each asking the processor anew.
+QTB_HIDDEN int qtb_serv_cpu_is_belmo();
+QTB_HIDDEN int qtb_serv_cpu_has_avx();
+QTB_HIDDEN int qtb_serv_cpu_has_sse42();
+QTB_HIDDEN int qtb_serv_cpu_has_sse41();
+QTB_HIDDEN int qtb_serv_cpu_has_ssse3();
+QTB_HIDDEN int qtb_serv_cpu_has_sse3();
+
+// 1 on the vendor "AuthenticAMD" with base family 15 and extended family 1; cached after the first call.
+QTB_HIDDEN int qtb_serv_cpu_is_amd_family16();
+
+}  // extern "C"

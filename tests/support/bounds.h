@@ -1,0 +1,66 @@
+// Error bounds: how far a result may lie from the oracle's, and how far it did.
+//
+// An error passes if it is at most c*u*gauge + c*eta*max(1, |alpha|): u the unit roundoff, eta the smallest subnormal,
+// gauge the sum of the magnitudes of what was added, and c the number of roundings, derived for any order of summation.
+// Where the gauge reaches a quarter of the overflow limit only the class (finite, infinite, NaN) is compared.
+#pragma once
+
+#include <cmath>
+#include <limits>
+
+#include "blas/types.h"
+
+namespace qtb::test {
+
+using Quad = __float128;  // the oracle's arithmetic: 113 bits
+
+template <class T>
+inline constexpr double unit_roundoff = std::numeric_limits<Real<T>>::epsilon() / 2;
+
+inline Quad magnitude(Quad v) { return v < 0 ? -v : v; }
+inline bool is_nan(Quad v) { return v != v; }
+
+// A complex number of the oracle; of a real result im is 0.
+struct QuadComplex {
+  Quad re = 0, im = 0;
+};
+inline Quad magnitude(QuadComplex v) { return magnitude(v.re) + magnitude(v.im); }
+
+template <class T>
+QuadComplex widen(T v) {
+  if constexpr (is_complex<T>)
+    return {Quad(v.re), Quad(v.im)};
+  else
+    return {Quad(v), 0};
+}
+
+// error / bound of one real result: at most 1 passes. Infinite where the class differs.
+template <class R>
+double error_ratio(R got, Quad want, Quad gauge, double c, double alpha_magnitude = 1) {
+  const double overflow = static_cast<double>(std::numeric_limits<R>::max());
+  if (is_nan(gauge) || gauge >= Quad(overflow) / 4 || is_nan(want)) {
+    const bool want_nan = is_nan(want), got_nan = std::isnan(got);
+    const bool want_finite = !want_nan && magnitude(want) <= Quad(overflow);
+    if (want_nan != got_nan) return std::numeric_limits<double>::infinity();
+    if (!want_nan && want_finite != static_cast<bool>(std::isfinite(got))) return std::numeric_limits<double>::infinity();
+    return 0;
+  }
+  if (!std::isfinite(got)) return std::numeric_limits<double>::infinity();
+  const Quad error = magnitude(Quad(got) - want);
+  if (error == 0) return 0;
+  const Quad eta = Quad(std::numeric_limits<R>::denorm_min());
+  const Quad bound = Quad(c) * Quad(unit_roundoff<R>) * gauge + Quad(c) * eta * Quad(alpha_magnitude > 1 ? alpha_magnitude : 1);
+  return static_cast<double>(error / bound);
+}
+
+// The same for a result of any type: the larger ratio of its parts.
+template <class T>
+double error_ratio(T got, QuadComplex want, Quad gauge, double c, double alpha_magnitude = 1) {
+  if constexpr (is_complex<T>)
+    return std::fmax(error_ratio(got.re, want.re, gauge, c, alpha_magnitude),
+                     error_ratio(got.im, want.im, gauge, c, alpha_magnitude));
+  else
+    return error_ratio(got, want.re, gauge, c, alpha_magnitude);
+}
+
+}  // namespace qtb::test

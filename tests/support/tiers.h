@@ -1,0 +1,31 @@
+// Every tier's implementation of a routine, for tests that call tiers directly.
+#pragma once
+
+#include "blas/dispatch/slots.h"
+
+namespace qtb::test {
+
+inline const char *tier_name(int tier) {
+#define QTB_TIER_TEXT(name, NAME) #name,
+  static const char *const names[] = {QTB_FOR_EACH_TIER(QTB_TIER_TEXT)};
+#undef QTB_TIER_TEXT
+  return names[tier];
+}
+
+// Whether this processor has the instructions of a tier, whatever its vendor.
+inline bool processor_runs(int tier) {
+  switch (tier) {
+    case tier_sse3: return __builtin_cpu_supports("sse3");
+    case tier_ssse3: return __builtin_cpu_supports("ssse3");
+    case tier_sse42: return __builtin_cpu_supports("sse4.2");
+    case tier_avx: return __builtin_cpu_supports("avx");
+    default: return true;
+  }
+}
+
+// QTB_ALL_TIERS(daxpy): an initialiser of an array over tiers with the five implementations of a routine that all tiers
+// have. Only the named procedures are linked.
+#define QTB_TIER_PROCEDURE(tier, TIER, name) qtb_blas_##tier##_x##name,
+#define QTB_ALL_TIERS(name) {QTB_FOR_EACH_TIER(QTB_TIER_PROCEDURE, name)}
+
+}  // namespace qtb::test
