@@ -13,10 +13,17 @@ set(QTB_CORE_SOURCES
   # thread
   blas/thread/forward.cpp
   # service
+  service/cache.cpp
+  service/cores.cpp
+  service/cpu.cpp
+  service/memory.cpp
+  service/thread_settings.cpp
+  service/threads.cpp
 )
 
 # The operating system behind service/platform/platform.h.
 set(QTB_PLATFORM_SOURCES
+  service/platform/linux.cpp
 )
 
 file(GLOB_RECURSE qtb_found RELATIVE ${PROJECT_SOURCE_DIR} CONFIGURE_DEPENDS

@@ -1,7 +1,7 @@
 // What the library asks of the operating system and of the processor, behind one header.
 //
-// linux.cpp implements it; tests link tests/platform/fake.cpp in its place, and so can be any processor with any caches,
-// environment and affinity. Nothing here keeps state for the library, and nothing throws.
+// linux.cpp implements it; tests link tests/platform/fake.cpp in its place, and so can be any processor with any
+// caches, environment and affinity. Nothing here keeps state for the library, and nothing throws.
 #pragma once
 
 #include <cstddef>
@@ -25,23 +25,30 @@ std::size_t platform_environment(const char *name, char *buffer, std::size_t siz
 
 // ---- Thread-local words ----
 
-// Creates a word that is null in every thread, also in threads that start later, and that outlives no clean-up: nothing
-// runs at thread exit. Returns its index, or -1 where the system has none left.
+// Creates a word that is null in every thread, also in threads that start later. Nothing is done about its value when a
+// thread ends. Returns its index, or -1 where the system has none left; a word of index -1 reads as null.
 std::int32_t platform_tls_create();
 void *platform_tls_get(std::int32_t index);
 void platform_tls_set(std::int32_t index, void *value);
 
 // ---- Processors and affinity ----
 
-// A set of logical processors, one bit each, as wide as the machine: bit p of words[p / 64] is processor p.
+// A set of logical processors, one bit each: bit p % 64 of words[p / 64] is processor p.
 struct ProcessorSet {
   static constexpr int word_bits = 64;
-  static constexpr int max_words = 64;  // 4096 processors
+  static constexpr int max_words = 128;
+  static constexpr int capacity = max_words * word_bits;  // 8192, the most that a Linux kernel is built for on x86
+
   std::uint64_t words[max_words];
+
+  bool contains(int p) const { return (words[p / word_bits] >> (p % word_bits) & 1) != 0; }
+  void insert(int p) { words[p / word_bits] |= std::uint64_t{1} << (p % word_bits); }
+  bool operator==(const ProcessorSet &) const = default;
 };
 
 // The processors that the process was given, and those that are online. The first is what the process was given also
-// when the OpenMP runtime has bound its first thread to fewer. Returns false where the system does not tell.
+// where its threads, or the OpenMP runtime on their behalf, have bound themselves to fewer. Returns false, with nothing
+// written, where the system does not tell.
 bool platform_processors(ProcessorSet *process, ProcessorSet *online);
 
 // Binds the calling thread to a set of processors. Returns false, with nothing changed, where that is refused.
@@ -52,7 +59,9 @@ void platform_yield();
 
 // ---- Libraries ----
 
-// Loads a library by file name from the system's search path, never from the working directory. Null if absent.
+// Loads a library by plain file name from the system's search path. Null if absent, and also, with nothing looked for,
+// while an entry of that path is empty or relative: such an entry stands for the working directory of the moment, and
+// whoever may write there could plant a library.
 void *platform_load_library(const char *name);
 void *platform_library_symbol(void *library, const char *name);
 void platform_unload_library(void *library);
@@ -71,9 +80,10 @@ bool platform_catalog_message(void *catalog, std::int32_t number, char *buffer, 
 
 // ---- Fork ----
 
-// 1 in a process that was forked while its parent had more than one thread: the OpenMP runtime's threads do not exist
-// there, and a parallel region may never return. 0 elsewhere.
-int platform_forked_from_threads();
-
-// Has before called ahead of every fork, after behind it in both processes. Called once.
+// Has before called ahead of every fork, and after behind it in both processes. Called once, at load.
 void platform_at_fork(void (*before)(), void (*after)());
+
+// 1 in a process that was forked, after platform_at_fork, while its parent had more than one thread, and in all that
+// descend from it: the OpenMP runtime's threads do not exist there, and a parallel region may never return. 0
+// elsewhere.
+int platform_forked_from_threads();

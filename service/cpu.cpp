@@ -1,0 +1,84 @@
+// The tier of the process, decided once, and the tests of the processor behind it.
+//
+// There is no lock: threads that race on the first call run the whole decision, from the same inputs, and store the
+// same value.
+
+#include "service/cpu.h"
+
+#include <atomic>
+#include <cstdlib>
+
+#include "service/cpuid.h"
+#include "service/platform/platform.h"
+
+namespace {
+
+using namespace qtb::cpuid;
+
+constexpr std::int32_t no_override = -666;  // outside every value that atoi's result may set the tier to
+
+std::atomic<std::int32_t> cached_tier{-1};        // negative until decided
+std::atomic<std::int32_t> avx_enabled{-1};        // -1 not looked at, 0 off, 1 on: the avx tier is never taken unasked
+std::atomic<std::int32_t> amd_family_cached{-1};  // -1 until tested
+
+constexpr auto relaxed = std::memory_order_relaxed;
+
+std::uint32_t feature_bits() { return platform_cpuid(leaf_features, 0).ecx; }
+
+// The tier that QTB_DEBUG_CPU_TYPE asks for, or no_override. A number may be followed by anything, except that 0 has to
+// stand alone: every text without a number reads as 0.
+std::int32_t tier_override() {
+  char text[32];
+  if (platform_environment("QTB_DEBUG_CPU_TYPE", text, sizeof text) == 0) return no_override;
+  const std::int32_t number = std::atoi(text);
+  if (number == 0) return text[0] == '0' && text[1] == '\0' ? 0 : no_override;
+  return number > 0 && number < tier_count ? number : no_override;
+}
+
+std::int32_t tier_of_processor() {
+  if (!qtb_serv_cpu_is_belmo()) return tier_def;
+  if (avx_enabled.load(relaxed) == 1 && qtb_serv_cpu_has_avx()) return tier_avx;
+  if (qtb_serv_cpu_has_sse42()) return tier_sse42;
+  if (qtb_serv_cpu_has_ssse3()) return tier_ssse3;
+  if (qtb_serv_cpu_has_sse3()) return tier_sse3;
+  return tier_def;
+}
+
+}  // namespace
+
+// The override wins on every processor, also where the instructions are missing: who sets it knows better.
+ProcessorTier qtb_serv_cpu_detect() {
+  const std::int32_t known = cached_tier.load(relaxed);
+  if (known >= 0) return static_cast<ProcessorTier>(known);
+
+  const std::int32_t asked = tier_override();
+  if (avx_enabled.load(relaxed) == -1) avx_enabled.store(0, relaxed);
+  if (asked == tier_avx) avx_enabled.store(1, relaxed);
+  const std::int32_t computed = tier_of_processor();
+  const std::int32_t tier = asked != no_override ? asked : computed;
+  cached_tier.store(tier, relaxed);
+  return static_cast<ProcessorTier>(tier);
+}
+
+int qtb_serv_cpu_is_belmo() { return vendor_is(platform_cpuid(leaf_vendor, 0), vendor_belmo); }
+
+// Bit 27 says that the operating system saves the extended state, bit 28 that the processor has AVX. Either one counts.
+int qtb_serv_cpu_has_avx() { return bits(feature_bits(), 27, 28) != 0; }
+int qtb_serv_cpu_has_sse42() { return bits(feature_bits(), 20, 20) != 0; }
+int qtb_serv_cpu_has_sse41() { return bits(feature_bits(), 19, 19) != 0; }
+int qtb_serv_cpu_has_ssse3() { return bits(feature_bits(), 9, 9) != 0; }
+int qtb_serv_cpu_has_sse3() { return bits(feature_bits(), 0, 0) != 0; }
+
+// A reader that comes while the first caller still tests may see 0, and takes the ordinary path that once.
+int qtb_serv_cpu_is_amd_family16() {
+  const std::int32_t known = amd_family_cached.load(relaxed);
+  if (known != -1) return known;
+
+  amd_family_cached.store(0, relaxed);
+  if (!vendor_is(platform_cpuid(leaf_vendor, 0), vendor_amd)) return 0;
+  const std::uint32_t signature = platform_cpuid(leaf_features, 0).eax;
+  constexpr std::uint32_t base_family = 15, extended_family = 1;  // the family is their sum
+  if (bits(signature, 8, 11) != base_family || bits(signature, 20, 27) != extended_family) return 0;
+  amd_family_cached.store(1, relaxed);
+  return 1;
+}
