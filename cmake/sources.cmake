@@ -9,7 +9,12 @@ set(QTB_CORE_SOURCES
   # dispatch
   blas/dispatch/slots.cpp
   # entry
+  blas/entry/checks.cpp
   blas/entry/entries.cpp
+  blas/entry/load.cpp
+  blas/entry/lsame.cpp
+  blas/entry/version.cpp
+  blas/entry/xerbla.cpp
   # thread
   blas/thread/forward.cpp
   # service
@@ -19,11 +24,13 @@ set(QTB_CORE_SOURCES
   service/memory.cpp
   service/thread_settings.cpp
   service/threads.cpp
+  service/messages.cpp
 )
 
 # The operating system behind service/platform/platform.h.
 set(QTB_PLATFORM_SOURCES
   service/platform/linux.cpp
+  service/platform/linux_messages.cpp
 )
 
 file(GLOB_RECURSE qtb_found RELATIVE ${PROJECT_SOURCE_DIR} CONFIGURE_DEPENDS

@@ -18,10 +18,10 @@ extern "C" {
 #define QTB_CALL_CHECK_DRIVER(name, shape) \
   if (qtb_blas_errchk_##name(QTB_ARGS(shape)) == 0) qtb_blas_##name(QTB_ARGS(shape));
 
-#define QTB_ROUTINE(name, NAME, shape, T, route)                                        \
-  QTB_EXPORT QTB_FUNCTION(shape, T, name);                                              \
-  QTB_FUNCTION(shape, T, name) { QTB_CALL_##route(name, shape) }                        \
-  QTB_EXPORT QTB_FUNCTION(shape, T, NAME) QTB_SAME_ROUTINE(name);
+#define QTB_ROUTINE(name, NAME, shape, T, route)                  \
+  QTB_EXPORT QTB_FUNCTION(shape, T, name);                        \
+  QTB_EXPORT QTB_FUNCTION(shape, T, NAME) QTB_SAME_ROUTINE(name); \
+  QTB_FUNCTION(shape, T, name) { QTB_CALL_##route(name, shape) }
 #include "blas/routines.def"
 #undef QTB_ROUTINE
 
