@@ -2,6 +2,16 @@
 
 # Compiled once per tier.
 set(QTB_KERNEL_SOURCES
+  # level1
+  blas/kernels/level1/asum.cpp
+  blas/kernels/level1/extended_dot.cpp
+  blas/kernels/level1/iamax.cpp
+  blas/kernels/level1/nrm2.cpp
+  blas/kernels/level1/rot.cpp
+  blas/kernels/level1/rotg.cpp
+  blas/kernels/level1/rotm.cpp
+  blas/kernels/level1/rotmg.cpp
+  blas/kernels/level1/sparse.cpp
 )
 
 # Compiled once.

@@ -1,0 +1,136 @@
+// Sums of magnitudes: sum of |x[i]|, for complex elements of |re| + |im|. x is read only, at any address. n below 1
+// gives 0.
+//
+// Contiguous vectors (increments 1 and -1) go by vectors whose sign bits are masked off, in four accumulators in
+// rotation. Other increments go one element at a time from the start of the walk; 0 adds element 0 n times.
+
+#include "blas/kernels/simd/scalar.h"
+#include "blas/kernels/simd/vec.h"
+
+namespace qtb::QTB_TIER {
+namespace {
+
+// Elements of the main loop per pass:        def sse3 ssse3 sse42 avx
+constexpr QtbInt dasum_block[tier_count] = {16, 16, 32, 32, 32};
+constexpr QtbInt sasum_block[tier_count] = {32, 32, 32, 64, 64};
+template <class T>
+constexpr QtbInt asum_block = sizeof(T) == sizeof(double) ? dasum_block[this_tier] : sasum_block[this_tier];
+
+// Whether this tier's processors want vectors on their boundary; the others read them wherever they are.
+constexpr bool peels = this_tier < tier_sse42;
+
+constexpr QtbInt accumulators = 4;
+
+// Whether x takes the vector loop: an address that peeling cannot bring to the boundary goes one element at a time, and
+// so do in every tier doubles that straddle their own width.
+template <class T>
+bool takes_vectors(const T *x) {
+  return element_aligned(x) || !(peels || sizeof(T) == sizeof(double));
+}
+
+inline __m128 load_magnitudes(const float *p) {
+  return _mm_andnot_ps(broadcast(-0.0F), peels ? load_aligned(p) : load_unaligned(p));
+}
+inline __m128d load_magnitudes(const double *p) {
+  return _mm_andnot_pd(broadcast(-0.0), peels ? load_aligned(p) : load_unaligned(p));
+}
+
+inline float sum_of_lanes(__m128 v) {
+#if defined(__SSE3__)
+  const __m128 pairs = _mm_hadd_ps(v, v);
+  return _mm_cvtss_f32(_mm_hadd_ps(pairs, pairs));
+#else
+  const __m128 pairs = add(v, _mm_movehl_ps(v, v));
+  return _mm_cvtss_f32(_mm_add_ss(pairs, _mm_shuffle_ps(pairs, pairs, _MM_SHUFFLE(1, 1, 1, 1))));
+#endif
+}
+inline double sum_of_lanes(__m128d v) {
+#if defined(__SSE3__)
+  return _mm_cvtsd_f64(_mm_hadd_pd(v, v));
+#else
+  return _mm_cvtsd_f64(_mm_add_sd(v, _mm_unpackhi_pd(v, v)));
+#endif
+}
+
+template <QtbInt count, class T>
+void add_vectors(Vec<T> (&sum)[accumulators], const T *x) {
+  for (QtbInt k = 0; k < count / lanes<T>; ++k)
+    sum[k % accumulators] = add(sum[k % accumulators], load_magnitudes(x + k * lanes<T>));
+}
+
+// The vectors of what is left of n elements at x below a block of 2 * half, by halves. Returns where they end.
+template <QtbInt half, class T>
+const T *add_remainder(Vec<T> (&sum)[accumulators], QtbInt n, const T *x) {
+  if constexpr (half >= lanes<T>) {
+    if (n & half) {
+      add_vectors<half>(sum, x);
+      x += half;
+    }
+    return add_remainder<half / 2>(sum, n, x);
+  } else {
+    return x;
+  }
+}
+
+template <class T>
+T sum_contiguous(QtbInt n, const T *x) {
+  constexpr QtbInt block = asum_block<T>;
+  T singles = 0;
+  if constexpr (peels)
+    for (; n > 0 && phase(x) != 0; --n, ++x) singles += absolute(element(x));
+  Vec<T> sum[accumulators] = {zero<T>(), zero<T>(), zero<T>(), zero<T>()};
+  for (; n >= block; n -= block, x += block) add_vectors<block>(sum, x);
+  x = add_remainder<block / 2>(sum, n, x);
+  for (n %= lanes<T>; n > 0; --n, ++x) singles += absolute(element(x));
+  return sum_of_lanes(add(add(add(sum[0], sum[1]), sum[2]), sum[3])) + singles;
+}
+
+template <class T>
+T sum_strided(QtbInt n, const T *x, QtbInt inc) {
+  T sum = 0;
+  for (x = walk_start(x, n, inc); n > 0; --n, x += inc) sum += absolute(element(x));
+  return sum;
+}
+
+template <class T>
+T sum_real(const QtbInt *n, const T *x, const QtbInt *incx) {
+  const QtbInt inc = *incx;
+  if (*n < 1) return 0;
+  if (inc != 1 && inc != -1) return sum_strided(*n, x, inc);
+  return takes_vectors(x) ? sum_contiguous(*n, x) : sum_strided(*n, x, 1);
+}
+
+template <class T>
+Real<T> sum_complex(const QtbInt *n, const T *x, const QtbInt *incx) {
+  using R = Real<T>;
+  QtbInt count = *n;
+  const QtbInt inc = *incx;
+  if (count < 1) return 0;
+  if (inc == 1) {
+    const QtbInt reals = 2 * count;
+    return sum_real(&reals, parts(x), incx);
+  }
+  const R *p = parts(walk_start(x, count, inc));
+  const QtbInt step = 2 * inc;
+  R first = 0, second = 0;  // two chains of additions
+  for (; count >= 2; count -= 2, p += 2 * step) {
+    first += absolute(element(p));
+    first += absolute(element(p + 1));
+    second += absolute(element(p + step)) + absolute(element(p + step + 1));
+  }
+  R sum = first + second;
+  if (count != 0) {
+    sum += absolute(element(p));
+    sum += absolute(element(p + 1));
+  }
+  return sum;
+}
+
+}  // namespace
+
+QTB_KERNEL(sasum, norm, float, sum_real)
+QTB_KERNEL(dasum, norm, double, sum_real)
+QTB_KERNEL(scasum, norm, cfloat, sum_complex)
+QTB_KERNEL(dzasum, norm, cdouble, sum_complex)
+
+}  // namespace qtb::QTB_TIER
