@@ -11,6 +11,8 @@ set(QTB_CORE_SOURCES
   # entry
   blas/entry/entries.cpp
   # thread
+  blas/thread/32e/level1/xf_l1.cpp
+  blas/thread/32e/level1/xf_l1_omp.cpp
   blas/thread/forward.cpp
   # service
   service/cache.cpp
