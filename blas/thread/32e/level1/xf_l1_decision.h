@@ -32,7 +32,7 @@ struct Level1Limits {
   QtbInt mid_n;  // from low_n to here: 4 threads at most
 };
 
-// The limit of the routines that two threads saturate memory with: two threads or one.
+// The limit of the routines that take two threads or one, whatever the length and the number of threads.
 struct Level1PairLimits {
   QtbInt min_n;  // shorter vectors run on the caller's thread
 };
