@@ -15,7 +15,7 @@ namespace {
 // This process's answers to the decision's questions.
 struct ThisProcess {
   static ProcessorTier tier() { return qtb_serv_cpu_detect(); }
-  static std::int32_t max_threads() { return qtb_serv_get_max_threads(1); }
+  static std::int32_t max_threads() { return qtb_serv_get_max_threads(domain_blas); }
   static std::int32_t dynamic() { return qtb_serv_get_dynamic(); }
   static void cache_sizes(std::uint32_t *table) { qtb_serv_get_cache_sizes(table); }
 };

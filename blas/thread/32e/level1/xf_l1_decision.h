@@ -6,13 +6,14 @@
 //   ProcessorTier tier()             the processor tier
 //   std::int32_t max_threads()       the largest number of threads that this call may use
 //   std::int32_t dynamic()           1 in dynamic mode
-//   void cache_sizes(std::uint32_t *table)   the five numbers of the cache table
+//   void cache_sizes(std::uint32_t *table)   the cache table, cache_size_entries numbers
 #pragma once
 
 #include <cstdint>
 
 #include "blas/tiers.h"
 #include "blas/types.h"
+#include "service/cache.h"
 
 namespace qtb {
 
@@ -56,8 +57,9 @@ inline constexpr QtbInt level1_serial = 1;
 inline constexpr std::int32_t small_second_level_cache = 3 * 1024 * 1024;
 
 // A table of no levels tells nothing. Sizes are compared as signed numbers.
-inline bool has_small_second_level(const std::uint32_t (&cache_table)[5]) {
-  return cache_table[0] != 0 && static_cast<std::int32_t>(cache_table[2]) <= small_second_level_cache;
+inline bool has_small_second_level(const std::uint32_t *cache_table) {
+  return cache_table[cache_count] != 0 &&
+         static_cast<std::int32_t>(cache_table[cache_second_size]) <= small_second_level_cache;
 }
 
 inline QtbInt level1_threads_sse42(const Level1Limits &limits, QtbInt n, QtbInt threads) {
@@ -94,7 +96,7 @@ QtbInt level1_threads(const Level1Limits &limits, QtbInt n, QtbInt incx, QtbInt 
   if (threads < 2) return level1_serial;
   if (process.dynamic() != 1) return threads;
   if (tier == tier_sse42) return level1_threads_sse42(limits, n, threads);
-  std::uint32_t cache_table[5];
+  std::uint32_t cache_table[cache_size_entries];
   process.cache_sizes(cache_table);
   return has_small_second_level(cache_table) ? level1_threads_small_cache(limits, n, threads)
                                              : level1_threads_large_cache(limits, n, threads);
