@@ -26,6 +26,8 @@ set(QTB_CORE_SOURCES
   blas/entry/version.cpp
   blas/entry/xerbla.cpp
   # thread
+  blas/thread/32e/level1/xf_l1.cpp
+  blas/thread/32e/level1/xf_l1_omp.cpp
   blas/thread/forward.cpp
   # service
   service/cache.cpp

@@ -8,23 +8,6 @@ extern "C" {
 #define QTB_FORWARD(name, shape, T) \
   QTB_FUNCTION(shape, T, qtb_blas_##name) { return qtb_blas_x##name(QTB_ARGS(shape)); }
 
-QTB_FORWARD(saxpy, axpy, float)
-QTB_FORWARD(daxpy, axpy, double)
-QTB_FORWARD(caxpy, axpy, cfloat)
-QTB_FORWARD(zaxpy, axpy, cdouble)
-QTB_FORWARD(scopy, copy, float)
-QTB_FORWARD(dcopy, copy, double)
-QTB_FORWARD(ccopy, copy, cfloat)
-QTB_FORWARD(zcopy, copy, cdouble)
-QTB_FORWARD(sswap, swap, float)
-QTB_FORWARD(dswap, swap, double)
-QTB_FORWARD(cswap, swap, cfloat)
-QTB_FORWARD(zswap, swap, cdouble)
-QTB_FORWARD(sdot, dot, float)
-QTB_FORWARD(ddot, dot, double)
-QTB_FORWARD(cdotc, cdot, cfloat)
-QTB_FORWARD(srot, rot, float)
-QTB_FORWARD(drot, rot, double)
 QTB_FORWARD(csrot, rot, cfloat)
 QTB_FORWARD(zdrot, rot, cdouble)
 QTB_FORWARD(sgemv, gemv, float)
