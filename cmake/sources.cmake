@@ -2,6 +2,13 @@
 
 # Compiled once per tier.
 set(QTB_KERNEL_SOURCES
+  # level1
+  blas/kernels/level1/axpy.cpp
+  blas/kernels/level1/complex_dot.cpp
+  blas/kernels/level1/copy.cpp
+  blas/kernels/level1/dot.cpp
+  blas/kernels/level1/scal.cpp
+  blas/kernels/level1/swap.cpp
 )
 
 # Compiled once.
