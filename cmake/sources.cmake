@@ -12,6 +12,12 @@ set(QTB_KERNEL_SOURCES
   blas/kernels/level1/rotm.cpp
   blas/kernels/level1/rotmg.cpp
   blas/kernels/level1/sparse.cpp
+  blas/kernels/level1/axpy.cpp
+  blas/kernels/level1/complex_dot.cpp
+  blas/kernels/level1/copy.cpp
+  blas/kernels/level1/dot.cpp
+  blas/kernels/level1/scal.cpp
+  blas/kernels/level1/swap.cpp
 )
 
 # Compiled once.

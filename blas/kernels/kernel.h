@@ -17,6 +17,11 @@
 // qtb_blas_<tier>_<name>.
 #define QTB_TIER_NAME(name) QTB_TIER_EXPAND(qtb_blas_, QTB_TIER, _##name)
 
+// Whether this build is of a tier, for #if: what C linkage gives a name cannot stand under if constexpr.
+#define QTB_TIER_IS_avx_avx 1
+#define QTB_TIER_IS_sse42_sse42 1
+#define QTB_TIER_IS(tier) QTB_TIER_EXPAND(QTB_TIER_IS_##tier##_, QTB_TIER, )
+
 namespace qtb::QTB_TIER {
 namespace {
 // The tier of this build, for if constexpr.
@@ -29,3 +34,10 @@ constexpr ProcessorTier this_tier = QTB_TIER_EXPAND(tier_, QTB_TIER, );
 #define QTB_KERNEL(name, shape, T, body)                                \
   extern "C" QTB_HIDDEN QTB_FUNCTION(shape, T, QTB_TIER_NAME(x##name)); \
   extern "C" QTB_FUNCTION(shape, T, QTB_TIER_NAME(x##name)) { return body(QTB_ARGS(shape)); }
+
+// This tier's procedure under the name of another tier, whose build has none of its own.
+#define QTB_TIER_TEXT_OF(tier) #tier
+#define QTB_TIER_TEXT_EXPAND(tier) QTB_TIER_TEXT_OF(tier)
+#define QTB_KERNEL_SHARED(other, name, shape, T)                                   \
+  extern "C" QTB_HIDDEN QTB_FUNCTION(shape, T, qtb_blas_##other##_x##name)         \
+      __attribute__((alias("qtb_blas_" QTB_TIER_TEXT_EXPAND(QTB_TIER) "_x" #name)));

@@ -1,0 +1,54 @@
+// saxpy, daxpy, caxpy, zaxpy: y[i] := alpha * x[i] + y[i] over n elements.
+//
+// Increments in elements, of either sign or zero; addresses of any alignment; x and y must not overlap. An alpha that
+// compares equal to zero, in both parts if complex, leaves y untouched, whatever x and y hold. An element's bits depend
+// on the element alone, not on its place, the increments or the alignment.
+
+#include "blas/kernels/level1/walk.h"
+
+namespace qtb::QTB_TIER {
+namespace {
+
+template <class T>
+struct Update {
+  static constexpr bool gathers = true, updates = true;
+  Factor<T> alpha;
+
+  template <int k, class X, class Y>
+  void vector(X &x, Y &y) {
+    y.store(k, add(y.load(k), alpha.times(x.load(k))));
+  }
+  void single(const T *x, T *y) const {
+    if constexpr (is_complex<T>)
+      store_lowest(y, add(load_repeated(y), alpha.times(load_repeated(x))));
+    else
+      store_single(y, load_single(y) + alpha.value * load_single(x));
+  }
+};
+
+template <class T>
+bool is_zero(T v) {
+  if constexpr (is_complex<T>)
+    return v.re == 0 && v.im == 0;
+  else
+    return v == 0;
+}
+
+template <Row row, class T>
+void axpy(const QtbInt *n, const T *alpha, const T *x, const QtbInt *incx, T *y, const QtbInt *incy) {
+  if (*n < 1 || is_zero(*alpha)) return;
+  Walk<const T, T> walk{*n, x, *incx, y, *incy};
+  Update<T> update{Factor<T>(*alpha)};
+  constexpr bool backward_is_contiguous = !is_complex<T> || backward_is_contiguous_in_dots;
+  passes<row>(walk, backward_is_contiguous ? same_unit(*incx, *incy) : both_one(*incx, *incy), update);
+  single_passes<1>(walk, update);
+}
+
+}  // namespace
+
+QTB_KERNEL(saxpy, axpy, float, axpy<row_saxpy>)
+QTB_KERNEL(daxpy, axpy, double, axpy<row_daxpy>)
+QTB_KERNEL(caxpy, axpy, cfloat, axpy<row_caxpy>)
+QTB_KERNEL(zaxpy, axpy, cdouble, axpy<row_zaxpy>)
+
+}  // namespace qtb::QTB_TIER

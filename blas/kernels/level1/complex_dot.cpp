@@ -1,0 +1,101 @@
+// cdotu, zdotu: the sum of x[i] * y[i]; cdotc, zdotc: of conj(x[i]) * y[i]. The element goes through result, which is
+// also the value; zero for n below 1.
+//
+// Increments in elements, of either sign or zero; addresses of any alignment. No product is made element by element:
+// two sets of accumulators sum plain lane products, and only their join at the end knows signs, so that the loops of
+// the plain and the conjugated product are one. With x = (xr, xi), y = (yr, yi) the lanes of an element are
+//
+//                                      first set           second set
+//   def, sse42, avx: x and swapped x   (xr yr, xi yi)      (xi yr, xr yi)
+//   sse3, ssse3: duplicated parts      (xr yr, xr yi)      (xi yr, xi yi)
+
+#include "blas/kernels/level1/dot.h"
+
+namespace qtb::QTB_TIER {
+namespace {
+
+template <class T>
+struct LaneProducts {
+  static constexpr bool gathers = true, updates = false;
+  Vec<T> first[4] = {zero<T>(), zero<T>(), zero<T>(), zero<T>()};
+  Vec<T> second[4] = {zero<T>(), zero<T>(), zero<T>(), zero<T>()};
+
+  template <int k>
+  void add_products(Vec<T> x, Vec<T> y) {
+#if defined(__SSE3__)
+    if constexpr (duplicates_parts) {
+      first[k] = add(first[k], mul(real_parts(x), y));
+      second[k] = add(second[k], mul(imaginary_parts(x), y));
+      return;
+    }
+#endif
+    first[k] = add(first[k], mul(x, y));
+    second[k] = add(second[k], mul(swap_parts(x), y));
+  }
+  template <int k, class X, class Y>
+  void vector(X &x, Y &y) {
+    add_products<k % 4>(x.load(k), y.load(k));
+  }
+  void single(const T *x, const T *y) { add_products<0>(load_lowest(x), load_lowest(y)); }
+};
+
+// The sum of a vector's elements, in its lowest lanes.
+inline __m128 sum_elements(__m128 v) { return _mm_add_ps(v, _mm_movehl_ps(v, v)); }
+inline __m128d sum_elements(__m128d v) { return v; }
+
+// (a0 + a1, b0 + b1) in the lowest lanes.
+inline __m128 add_neighbours(__m128 a, __m128 b) { return sum_elements(_mm_unpacklo_ps(a, b)); }
+inline __m128d add_neighbours(__m128d a, __m128d b) { return _mm_add_pd(_mm_unpacklo_pd(a, b), _mm_unpackhi_pd(a, b)); }
+
+// An element's lane sums become the element.
+template <bool conjugate, class R, class V>
+V join_parts(V first, V second) {
+#if defined(__SSE3__)
+  if constexpr (duplicates_parts) {
+    if constexpr (conjugate) return swap_parts(add_subtract(swap_parts(first), second));
+    return add_subtract(first, swap_parts(second));
+  }
+#endif
+  // The sign bit turns xi yi, or xi yr if x is conjugated.
+  if constexpr (conjugate)
+    second = bit_xor(second, alternate(R(-0.0), R(0)));
+  else
+    first = bit_xor(first, alternate(R(0), R(-0.0)));
+  return add_neighbours(first, second);
+}
+
+// One procedure for both products of a type: its loops are long.
+template <class T>
+struct LaneSums {
+  Vec<T> first, second;
+};
+template <Row row, class T>
+[[gnu::noinline]] LaneSums<T> sum_products(QtbInt n, const T *x, QtbInt incx, const T *y, QtbInt incy) {
+  Walk<const T, const T> walk{n, x, incx, y, incy};
+  LaneProducts<T> products;
+  passes<row>(walk, dot_is_contiguous(incx, incy), products);
+  single_passes<1>(walk, products);
+  return {sum_elements(join_accumulators(products.first)), sum_elements(join_accumulators(products.second))};
+}
+
+template <Row row, bool conjugate, class T>
+T *dot(T *result, const QtbInt *n, const T *x, const QtbInt *incx, const T *y, const QtbInt *incy) {
+  Vec<T> value = zero<T>();
+  if (*n > 0) {
+    const LaneSums<T> sums = sum_products<row>(*n, x, *incx, y, *incy);
+    value = join_parts<conjugate, Real<T>>(sums.first, sums.second);
+  }
+  store_lowest(result, value);
+  return result;
+}
+
+constexpr bool plain = false, conjugated = true;
+
+}  // namespace
+
+QTB_KERNEL(cdotu, cdot, cfloat, (dot<row_cdot, plain>))
+QTB_KERNEL(cdotc, cdot, cfloat, (dot<row_cdot, conjugated>))
+QTB_KERNEL(zdotu, cdot, cdouble, (dot<row_zdot, plain>))
+QTB_KERNEL(zdotc, cdot, cdouble, (dot<row_zdot, conjugated>))
+
+}  // namespace qtb::QTB_TIER

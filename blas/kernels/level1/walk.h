@@ -1,0 +1,233 @@
+// Walks over one or two vectors: what the basic vector kernels share.
+//
+// A walk knows the way over the elements: peeling to a 16-byte boundary, passes of many elements, shorter passes,
+// single elements, by the kernel's row of the tuning table. A kernel gives the work, a body with
+//
+//   template <int k, class X, class Y> void vector(X &x, Y &y)   vector k of a pass, through the operands' cursors
+//   void single(x, y)                                            one element, at any address
+//   static constexpr bool gathers                                whether strided passes go through vectors
+//   static constexpr bool updates                                whether y is read and then stored
+//
+// Nothing outside the operands is read, not even in a vector that is then cut. Addresses need not be multiples of the
+// element width: where peeling cannot reach a boundary, the passes are unaligned or the elements go singly.
+#pragma once
+
+#include "blas/kernels/level1/tuning.h"
+#include "blas/kernels/simd/vec.h"
+
+namespace qtb::QTB_TIER {
+namespace {
+
+// f(Constant<0>()) to f(Constant<count - 1>()), written out.
+template <int k>
+struct Constant {
+  static constexpr int value = k;
+};
+template <int count, int k = 0, class F>
+[[gnu::always_inline]] inline void repeat(F &&f) {
+  if constexpr (k < count) {
+    f(Constant<k>());
+    repeat<count, k + 1>(f);
+  }
+}
+
+// ---- Cursors: an operand of a pass, and how its vectors are reached. T is const for an operand that is only read.
+// ----
+
+template <class T>
+struct Aligned {
+  static constexpr QtbInt beyond = 0;  // elements that a load reads behind its vector
+  T *p;
+  auto load(int k) const { return load_aligned(p + k * lanes<T>); }
+  void store(int k, Vec<T> v) const { store_aligned(p + k * lanes<T>, v); }
+  void advance(QtbInt elements) { p += elements; }
+};
+
+template <class T>
+struct Unaligned {
+  static constexpr QtbInt beyond = 0;
+  T *p;
+  auto load(int k) const { return load_unaligned(p + k * lanes<T>); }
+  void store(int k, Vec<T> v) const { store_unaligned(p + k * lanes<T>, v); }
+  void advance(QtbInt elements) { p += elements; }
+};
+
+template <class T>
+struct Halves {
+  static constexpr QtbInt beyond = 0;
+  T *p;
+  auto load(int k) const { return load_halves(p + k * lanes<T>); }
+  void store(int k, Vec<T> v) const { store_halves(p + k * lanes<T>, v); }
+  void advance(QtbInt elements) { p += elements; }
+};
+
+template <class T>
+struct Strided {
+  static constexpr QtbInt beyond = 0;
+  T *p;
+  QtbInt inc;
+  auto load(int k) const { return gather(p + k * lanes<T> * inc, inc); }
+  void store(int k, Vec<T> v) const { scatter(p + k * lanes<T> * inc, inc, v); }
+  void advance(QtbInt elements) { p += elements * inc; }
+};
+
+// An operand offset bytes above a boundary. Each aligned vector of memory is loaded once and joined with its
+// predecessor; the first of them, which begins before the operand, is put together from the operand's own parts.
+template <class T, int offset>
+struct Rejoined {
+  static constexpr QtbInt size = static_cast<QtbInt>(sizeof(T));
+  static constexpr QtbInt bytes_in_first = vector_bytes - offset;
+  static constexpr QtbInt parts_in_first = bytes_in_first * parts_per_vector<T> / vector_bytes;
+  static constexpr QtbInt beyond = (bytes_in_first + size - 1) / size;
+  T *p;
+  Vec<T> before;
+  explicit Rejoined(T *operand) : p(operand), before(load_highest<parts_in_first>(parts(operand))) {}
+  auto load(int k) {
+    const Vec<T> next = load_aligned(parts(p) + k * parts_per_vector<T> + parts_in_first);
+    const Vec<T> joined = join<offset>(before, next);
+    before = next;
+    return joined;
+  }
+  void store(int k, Vec<T> v) const { store_unaligned(p + k * lanes<T>, v); }
+  void advance(QtbInt elements) { p += elements; }
+};
+
+// ---- Passes ----
+
+// What is left of a walk: n elements from x and y on.
+template <class X, class Y>
+struct Walk {
+  QtbInt n;
+  X *x;
+  QtbInt incx;
+  Y *y;
+  QtbInt incy;
+};
+
+template <int vectors, class X, class Y, class CursorX, class CursorY, class Body>
+[[gnu::always_inline]] inline void passes_of(Walk<X, Y> &walk, CursorX &x, CursorY &y, Body &body) {
+  constexpr QtbInt count = vectors * lanes<Y>;
+  for (; walk.n >= count + CursorX::beyond; walk.n -= count) {
+    repeat<vectors>([&](auto k) __attribute__((always_inline)) { body.template vector<k.value>(x, y); });
+    x.advance(count);
+    y.advance(count);
+  }
+}
+
+// Passes of count elements, then at most half as many and no more than four vectors, then single vectors.
+template <QtbInt count, class X, class Y, class CursorX, class CursorY, class Body>
+[[gnu::always_inline]] inline void vector_passes(Walk<X, Y> &walk, CursorX x, CursorY y, Body &body) {
+  constexpr int vectors = static_cast<int>(count / lanes<Y>);
+  static_assert(vectors * lanes<Y> == count);
+  constexpr int fewer = vectors / 2 < 4 ? vectors / 2 : 4;
+  passes_of<vectors>(walk, x, y, body);
+  if constexpr (fewer > 1) passes_of<fewer>(walk, x, y, body);
+  if constexpr (vectors > 1) passes_of<1>(walk, x, y, body);
+  walk.x = x.p;
+  walk.y = y.p;
+}
+
+// Passes of count single elements, in order.
+template <int count, class X, class Y, class Body>
+[[gnu::always_inline]] inline void single_passes(Walk<X, Y> &walk, Body &body) {
+  for (; walk.n >= count; walk.n -= count)
+    repeat<count>([&](auto) __attribute__((always_inline)) {
+      body.single(walk.x, walk.y);
+      walk.x += walk.incx;
+      walk.y += walk.incy;
+    });
+}
+
+// ---- Ways ----
+
+template <Row row, class X, class Y, class Body>
+[[gnu::always_inline]] inline void rejoined_passes(Walk<X, Y> &walk, Body &body) {
+  constexpr QtbInt count = tuning<row>.different;
+  // The shortest pass with the largest reach: below it the parts of the first vector may not be there.
+  if (walk.n < 2 * lanes<Y>) return;
+  const Aligned<Y> y{walk.y};
+  switch (phase(walk.x)) {
+    case 8:
+      return vector_passes<count>(walk, Rejoined<X, 8>(walk.x), y, body);
+    case 4:
+      if constexpr (sizeof(Y) == sizeof(float)) return vector_passes<count>(walk, Rejoined<X, 4>(walk.x), y, body);
+      break;
+    case 12:
+      if constexpr (sizeof(Y) == sizeof(float)) return vector_passes<count>(walk, Rejoined<X, 12>(walk.x), y, body);
+      break;
+    default:
+      break;
+  }
+  vector_passes<count>(walk, Unaligned<X>{walk.x}, y, body);
+}
+
+// Operands side by side in memory, in the tier's sizes. What is left is the caller's: less than a vector, or what the
+// tier does singly.
+template <Row row, class X, class Y, class Body>
+[[gnu::always_inline]] inline void contiguous_passes(Walk<X, Y> &walk, Body &body) {
+  constexpr Tuning sizes = tuning<row>;
+  if constexpr (sizes.treatment == no_peel) {
+    vector_passes<sizes.same>(walk, Unaligned<X>{walk.x}, Unaligned<Y>{walk.y}, body);
+    return;
+  }
+  if (!element_aligned(walk.y)) {
+    if constexpr (sizes.treatment == one_operand)
+      vector_passes<sizes.same>(walk, Unaligned<X>{walk.x}, Unaligned<Y>{walk.y}, body);
+    if constexpr (sizes.treatment == halves || sizes.treatment == unaligned || sizes.treatment == rejoin)
+      vector_passes<sizes.different>(walk, Unaligned<X>{walk.x}, Unaligned<Y>{walk.y}, body);
+    return;
+  }
+  for (; walk.n > 0 && phase(walk.y) != 0; --walk.n) body.single(walk.x++, walk.y++);
+  const QtbInt distance = phase(walk.x);
+  if (sizes.treatment == one_operand || distance == 0)
+    vector_passes<sizes.same>(walk, Aligned<X>{walk.x}, Aligned<Y>{walk.y}, body);
+  else if constexpr (sizes.treatment == scalar_moves)
+    single_passes<sizes.different>(walk, body);
+  else if constexpr (sizes.treatment == halves)
+    vector_passes<sizes.different>(walk, Halves<X>{walk.x}, Aligned<Y>{walk.y}, body);
+  else if constexpr (sizes.treatment == unaligned)
+    vector_passes<sizes.different>(walk, Unaligned<X>{walk.x}, Aligned<Y>{walk.y}, body);
+  else if constexpr (sizes.treatment == rejoin)
+    rejoined_passes<row>(walk, body);
+  else if constexpr (sizes.treatment == halves_at_8) {
+    if (distance == 8) vector_passes<sizes.different>(walk, Halves<X>{walk.x}, Aligned<Y>{walk.y}, body);
+  }
+}
+
+// Operands with increments. A step that fills vectors is gathered into them, if the kernel computes; what moves only,
+// or adds to one and the same element over and over, goes in single elements.
+template <Row row, class X, class Y, class Body>
+[[gnu::always_inline]] inline void strided_passes(Walk<X, Y> &walk, Body &body) {
+  constexpr QtbInt count = tuning<row>.strided;
+  if constexpr (Body::gathers && count > 1 && count % lanes<Y> == 0) {
+    if (Body::updates && walk.incy == 0) return;
+    vector_passes<count>(walk, Strided<X>{walk.x, walk.incx}, Strided<Y>{walk.y, walk.incy}, body);
+  } else if constexpr (count > 1) {
+    single_passes<count>(walk, body);
+  }
+}
+
+// All but the last single elements of a walk that starts at its operands' lowest addresses if it is contiguous, and
+// else where the published convention has it; single_passes<1> with the same or another body does the rest.
+template <Row row, class X, class Y, class Body>
+[[gnu::always_inline]] inline void passes(Walk<X, Y> &walk, bool contiguous, Body &body) {
+  if (contiguous) {
+    walk.incx = walk.incy = 1;
+  } else {
+    walk.x = walk_start(walk.x, walk.n, walk.incx);
+    walk.y = walk_start(walk.y, walk.n, walk.incy);
+  }
+  if constexpr (tuning<row>.short_limit > 0)
+    if (walk.n < tuning<row>.short_limit || !element_aligned(walk.x) || !element_aligned(walk.y)) return;
+  if (contiguous)
+    contiguous_passes<row>(walk, body);
+  else
+    strided_passes<row>(walk, body);
+}
+
+// Whether two increments are both 1 or both -1. Their product would say the same but for overflow.
+inline bool same_unit(QtbInt incx, QtbInt incy) { return incx == incy && (incx == 1 || incx == -1); }
+inline bool both_one(QtbInt incx, QtbInt incy) { return incx == 1 && incy == 1; }
+
+}  // namespace
+}  // namespace qtb::QTB_TIER
