@@ -18,6 +18,24 @@ set(QTB_KERNEL_SOURCES
   blas/kernels/level1/dot.cpp
   blas/kernels/level1/scal.cpp
   blas/kernels/level1/swap.cpp
+  # level3
+  blas/kernels/level3/blocks.cpp
+  # plain
+  blas/kernels/plain/gemm.cpp
+  blas/kernels/plain/gemm_copy.cpp
+  blas/kernels/plain/gemm_packed.cpp
+  blas/kernels/plain/gemv.cpp
+  blas/kernels/plain/ger.cpp
+  blas/kernels/plain/symm.cpp
+  blas/kernels/plain/symv.cpp
+  blas/kernels/plain/syr.cpp
+  blas/kernels/plain/syr2.cpp
+  blas/kernels/plain/syr2k.cpp
+  blas/kernels/plain/syrk.cpp
+  blas/kernels/plain/trmm.cpp
+  blas/kernels/plain/trmv.cpp
+  blas/kernels/plain/trsm.cpp
+  blas/kernels/plain/trsv.cpp
 )
 
 # Compiled once.

@@ -17,10 +17,18 @@
 // qtb_blas_<tier>_<name>.
 #define QTB_TIER_NAME(name) QTB_TIER_EXPAND(qtb_blas_, QTB_TIER, _##name)
 
-// Whether this build is of a tier, for #if: what C linkage gives a name cannot stand under if constexpr.
-#define QTB_TIER_IS_avx_avx 1
-#define QTB_TIER_IS_sse42_sse42 1
-#define QTB_TIER_IS(tier) QTB_TIER_EXPAND(QTB_TIER_IS_##tier##_, QTB_TIER, )
+// The tier of this build, for #if: which named procedures a tier has is decided there.
+#define QTB_RANK_def 0
+#define QTB_RANK_sse3 1
+#define QTB_RANK_ssse3 2
+#define QTB_RANK_sse42 3
+#define QTB_RANK_avx 4
+#define QTB_RANK(tier) QTB_TIER_EXPAND(QTB_RANK_, tier, )
+#define QTB_TIER_AT_LEAST(tier) (QTB_RANK(QTB_TIER) >= QTB_RANK(tier))
+#define QTB_TIER_IS(tier) (QTB_RANK(QTB_TIER) == QTB_RANK(tier))
+#define QTB_CHECK_RANK(tier, TIER) static_assert(QTB_RANK_##tier == tier_##tier);
+QTB_FOR_EACH_TIER(QTB_CHECK_RANK)
+#undef QTB_CHECK_RANK
 
 namespace qtb::QTB_TIER {
 namespace {
