@@ -4,6 +4,7 @@
 // Contiguous vectors (increments 1 and -1) go by vectors whose sign bits are masked off, in four accumulators in
 // rotation. Other increments go one element at a time from the start of the walk; 0 adds element 0 n times.
 
+#include "blas/kernels/simd/repeat.h"
 #include "blas/kernels/simd/scalar.h"
 #include "blas/kernels/simd/vec.h"
 
@@ -28,11 +29,14 @@ bool takes_vectors(const T *x) {
   return element_aligned(x) || !(peels || sizeof(T) == sizeof(double));
 }
 
+// All bits but the sign.
 inline __m128 load_magnitudes(const float *p) {
-  return _mm_andnot_ps(broadcast(-0.0F), peels ? load_aligned(p) : load_unaligned(p));
+  const __m128 mask = _mm_castsi128_ps(_mm_set1_epi32(0x7FFFFFFF));
+  return _mm_and_ps(peels ? load_aligned(p) : load_unaligned(p), mask);
 }
 inline __m128d load_magnitudes(const double *p) {
-  return _mm_andnot_pd(broadcast(-0.0), peels ? load_aligned(p) : load_unaligned(p));
+  const __m128d mask = _mm_castsi128_pd(_mm_set1_epi64x(0x7FFFFFFFFFFFFFFF));
+  return _mm_and_pd(peels ? load_aligned(p) : load_unaligned(p), mask);
 }
 
 inline float sum_of_lanes(__m128 v) {
@@ -53,22 +57,25 @@ inline double sum_of_lanes(__m128d v) {
 }
 
 template <QtbInt count, class T>
-void add_vectors(Vec<T> (&sum)[accumulators], const T *x) {
-  for (QtbInt k = 0; k < count / lanes<T>; ++k)
-    sum[k % accumulators] = add(sum[k % accumulators], load_magnitudes(x + k * lanes<T>));
+[[gnu::always_inline]] inline void add_vectors(Vec<T> (&sum)[accumulators], const T *x) {
+  repeat<count / lanes<T>>([&](auto k) __attribute__((always_inline)) {
+    Vec<T> &accumulator = sum[k.value % accumulators];
+    accumulator = add(accumulator, load_magnitudes(x + k.value * lanes<T>));
+  });
 }
 
-// The vectors of what is left of n elements at x below a block of 2 * half, by halves. Returns where they end.
+// The last n elements at x, as far as they do not fill 2 * half: by halves as long as these are vectors. Returns where
+// they end.
 template <QtbInt half, class T>
-const T *add_remainder(Vec<T> (&sum)[accumulators], QtbInt n, const T *x) {
-  if constexpr (half >= lanes<T>) {
+[[gnu::always_inline]] inline const T *add_remainder(Vec<T> (&sum)[accumulators], QtbInt n, const T *x) {
+  if constexpr (half < lanes<T>) {
+    return x;
+  } else {
     if (n & half) {
       add_vectors<half>(sum, x);
       x += half;
     }
     return add_remainder<half / 2>(sum, n, x);
-  } else {
-    return x;
   }
 }
 

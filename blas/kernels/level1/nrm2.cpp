@@ -6,6 +6,7 @@
 //
 // Increments: every increment reads the elements that its absolute value reads; 0 reads element 0 n times.
 
+#include "blas/kernels/simd/repeat.h"
 #include "blas/kernels/simd/scalar.h"
 #include "blas/kernels/simd/vec.h"
 
@@ -49,44 +50,48 @@ double norm_scaled(const QtbInt *n, const T *x, const QtbInt *incx) {
 
 // ---- float: sum of squares in double ----
 
-// Independent chains of additions, enough to hide the latency of one.
-constexpr QtbInt chains = 8;
+// Independent chains of additions, enough to hide the latency of one. What works on them is always inlined, so that
+// they stay in registers.
+constexpr int chains = 8;
 using WideSum = __m128d[chains];
 
 // Two neighbouring floats at p, as doubles.
 inline __m128d widen_pair(const float *p) {
   return _mm_cvtps_pd(_mm_castsi128_ps(_mm_loadl_epi64(reinterpret_cast<const __m128i *>(p))));
 }
+inline __m128d widen_two(const float *p, const float *q) {
+  return _mm_cvtps_pd(_mm_unpacklo_ps(_mm_set_ss(element(p)), _mm_set_ss(element(q))));
+}
 inline __m128d widen_single(const float *p) { return _mm_set_sd(static_cast<double>(element(p))); }
 
 inline void add_square(__m128d &sum, __m128d v) { sum = add(sum, mul(v, v)); }
 
 // 2 * pairs neighbouring floats, a pair to each chain in rotation.
-template <QtbInt pairs>
-void add_pairs(WideSum &sum, const float *p) {
-  for (QtbInt k = 0; k < pairs; ++k) add_square(sum[k % chains], widen_pair(p + 2 * k));
+template <int pairs>
+[[gnu::always_inline]] inline void add_pairs(WideSum &sum, const float *p) {
+  repeat<pairs>([&](auto k)
+                    __attribute__((always_inline)) { add_square(sum[k.value % chains], widen_pair(p + 2 * k.value)); });
 }
 
-// What is left of n floats at p below a block of 4 * pairs: by halves down to a single one.
-template <QtbInt pairs>
-void add_remainder(WideSum &sum, QtbInt n, const float *p) {
-  if (n & (2 * pairs)) {
-    add_pairs<pairs>(sum, p);
-    p += 2 * pairs;
-  }
-  if constexpr (pairs > 1)
+// The last n floats at p, as far as they do not fill 4 * pairs: by halves down to a single one.
+template <int pairs>
+[[gnu::always_inline]] inline void add_remainder(WideSum &sum, QtbInt n, const float *p) {
+  if constexpr (pairs == 0) {
+    if (n & 1) add_square(sum[0], widen_single(p));
+  } else {
+    if (n & (2 * pairs)) {
+      add_pairs<pairs>(sum, p);
+      p += 2 * pairs;
+    }
     add_remainder<pairs / 2>(sum, n, p);
-  else if (n & 1)
-    add_square(sum[0], widen_single(p));
+  }
 }
 
-// n neighbouring floats, block of them a pass.
-template <QtbInt block>
-void add_contiguous(WideSum &sum, QtbInt n, const float *p) {
-  constexpr QtbInt unit = 2 * chains;  // floats that give every chain one pair
-  for (; n >= block; n -= block, p += block)
-    for (QtbInt k = 0; k < block; k += unit) add_pairs<chains>(sum, p + k);
-  add_remainder<block / 4>(sum, n, p);
+// n neighbouring floats, 2 * pairs of them a pass.
+template <int pairs>
+[[gnu::always_inline]] inline void add_contiguous(WideSum &sum, QtbInt n, const float *p) {
+  for (; n >= 2 * pairs; n -= 2 * pairs, p += 2 * pairs) add_pairs<pairs>(sum, p);
+  add_remainder<pairs / 2>(sum, n, p);
 }
 
 inline double root_of(const WideSum &sum) {
@@ -98,7 +103,7 @@ inline double root_of(const WideSum &sum) {
 inline bool contiguous(QtbInt inc) { return inc == 1 || inc == -1; }
 
 inline float norm_wide_real(const QtbInt *n, const float *x, const QtbInt *incx) {
-  constexpr QtbInt block = 32;
+  constexpr int pairs_of_pass = 16;
   QtbInt count = *n;
   const QtbInt inc = *incx;
   if (count < 1) return 0.0F;
@@ -106,37 +111,34 @@ inline float norm_wide_real(const QtbInt *n, const float *x, const QtbInt *incx)
   if (contiguous(inc)) {
     if (element_aligned(x))
       for (; count > 0 && phase(x) != 0; --count, ++x) add_square(sum[0], widen_single(x));
-    add_contiguous<block>(sum, count, x);
+    add_contiguous<pairs_of_pass>(sum, count, x);
   } else {
     const float *p = walk_start(x, count, inc);
-    const auto next = [&p, inc] {
-      const float v = element(p);
-      p += inc;
-      return static_cast<double>(v);
-    };
-    for (; count >= 4; count -= 4)
-      for (QtbInt k = 0; k < 2; ++k) {
-        const double first = next();
-        add_square(sum[k], _mm_set_pd(next(), first));
-      }
-    for (; count > 0; --count) add_square(sum[0], _mm_set_sd(next()));
+    for (; count >= 4; count -= 4, p += 4 * inc) {
+      add_square(sum[0], widen_two(p, p + inc));
+      add_square(sum[1], widen_two(p + 2 * inc, p + 3 * inc));
+    }
+    for (; count > 0; --count, p += inc) add_square(sum[0], widen_single(p));
   }
   return static_cast<float>(root_of(sum));
 }
 
 // An element is a pair already, so that no boundary needs to be reached.
 inline float norm_wide_complex(const QtbInt *n, const cfloat *x, const QtbInt *incx) {
-  constexpr QtbInt block = 64;  // 32 elements
+  constexpr int pairs_of_pass = 32;
   QtbInt count = *n;
   const QtbInt inc = *incx;
   if (count < 1) return 0.0F;
   WideSum sum = {};
   if (contiguous(inc)) {
-    add_contiguous<block>(sum, 2 * count, parts(x));
+    add_contiguous<pairs_of_pass>(sum, 2 * count, parts(x));
   } else {
     const cfloat *p = walk_start(x, count, inc);
     for (; count >= 4; count -= 4)
-      for (QtbInt k = 0; k < 4; ++k, p += inc) add_square(sum[k], widen_pair(parts(p)));
+      repeat<4>([&](auto k) __attribute__((always_inline)) {
+        add_square(sum[k.value], widen_pair(parts(p)));
+        p += inc;
+      });
     for (; count > 0; --count, p += inc) add_square(sum[0], widen_pair(parts(p)));
   }
   return static_cast<float>(root_of(sum));

@@ -4,6 +4,7 @@
 // x and y must not overlap; each may stand at any address.
 #pragma once
 
+#include "blas/kernels/simd/repeat.h"
 #include "blas/kernels/simd/scalar.h"
 #include "blas/kernels/simd/vec.h"
 
@@ -43,12 +44,13 @@ void transform_pair(T *x, T *y, const Op &op) {
 // count elements, a vector at a time.
 template <QtbInt count, Load load_x, Load load_y, class T, class Op>
 void transform_block(T *x, T *y, const Op &op) {
-  for (QtbInt k = 0; k < count; k += lanes<T>) {
-    Vec<T> u = load_by<load_x>(x + k), v = load_by<load_y>(y + k);
+  repeat<count / lanes<T>>([&](auto k) __attribute__((always_inline)) {
+    constexpr QtbInt at = k.value * lanes<T>;
+    Vec<T> u = load_by<load_x>(x + at), v = load_by<load_y>(y + at);
     op(u, v);
-    store_by<load_x>(x + k, u);
-    store_by<load_y>(y + k, v);
-  }
+    store_by<load_x>(x + at, u);
+    store_by<load_y>(y + at, v);
+  });
 }
 
 // Passes of block elements as long as n allows; returns how many elements they took.

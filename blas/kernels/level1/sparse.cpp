@@ -13,21 +13,34 @@
 namespace qtb::QTB_TIER {
 namespace {
 
+// f(0) to f(n - 1), in order, two a pass.
+template <class F>
+[[gnu::always_inline]] inline void for_each_by_two(QtbInt n, const F &f) {
+  QtbInt k = 0;
+  for (; k + 2 <= n; k += 2) {
+    f(k);
+    f(k + 1);
+  }
+  if (k < n) f(k);
+}
+
 template <class T>
 void add_scaled(const QtbInt *nz, const T *a, const T *x, const QtbInt *indx, T *y) {
   const QtbInt n = *nz;
+  if (n < 1) return;
   const T alpha = element(a);
   if (alpha == 0) return;
-  for (QtbInt k = 0; k < n; ++k) {
+  for_each_by_two(n, [=](QtbInt k) {
     T *target = y + (indx[k] - 1);
     set_element(target, element(target) + alpha * element(x + k));
-  }
+  });
 }
 
 template <class T>
 void add_scaled_complex(const QtbInt *nz, const T *a, const T *x, const QtbInt *indx, T *y) {
   using R = Real<T>;
   const QtbInt n = *nz;
+  if (n < 1) return;
   const R re = element(parts(a)), im = element(parts(a) + 1);
   if (re == 0 && im == 0) return;
   for (QtbInt k = 0; k < n; ++k) {
@@ -79,28 +92,29 @@ void move(T *to, const T *from) {
 template <class T>
 void gather(const QtbInt *nz, const T *y, T *x, const QtbInt *indx) {
   const QtbInt n = *nz;
-  for (QtbInt k = 0; k < n; ++k) move(x + k, y + (indx[k] - 1));
+  for_each_by_two(n, [=](QtbInt k) { move(x + k, y + (indx[k] - 1)); });
 }
 
 template <class T>
 void gather_and_zero(const QtbInt *nz, T *y, T *x, const QtbInt *indx) {
   const QtbInt n = *nz;
-  for (QtbInt k = 0; k < n; ++k) {
+  for_each_by_two(n, [=](QtbInt k) {
     T *source = y + (indx[k] - 1);
     move(x + k, source);
     __builtin_memset(source, 0, sizeof(T));
-  }
+  });
 }
 
 template <class T>
 void scatter(const QtbInt *nz, const T *x, const QtbInt *indx, T *y) {
   const QtbInt n = *nz;
-  for (QtbInt k = 0; k < n; ++k) move(y + (indx[k] - 1), x + k);
+  for_each_by_two(n, [=](QtbInt k) { move(y + (indx[k] - 1), x + k); });
 }
 
 template <class T>
 void rotate(const QtbInt *nz, T *x, const QtbInt *indx, T *y, const T *c, const T *s) {
   const QtbInt n = *nz;
+  if (n < 1) return;
   const T cosine = element(c), sine = element(s);
   if (cosine == 1 && sine == 0) return;
   for (QtbInt k = 0; k < n; ++k) {
