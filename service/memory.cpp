@@ -8,7 +8,6 @@
 #include "service/memory.h"
 
 #include <atomic>
-#include <bit>
 #include <cstdlib>
 #include <new>
 
@@ -160,8 +159,7 @@ void *qtb_serv_malloc(std::uint64_t size, std::int32_t alignment) {
 
   std::uint64_t pad = 0;
   if (alignment >= smallest_alignment)
-    pad = static_cast<std::uint64_t>(std::has_single_bit(static_cast<std::uint32_t>(alignment)) ? alignment
-                                                                                                : default_alignment);
+    pad = static_cast<std::uint64_t>((alignment & (alignment - 1)) == 0 ? alignment : default_alignment);
   const std::uint64_t mask = pad == 0 ? 0 : pad - 1, need = size + pad;
 
   MemThreadList *list = own_list();
