@@ -53,8 +53,9 @@ inline float model_sum(const float *p, int team) {
   return total;
 }
 
-inline cfloat model_sum(const cfloat *p, int team) {
-  float re = 0.0F, im = 0.0F;
+template <class R>
+Complex<R> model_sum(const Complex<R> *p, int team) {
+  R re = 0, im = 0;
   for (int i = 0; i < team; ++i) re += p[i].re;
   for (int i = 0; i < team; ++i) im += p[i].im;
   return {re, im};
