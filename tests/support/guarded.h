@@ -45,6 +45,8 @@ class Guarded {
 
   // From here on a write to the array traps (its pages become read-only), until writable().
   void read_only() { mprotect(inside_, inner_, PROT_READ); }
+  // The same for a read.
+  void unreadable() { mprotect(inside_, inner_, PROT_NONE); }
   void writable() { mprotect(inside_, inner_, PROT_READ | PROT_WRITE); }
 
  private:

@@ -1,0 +1,127 @@
+// A problem: every number and option that a call of a published routine can need, whatever its shape, and the draws
+// from which problems and the contents of their arrays are made. The same seed gives the same problem on every machine.
+#pragma once
+
+#include <algorithm>
+#include <cstdint>
+#include <cstdio>
+#include <cstring>
+#include <iterator>
+
+#include "blas/types.h"
+
+namespace qtb::surface {
+
+// A source of numbers: a counter passed through a mixing function, so that any seed is as good as another.
+class Draw {
+ public:
+  explicit Draw(std::uint64_t seed) : state_(seed) {}
+
+  std::uint64_t bits() {
+    std::uint64_t z = (state_ += 0x9E3779B97F4A7C15U);
+    z = (z ^ (z >> 30)) * 0xBF58476D1CE4E5B9U;
+    z = (z ^ (z >> 27)) * 0x94D049BB133111EBU;
+    return z ^ (z >> 31);
+  }
+  QtbInt integer(QtbInt least, QtbInt most) {
+    return least + static_cast<QtbInt>(bits() % static_cast<std::uint64_t>(most - least + 1));
+  }
+  bool one_in(QtbInt n) { return integer(1, n) == 1; }
+  // In (-1, 1), with 24 bits, so that it is the same number in both precisions.
+  double real() { return static_cast<double>(integer(-0xFFFFFF, 0xFFFFFF)) * 0x1p-24; }
+  template <class C>
+  auto one_of(const C &choices) {
+    return std::begin(choices)[integer(0, static_cast<QtbInt>(std::size(choices)) - 1)];
+  }
+  // One of the letters, in either case.
+  char letter(const char *letters) {
+    const char upper = letters[integer(0, static_cast<QtbInt>(std::strlen(letters)) - 1)];
+    return static_cast<char>(one_in(2) ? upper : upper + ('a' - 'A'));
+  }
+
+ private:
+  std::uint64_t state_;
+};
+
+// What arrays hold: numbers whose sums round, or whole numbers whose sums do not in either precision.
+enum class Values { rounding, exact };
+
+struct Scalar {
+  double re = 0, im = 0;
+};
+
+template <class T>
+T scalar(Scalar v) {
+  if constexpr (is_complex<T>)
+    return {static_cast<Real<T>>(v.re), static_cast<Real<T>>(v.im)};
+  else
+    return static_cast<T>(v.re);
+}
+template <class T>
+bool is_zero(T v) {
+  if constexpr (is_complex<T>)
+    return v.re == 0 && v.im == 0;
+  else
+    return v == 0;
+}
+
+struct Problem {
+  std::uint64_t seed = 0;  // of the contents
+  QtbInt m = 0, n = 0, k = 0, kl = 0, ku = 0;
+  QtbInt incx = 1, incy = 1;
+  QtbInt spare[3] = {};  // leading dimensions beyond the least legal one: of A, B, C
+  Scalar alpha, beta;
+  char side = 'L', uplo = 'U', transa = 'N', transb = 'N', diag = 'N';
+  bool upper_name = false;  // by the upper-case name of the routine
+  Values values = Values::rounding;
+
+  QtbInt leading(int which, QtbInt least) const { return std::max<QtbInt>(least, 1) + spare[which]; }
+
+  void describe(char *text, std::size_t size) const {
+    std::snprintf(text, size,
+                  "seed %llu m %lld n %lld k %lld kl %lld ku %lld side %c uplo %c transa %c transb %c diag %c "
+                  "alpha (%g, %g) beta (%g, %g) incx %lld incy %lld spare %lld %lld %lld%s%s",
+                  static_cast<unsigned long long>(seed), static_cast<long long>(m), static_cast<long long>(n),
+                  static_cast<long long>(k), static_cast<long long>(kl), static_cast<long long>(ku), side, uplo, transa,
+                  transb, diag, alpha.re, alpha.im, beta.re, beta.im, static_cast<long long>(incx),
+                  static_cast<long long>(incy), static_cast<long long>(spare[0]), static_cast<long long>(spare[1]),
+                  static_cast<long long>(spare[2]), upper_name ? " upper-case name" : "",
+                  values == Values::exact ? " whole numbers" : "");
+  }
+};
+
+// Factors: the ones that routines treat apart, in both parts, and others.
+inline Scalar draw_scalar(Draw &draw, Values values) {
+  static constexpr Scalar special[] = {{0, 0}, {1, 0}, {-1, 0}, {0, 1}, {1, 1}, {0, -2}, {2, 0}};
+  static constexpr Scalar powers_of_two[] = {{0, 0}, {1, 0}, {-1, 0}, {0, 1}, {0, -2}, {2, 0}, {-4, 0}};
+  if (values == Values::exact) return draw.one_of(powers_of_two);
+  if (draw.one_in(2)) return draw.one_of(special);
+  return {draw.real() * 2, draw.real() * 2};
+}
+
+// Sizes of a sweep: mostly tiny, where every edge lies, some around the blocks of the kernels.
+inline QtbInt draw_size(Draw &draw) {
+  const QtbInt kind = draw.integer(0, 15);
+  if (kind < 10) return draw.integer(0, 12);
+  if (kind < 15) return draw.integer(13, 40);
+  return draw.integer(41, 70);
+}
+
+inline Problem draw_problem(std::uint64_t seed, Values values) {
+  Draw draw(seed);
+  static constexpr QtbInt increments[] = {1, 1, 1, 2, 3, -1, -2, -3};
+  Problem p;
+  p.seed = draw.bits();
+  p.values = values;
+  p.m = draw_size(draw), p.n = draw_size(draw), p.k = draw_size(draw);
+  p.kl = draw.integer(0, draw.one_in(4) ? 40 : 6), p.ku = draw.integer(0, draw.one_in(4) ? 40 : 6);
+  p.incx = draw.one_of(increments), p.incy = draw.one_of(increments);
+  for (QtbInt &spare : p.spare) spare = draw.one_in(2) ? 0 : draw.integer(1, 9);
+  p.alpha = draw_scalar(draw, values), p.beta = draw_scalar(draw, values);
+  p.side = draw.letter("LR"), p.uplo = draw.letter("UL"), p.diag = draw.letter("NU");
+  p.transa = draw.letter("NTC"), p.transb = draw.letter("NTC");
+  p.upper_name = draw.one_in(2);
+  return p;
+}
+
+}  // namespace qtb::surface
