@@ -19,7 +19,10 @@ static void *grown(void *array, size_t count, size_t element_bytes) {
   return larger;
 }
 
-static char *copy_of(const char *text) { return strcpy(grown(NULL, strlen(text), 1), text); }
+static char *copy_of(const char *text) {
+  const size_t length = strlen(text);
+  return memcpy(grown(NULL, length, 1), text, length + 1);
+}
 
 // The next field of a line, ended, with the line moved behind it; null when the line is used up.
 static char *next_field(char **line) {

@@ -12,13 +12,13 @@ function(qtb_add_fuzz name)
   target_link_options(${name}_fuzz PRIVATE -fsanitize=fuzzer)
   target_link_libraries(${name}_fuzz PRIVATE ${arg_LIBRARIES} OpenMP::OpenMP_CXX ${CMAKE_DL_LIBS})
   set(corpus ${PROJECT_SOURCE_DIR}/tests/fuzz/corpus/${name})
-  set(found ${CMAKE_CURRENT_BINARY_DIR}/fuzz/${name}/)
-  file(MAKE_DIRECTORY ${found})
+  set(scratch ${CMAKE_CURRENT_BINARY_DIR}/fuzz)
+  file(MAKE_DIRECTORY ${scratch}/${name})
   add_test(NAME ${name}_fuzz.replay COMMAND ${name}_fuzz -runs=0 ${corpus})
   # New inputs go to the first folder, those that fail go beside it.
   add_test(NAME ${name}_fuzz.search
-    COMMAND ${name}_fuzz -max_total_time=${QTB_FUZZ_SECONDS} -print_final_stats=1 -artifact_prefix=${CMAKE_CURRENT_BINARY_DIR}/fuzz/${name}-
-      ${found} ${corpus})
+    COMMAND ${name}_fuzz -max_total_time=${QTB_FUZZ_SECONDS} -print_final_stats=1
+      -artifact_prefix=${scratch}/${name}- ${scratch}/${name} ${corpus})
   math(EXPR limit "2 * ${QTB_FUZZ_SECONDS} + 60")
   set_tests_properties(${name}_fuzz.search PROPERTIES LABELS long TIMEOUT ${limit})
 endfunction()
