@@ -44,7 +44,7 @@ kernels=$(of '^blas/kernels/.*\.(cpp|h)$')
     /(^|[^A-Za-z])(TO[D]O|FIX[M]E|XX[X]|HA[C]K)([^A-Za-z]|$)/ { finding("a note for later") }
   ' $texts
   awk '
-    FNR == 1 && !/^\/\/ / { print FILENAME ":1: does not open with its contract" }
+    FNR == 1 && !/^\/(\/ |\*$)/ { print FILENAME ":1: does not open with its contract" }
   ' $sources
   for file in $texts; do
     [ -z "$(tail -c 1 "$file")" ] || echo "$file: no line end at the end"
