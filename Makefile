@@ -1,17 +1,101 @@
-# The daily commands. `make demo` and `make test` do everything on a fresh Debian 12 machine: install what is missing by
-# package name, configure, build and run.
+# The daily commands. Each does everything on a fresh Debian 12 machine: it installs what is missing by package name,
+# configures a preset of CMakePresets.json, builds and runs.
+#
+# JOBS=n sets how many cores to use, PREFIX=folder where to install, FUZZ_SECONDS=n how long each fuzz target runs.
 
-.PHONY: build demo test clean
 JOBS ?= $(shell nproc)
+PREFIX ?= /usr/local
+FUZZ_SECONDS ?= 60
+
+sources = $(shell git ls-files '*.cpp' '*.h' '*.c' '*.def')
+
+.PHONY: help build demo test test-long bench lint format asan tsan fuzz coverage install clean
+.DEFAULT_GOAL := help
+
+help:
+	@echo 'make build      the library: build/release/libqtb.so'
+	@echo 'make demo       builds and runs the examples'
+	@echo 'make test       builds everything and runs the tests'
+	@echo 'make test-long  more cases, both sanitizers, and the fuzz targets'
+	@echo 'make bench      benchmarks'
+	@echo 'make lint       formatting and static analysis'
+	@echo 'make format     formats the sources'
+	@echo 'make asan       the tests under the address and undefined-behaviour sanitizers'
+	@echo 'make tsan       the tests under the thread sanitizer'
+	@echo 'make fuzz       $(FUZZ_SECONDS) seconds of each fuzz target'
+	@echo 'make coverage   lines and branches that the tests reach'
+	@echo 'make install    installs below PREFIX=$(PREFIX)'
+	@echo 'make clean      removes build/'
 
 build:
 	@tools/packages.sh build
 	cmake --preset release
-	cmake --build --preset release -j $(JOBS)
+	cmake --build --preset release -j $(JOBS) --target qtb
 
-test: build
-	@tools/packages.sh test
+demo:
+	@tools/packages.sh demo
+	cmake --preset release -D QTB_BUILD_EXAMPLES=ON
+	cmake --build --preset release -j $(JOBS) --target examples
+	build/release/examples/least_squares examples/data/longley.csv examples/data/longley-certified.csv
+	build/release/examples/matrix_product
+
+test:
+	@tools/packages.sh build test
+	cmake --preset release -D QTB_BUILD_TESTS=ON
+	cmake --build --preset release -j $(JOBS)
 	ctest --preset release -j $(JOBS)
+
+test-long: asan tsan fuzz
+	@tools/packages.sh build test
+	cmake --preset release -D QTB_BUILD_TESTS=ON
+	cmake --build --preset release -j $(JOBS)
+	ctest --preset long -j $(JOBS)
+
+bench:
+	@tools/packages.sh build bench
+	cmake --preset bench
+	cmake --build --preset bench -j $(JOBS) --target bench
+
+asan:
+	@tools/packages.sh build test sanitizers
+	cmake --preset asan
+	cmake --build --preset asan -j $(JOBS)
+	ctest --preset asan -j $(JOBS)
+
+# The detector's shadow memory has fixed addresses, which address-space randomisation can take from it.
+tsan:
+	@tools/packages.sh build test sanitizers
+	cmake --preset tsan
+	cmake --build --preset tsan -j $(JOBS)
+	setarch -R ctest --preset tsan -j $(JOBS)
+
+fuzz:
+	@tools/packages.sh build fuzz
+	cmake --preset fuzz -D QTB_FUZZ_SECONDS=$(FUZZ_SECONDS)
+	cmake --build --preset fuzz -j $(JOBS)
+	ctest --preset fuzz -j $(JOBS)
+
+coverage:
+	@tools/packages.sh build test coverage
+	cmake --preset coverage
+	cmake --build --preset coverage -j $(JOBS)
+	ctest --preset coverage -j $(JOBS)
+	gcovr --root . --filter blas/ --filter service/ --exclude-throw-branches --print-summary \
+	  --html-details build/coverage/coverage.html build/coverage
+
+lint:
+	@tools/packages.sh build lint
+	clang-format --dry-run -Werror $(sources)
+	shellcheck $(shell git ls-files '*.sh' .ci/run)
+	cmake --preset lint
+	run-clang-tidy -quiet -p build/lint -j $(JOBS)
+
+format:
+	@tools/packages.sh lint
+	clang-format -i $(sources)
+
+install: build
+	cmake --install build/release --prefix $(PREFIX)
 
 clean:
 	rm -rf build

@@ -1,7 +1,9 @@
 # The tiers' instruction sets. Flags stand here and nowhere else; blas/tiers.h has the list of tiers in the same order.
 #
 # -mno-popcnt and its kin keep out what a compiler would add on its own to the instruction set that the tier names.
-set(QTB_TIERS def sse3 ssse3 sse42 avx)
+#
+# The product holds all tiers; fewer make the tree for a tool that reads sources.
+set(QTB_TIERS def sse3 ssse3 sse42 avx CACHE STRING "Tiers whose kernels are built")
 set(QTB_TIER_FLAGS_def   -march=x86-64)
 set(QTB_TIER_FLAGS_sse3  -march=x86-64 -msse3)
 set(QTB_TIER_FLAGS_ssse3 -march=x86-64 -mssse3)

@@ -1,0 +1,35 @@
+# Builds that watch the program: one at a time, for everything in the tree.
+#
+#   asan      addresses and undefined behaviour, halting at the first report
+#   tsan      data races: clang with its OpenMP runtime, whose Archer tool tells the detector of regions and barriers
+#   fuzz      asan, with the coverage feedback that the fuzz targets' driver steers by (clang)
+#   coverage  lines and branches that a run has reached
+set(QTB_INSTRUMENT "" CACHE STRING "asan, tsan, fuzz, coverage or nothing")
+set_property(CACHE QTB_INSTRUMENT PROPERTY STRINGS "" asan tsan fuzz coverage)
+
+# The environment that every test gets.
+set(QTB_TEST_ENVIRONMENT "")
+
+# The library is built without the type information that the check of polymorphic types reads.
+set(qtb_asan -fsanitize=address,undefined -fno-sanitize=vptr -fno-sanitize-recover=all
+  -fno-omit-frame-pointer)
+
+if(QTB_INSTRUMENT STREQUAL "asan")
+  add_compile_options(${qtb_asan})
+  add_link_options(${qtb_asan})
+elseif(QTB_INSTRUMENT STREQUAL "tsan")
+  add_compile_options(-fsanitize=thread)
+  add_link_options(-fsanitize=thread)
+  cmake_path(GET OpenMP_omp_LIBRARY PARENT_PATH openmp_folder)
+  find_library(QTB_ARCHER archer HINTS ${openmp_folder} PATHS /usr/lib/llvm-14/lib REQUIRED)
+  # The OpenMP runtime itself is not instrumented: what it does to the program's memory is not a race.
+  list(APPEND QTB_TEST_ENVIRONMENT "TSAN_OPTIONS=ignore_noninstrumented_modules=1" "OMP_TOOL_LIBRARIES=${QTB_ARCHER}")
+elseif(QTB_INSTRUMENT STREQUAL "fuzz")
+  add_compile_options(${qtb_asan} -fsanitize=fuzzer-no-link)
+  add_link_options(${qtb_asan})
+elseif(QTB_INSTRUMENT STREQUAL "coverage")
+  add_compile_options(--coverage)
+  add_link_options(--coverage)
+elseif(QTB_INSTRUMENT)
+  message(FATAL_ERROR "QTB_INSTRUMENT is ${QTB_INSTRUMENT}, not one of asan, tsan, fuzz, coverage")
+endif()

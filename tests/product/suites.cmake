@@ -1,0 +1,11 @@
+# The product as a whole: its object files, and the files that it is built from.
+if(NOT QTB_INSTRUMENT)
+  foreach(tier IN LISTS QTB_TIERS)
+    set(list ${CMAKE_CURRENT_BINARY_DIR}/tier_objects_${tier}.txt)
+    file(GENERATE OUTPUT ${list} CONTENT "$<JOIN:$<TARGET_OBJECTS:qtb_${tier}>,\n>\n")
+    qtb_add_script_test(tier_objects_test.${tier} COMMAND product/tier_objects_test.sh ${tier} ${list})
+  endforeach()
+  qtb_add_script_test(tier_objects_self_test COMMAND product/tier_objects_self_test.sh)
+endif()
+qtb_add_script_test(repository_test COMMAND product/repository_test.sh ${PROJECT_SOURCE_DIR})
+qtb_add_script_test(repository_self_test COMMAND product/repository_self_test.sh)

@@ -1,0 +1,136 @@
+#!/bin/sh
+# tier_objects_test.sh tier file: reads every object of a tier, whose paths file lists, and fails on what would let one
+# tier's code reach a processor of another.
+#
+#   weak or unique symbols   the linker keeps one of several copies, perhaps that of a higher tier
+#   static initialisers      run at load on every processor
+#   instructions             only those of mnemonics/*.txt up to the tier; the wider encoding (VEX, EVEX) only in the
+#                            avx tier's objects that mnemonics/vex_objects.txt names
+#   defined global symbols   only qtb_blas_<tier>_x<name>
+#   undefined symbols        only the library's own, of no other tier, and the memory routines that a compiler calls
+set -eu
+
+tier=$1
+objects=$2
+lists=$(dirname "$0")/mnemonics
+
+case $tier in
+  def) sets="x86-64" ;;
+  sse3) sets="x86-64 sse3" ;;
+  ssse3) sets="x86-64 sse3 ssse3" ;;
+  sse42 | avx) sets="x86-64 sse3 ssse3 sse42" ;;
+  *)
+    echo "tier_objects_test: no instruction set is known for the tier $tier" >&2
+    exit 2
+    ;;
+esac
+
+# One word per line, without comments.
+words() {
+  sed 's/#.*//' "$@" | tr -s ' \t' '\n' | sed '/^$/d'
+}
+
+expected=$(grep -c . "$objects")
+allowed=$(for set in $sets; do words "$lists/$set.txt"; done | tr '\n' ' ')
+wide=
+vex_objects=
+if [ "$tier" = avx ]; then
+  wide=$(words "$lists/avx.txt" | tr '\n' ' ')
+  vex_objects=$(words "$lists/vex_objects.txt" | tr '\n' ' ')
+fi
+
+# awk's exit status is the pipeline's; an object that the disassembler cannot read shows as a missing one.
+xargs "${OBJDUMP:-objdump}" -h -t -d -w -M intel --no-show-raw-insn < "$objects" | awk \
+  -v tier="$tier" -v allowed="$allowed" -v wide="$wide" -v vex_objects="$vex_objects" \
+  -v expected="$expected" '
+  function reject(what) {
+    print object ": " what
+    rejected++
+  }
+  function set_of(text, set,   parts, count, i) {
+    count = split(text, parts, " ")
+    for (i = 1; i <= count; i++) set[parts[i]] = 1
+  }
+  BEGIN {
+    set_of(allowed, is_allowed)
+    set_of(wide, is_wide)
+    set_of(vex_objects, may_be_wide)
+    set_of("memcpy memmove memset memcmp _GLOBAL_OFFSET_TABLE_", is_runtime)
+    set_of("lock rep repz repnz data16 addr32 cs ds es ss notrack bnd", is_prefix)
+  }
+
+  / file format elf64-x86-64$/ {
+    object = $1
+    sub(/:$/, "", object)
+    source = object
+    sub(/.*\//, "", source)
+    sub(/\.o$/, "", source)
+    objects++
+    part = ""
+    next
+  }
+  /^Sections:$/ { part = "sections"; next }
+  /^SYMBOL TABLE:$/ { part = "symbols"; next }
+  /^Disassembly of section / { part = "code"; function_name = ""; next }
+
+  part == "sections" && $2 ~ /^\.(preinit_array|init_array|fini_array|ctors|dtors)/ {
+    reject("static initialiser in section " $2)
+  }
+
+  # An address, a space, seven characters of flags, then section, tab, size, perhaps the visibility, and the name.
+  part == "symbols" && /^[0-9a-f]+ / {
+    symbols++
+    flags = substr($0, 18, 7)
+    section = substr($0, 26)
+    sub(/\t.*/, "", section)
+    name = $NF
+    if (flags ~ /w/) reject("weak symbol " name)
+    else if (flags ~ /u/) reject("unique symbol " name)
+    else if (section == "*COM*") reject("common symbol " name)
+    else if (section == "*UND*") {
+      other = name
+      if (other ~ /^qtb_blas_(def|sse3|ssse3|sse42|avx)_x/ && index(other, "qtb_blas_" tier "_x") != 1)
+        reject("reference to another tier: " name)
+      else if (name !~ /^qtb_/ && !(name in is_runtime))
+        reject("undefined symbol " name)
+    } else if (flags ~ /g/ && index(name, "qtb_blas_" tier "_x") != 1)
+      reject("global symbol " name)
+  }
+
+  part == "code" && /^[0-9a-f]+ <.*>:$/ {
+    function_name = $2
+    gsub(/[<>:]/, "", function_name)
+  }
+  part == "code" && /^ *[0-9a-f]+:\t/ {
+    instructions++
+    text = $0
+    sub(/^ *[0-9a-f]+:\t/, "", text)
+    count = split(text, token, " ")
+    i = 1
+    while (i < count && (token[i] in is_prefix || token[i] ~ /^rex/)) i++
+    mnemonic = token[i]
+    operands = text
+    sub(/[ \t]*[#<].*/, "", operands)
+    if (mnemonic in is_allowed && operands ~ /[yz]mm[0-9]/) reject("wide register in " function_name ": " text)
+    else if (mnemonic in is_allowed && operands ~ /(^|[ ,])mm[0-7]/) reject("MMX register in " function_name ": " text)
+    else if (mnemonic in is_allowed) ;
+    else if (mnemonic ~ /^(v|\{)/) {
+      if (!(source in may_be_wide)) reject("wider encoding in " function_name ": " text)
+      else if (!(mnemonic in is_wide) || operands ~ /zmm|[xy]mm(1[6-9]|2|3)|\{/)
+        reject("above the tier in " function_name ": " text)
+    } else
+      reject("not in the lists of " tier ", in " function_name ": " text)
+  }
+
+  END {
+    if (objects != expected) {
+      print tier ": read " objects + 0 " objects of " expected
+      rejected++
+    }
+    if (instructions == 0 || symbols == 0) {
+      print tier ": nothing to read"
+      rejected++
+    }
+    printf "%s: %d objects, %d symbols, %d instructions, %d rejected\n", tier, objects, symbols, instructions, rejected
+    exit rejected > 0
+  }'
