@@ -170,6 +170,13 @@ inline __m128d mul(__m128d a, __m128d b) { return _mm_mul_pd(a, b); }
 inline __m128 bit_xor(__m128 a, __m128 b) { return _mm_xor_ps(a, b); }
 inline __m128d bit_xor(__m128d a, __m128d b) { return _mm_xor_pd(a, b); }
 
+// The value is computed where it stands in the source: compilers otherwise gather the additions to one accumulator from
+// all over a long pass, into one chain and at the price of spilled registers.
+template <class V>
+[[gnu::always_inline]] inline void keep_in_place(V &v) {
+  __asm__("" : "+x"(v));
+}
+
 // The lowest lanes added or multiplied; the others are a's.
 inline __m128 add_lowest(__m128 a, __m128 b) { return _mm_add_ss(a, b); }
 inline __m128d add_lowest(__m128d a, __m128d b) { return _mm_add_sd(a, b); }
