@@ -37,7 +37,9 @@ struct LaneProducts {
   }
   template <int k, class X, class Y>
   void vector(X &x, Y &y) {
-    add_products<k % 4>(x.load(k), y.load(k));
+    Vec<T> from_y = y.load(k);
+    keep_in_place(from_y);  // or each of its two products would load it
+    add_products<k % 4>(x.load(k), from_y);
   }
   void single(const T *x, const T *y) { add_products<0>(load_lowest(x), load_lowest(y)); }
 };

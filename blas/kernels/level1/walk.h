@@ -83,7 +83,8 @@ struct Rejoined {
   Vec<T> before;
   explicit Rejoined(T *operand) : p(operand), before(load_highest<parts_in_first>(parts(operand))) {}
   auto load(int k) {
-    const Vec<T> next = load_aligned(parts(p) + k * parts_per_vector<T> + parts_in_first);
+    Vec<T> next = load_aligned(parts(p) + k * parts_per_vector<T> + parts_in_first);
+    keep_in_place(next);  // or it would be loaded twice
     const Vec<T> joined = join<offset>(before, next);
     before = next;
     return joined;
