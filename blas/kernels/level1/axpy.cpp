@@ -13,6 +13,7 @@ template <class T>
 struct Update {
   static constexpr bool gathers = true, updates = true;
   Factor<T> alpha;
+  explicit Update(T a) : alpha(a) {}
 
   template <int k, class X, class Y>
   void vector(X &x, Y &y) {
@@ -37,11 +38,9 @@ bool is_zero(T v) {
 template <Row row, class T>
 void axpy(const QtbInt *n, const T *alpha, const T *x, const QtbInt *incx, T *y, const QtbInt *incy) {
   if (*n < 1 || is_zero(*alpha)) return;
-  Walk<const T, T> walk{*n, x, *incx, y, *incy};
-  Update<T> update{Factor<T>(*alpha)};
   constexpr bool backward_is_contiguous = !is_complex<T> || backward_is_contiguous_in_dots;
-  passes<row>(walk, backward_is_contiguous ? same_unit(*incx, *incy) : both_one(*incx, *incy), update);
-  single_passes<1>(walk, update);
+  const bool contiguous = backward_is_contiguous ? same_unit(*incx, *incy) : both_one(*incx, *incy);
+  elementwise<row, Update<T>>(contiguous, *n, x, *incx, y, *incy, alpha);
 }
 
 }  // namespace

@@ -26,15 +26,20 @@ struct LaneProducts {
     if constexpr (duplicates_parts) {
       first[k] = add(first[k], mul(real_parts(x), y));
       second[k] = add(second[k], mul(imaginary_parts(x), y));
-      return;
-    }
+    } else
 #endif
-    first[k] = add(first[k], mul(x, y));
-    second[k] = add(second[k], mul(swap_parts(x), y));
+    {
+      first[k] = add(first[k], mul(x, y));
+      second[k] = add(second[k], mul(swap_parts(x), y));
+    }
+    keep_in_place(first[k]);
+    keep_in_place(second[k]);
   }
   template <int k, class X, class Y>
   void vector(X &x, Y &y) {
-    add_products<k % 4>(x.load(k), y.load(k));
+    Vec<T> from_y = y.load(k);
+    keep_in_place(from_y);  // or each of its two products would load it
+    add_products<k % 4>(x.load(k), from_y);
   }
   void single(const T *x, const T *y) { add_products<0>(load_lowest(x), load_lowest(y)); }
 };
@@ -69,11 +74,11 @@ template <class T>
 struct LaneSums {
   Vec<T> first, second;
 };
-template <Row row, class T>
+template <Row row, bool contiguous, class T>
 [[gnu::noinline]] LaneSums<T> sum_products(QtbInt n, const T *x, QtbInt incx, const T *y, QtbInt incy) {
   Walk<const T, const T> walk{n, x, incx, y, incy};
   LaneProducts<T> products;
-  passes<row>(walk, dot_is_contiguous(incx, incy), products);
+  passes<row, contiguous>(walk, products);
   single_passes<1>(walk, products);
   return {sum_elements(join_accumulators(products.first)), sum_elements(join_accumulators(products.second))};
 }
@@ -82,7 +87,8 @@ template <Row row, bool conjugate, class T>
 T *dot(T *result, const QtbInt *n, const T *x, const QtbInt *incx, const T *y, const QtbInt *incy) {
   Vec<T> value = zero<T>();
   if (*n > 0) {
-    const LaneSums<T> sums = sum_products<row>(*n, x, *incx, y, *incy);
+    const LaneSums<T> sums = dot_is_contiguous(*incx, *incy) ? sum_products<row, true>(*n, x, 1, y, 1)
+                                                             : sum_products<row, false>(*n, x, *incx, y, *incy);
     value = join_parts<conjugate, Real<T>>(sums.first, sums.second);
   }
   store_lowest(result, value);

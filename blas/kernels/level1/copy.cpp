@@ -21,10 +21,7 @@ struct Move {
 template <Row row, class T>
 void copy(const QtbInt *n, const T *x, const QtbInt *incx, T *y, const QtbInt *incy) {
   if (*n < 1) return;
-  Walk<const T, T> walk{*n, x, *incx, y, *incy};
-  Move<T> move;
-  passes<row>(walk, same_unit(*incx, *incy), move);
-  single_passes<1>(walk, move);
+  elementwise<row, Move<T>>(same_unit(*incx, *incy), *n, x, *incx, y, *incy);
 }
 
 template <auto real_copy, class T>

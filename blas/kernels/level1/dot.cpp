@@ -17,6 +17,7 @@ struct Products {
   template <int k, class X, class Y>
   void vector(X &x, Y &y) {
     sum[k % 4] = add(sum[k % 4], mul(x.load(k), y.load(k)));
+    keep_in_place(sum[k % 4]);
   }
   void single(const T *x, const T *y) { sum[0] = add_lowest(sum[0], mul_lowest(load_lowest(x), load_lowest(y))); }
 };
@@ -27,12 +28,11 @@ struct SingleProducts {
   void single(const T *x, const T *y) { sum += load_single(x) * load_single(y); }
 };
 
-template <Row row, class T>
-T dot(const QtbInt *n, const T *x, const QtbInt *incx, const T *y, const QtbInt *incy) {
-  if (*n < 1) return 0;
-  Walk<const T, const T> walk{*n, x, *incx, y, *incy};
+template <Row row, bool contiguous, class T>
+[[gnu::noinline]] T sum_products(QtbInt n, const T *x, QtbInt incx, const T *y, QtbInt incy) {
+  Walk<const T, const T> walk{n, x, incx, y, incy};
   Products<T> products;
-  passes<row>(walk, dot_is_contiguous(*incx, *incy), products);
+  passes<row, contiguous>(walk, products);
   if constexpr (joining == in_pairs) {
     SingleProducts<T> rest{sum_lanes(join_accumulators(products.sum))};
     single_passes<1>(walk, rest);
@@ -41,6 +41,13 @@ T dot(const QtbInt *n, const T *x, const QtbInt *incx, const T *y, const QtbInt 
     single_passes<1>(walk, products);
     return sum_lanes(join_accumulators(products.sum));
   }
+}
+
+template <Row row, class T>
+T dot(const QtbInt *n, const T *x, const QtbInt *incx, const T *y, const QtbInt *incy) {
+  if (*n < 1) return 0;
+  if (dot_is_contiguous(*incx, *incy)) return sum_products<row, true>(*n, x, 1, y, 1);
+  return sum_products<row, false>(*n, x, *incx, y, *incy);
 }
 
 }  // namespace

@@ -14,16 +14,17 @@ template <class T>
 struct Scaling {
   static constexpr bool gathers = true, updates = true;
   Factor<T> alpha;
+  explicit Scaling(T a) : alpha(a) {}
 
   template <int k, class X, class Y>
-  void vector(X &x, Y &y) {
-    y.store(k, alpha.times(x.load(k)));
+  void vector(X &, Y &x) {
+    x.store(k, alpha.times(x.load(k)));
   }
-  void single(const T *, T *y) const {
+  void single(const T *, T *x) const {
     if constexpr (is_complex<T>)
-      store_lowest(y, alpha.times(load_repeated(y)));
+      store_lowest(x, alpha.times(load_repeated(x)));
     else
-      store_single(y, alpha.value * load_single(y));
+      store_single(x, alpha.value * load_single(x));
   }
 };
 
@@ -40,19 +41,16 @@ void scal(const QtbInt *n, const T *alpha, T *x, const QtbInt *incx) {
   if (*n < 1) return;
   if constexpr (returns_for_one<row>)
     if (is_one(*alpha)) return;
-  Scaling<T> scaling{Factor<T>(*alpha)};
   const QtbInt inc = *incx < 0 ? -*incx : *incx;
-  Walk<T, T> walk{*n, x, inc, x, inc};
-  passes<row>(walk, inc == 1, scaling);
-  single_passes<1>(walk, scaling);
+  elementwise<row, Scaling<T>>(inc == 1, *n, x, inc, x, inc, alpha);
 }
 
 // A complex element times a real number: both parts times that number.
 template <class T>
 struct PartScaling {
   Real<T> alpha;
-  void single(const T *, T *y) const {
-    Real<T> *part = parts(y);
+  void single(const T *, T *x) const {
+    Real<T> *part = parts(x);
     store_single(part, alpha * load_single(part));
     store_single(part + 1, alpha * load_single(part + 1));
   }

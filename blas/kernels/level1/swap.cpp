@@ -26,10 +26,7 @@ struct Exchange {
 template <Row row, class T>
 void swap(const QtbInt *n, T *x, const QtbInt *incx, T *y, const QtbInt *incy) {
   if (*n < 1) return;
-  Walk<T, T> walk{*n, x, *incx, y, *incy};
-  Exchange<T> exchange;
-  passes<row>(walk, same_unit(*incx, *incy), exchange);
-  single_passes<1>(walk, exchange);
+  elementwise<row, Exchange<T>>(same_unit(*incx, *incy), *n, x, *incx, y, *incy);
 }
 
 // Elements as wide as a vector: side by side they are twice as many doubles, from the tier on whose dswap gains by it.

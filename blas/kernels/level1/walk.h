@@ -83,7 +83,8 @@ struct Rejoined {
   Vec<T> before;
   explicit Rejoined(T *operand) : p(operand), before(load_highest<parts_in_first>(parts(operand))) {}
   auto load(int k) {
-    const Vec<T> next = load_aligned(parts(p) + k * parts_per_vector<T> + parts_in_first);
+    Vec<T> next = load_aligned(parts(p) + k * parts_per_vector<T> + parts_in_first);
+    keep_in_place(next);  // or it would be loaded twice
     const Vec<T> joined = join<offset>(before, next);
     before = next;
     return joined;
@@ -207,22 +208,41 @@ template <Row row, class X, class Y, class Body>
   }
 }
 
-// All but the last single elements of a walk that starts at its operands' lowest addresses if it is contiguous, and
-// else where the published convention has it; single_passes<1> with the same or another body does the rest.
-template <Row row, class X, class Y, class Body>
-[[gnu::always_inline]] inline void passes(Walk<X, Y> &walk, bool contiguous, Body &body) {
-  if (contiguous) {
+// All but the last single elements of a walk from the operands' lowest addresses, if contiguous, or from where the
+// published convention has it. single_passes<1> with the same or another body does the rest.
+template <Row row, bool contiguous, class X, class Y, class Body>
+[[gnu::always_inline]] inline void passes(Walk<X, Y> &walk, Body &body) {
+  constexpr Tuning sizes = tuning<row>;
+  if constexpr (contiguous) {
     walk.incx = walk.incy = 1;
   } else {
     walk.x = walk_start(walk.x, walk.n, walk.incx);
     walk.y = walk_start(walk.y, walk.n, walk.incy);
   }
-  if constexpr (tuning<row>.short_limit > 0)
-    if (walk.n < tuning<row>.short_limit || !element_aligned(walk.x) || !element_aligned(walk.y)) return;
-  if (contiguous)
+  if constexpr (sizes.short_limit > 0)
+    if (walk.n < sizes.short_limit || !element_aligned(walk.x) || !element_aligned(walk.y)) return;
+  if constexpr (contiguous)
     contiguous_passes<row>(walk, body);
   else
     strided_passes<row>(walk, body);
+}
+
+// A kernel that stores element by element: all of its walk, with a body made from the factor, if it has one. Each form
+// is a procedure of its own, so that the contiguous one does not save the registers that the strided one needs.
+template <Row row, bool contiguous, class Body, class X, class Y, class... Alpha>
+[[gnu::noinline]] void all_elements(QtbInt n, X *x, QtbInt incx, Y *y, QtbInt incy, const Alpha *...alpha) {
+  Walk<X, Y> walk{n, x, incx, y, incy};
+  Body body{*alpha...};
+  passes<row, contiguous>(walk, body);
+  single_passes<1>(walk, body);
+}
+template <Row row, class Body, class X, class Y, class... Alpha>
+[[gnu::always_inline]] inline void elementwise(bool contiguous, QtbInt n, X *x, QtbInt incx, Y *y, QtbInt incy,
+                                               const Alpha *...alpha) {
+  if (contiguous)
+    all_elements<row, true, Body>(n, x, incx, y, incy, alpha...);
+  else
+    all_elements<row, false, Body>(n, x, incx, y, incy, alpha...);
 }
 
 // Whether two increments are both 1 or both -1. Their product would say the same but for overflow.

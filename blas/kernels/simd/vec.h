@@ -170,6 +170,13 @@ inline __m128d mul(__m128d a, __m128d b) { return _mm_mul_pd(a, b); }
 inline __m128 bit_xor(__m128 a, __m128 b) { return _mm_xor_ps(a, b); }
 inline __m128d bit_xor(__m128d a, __m128d b) { return _mm_xor_pd(a, b); }
 
+// The value is computed here, once and in a register. Left alone, compilers repeat loads, and gather the additions to
+// one accumulator from all over a long pass into one chain, at the price of spilled registers.
+template <class V>
+[[gnu::always_inline]] inline void keep_in_place(V &v) {
+  __asm__("" : "+x"(v));
+}
+
 // The lowest lanes added or multiplied; the others are a's.
 inline __m128 add_lowest(__m128 a, __m128 b) { return _mm_add_ss(a, b); }
 inline __m128d add_lowest(__m128d a, __m128d b) { return _mm_add_sd(a, b); }
@@ -243,10 +250,16 @@ struct Factor<Complex<R>> {
   Vec<R> re, im;
 #if defined(__SSE3__)
   explicit Factor(Complex<R> v) : re(broadcast(v.re)), im(broadcast(v.im)) {}
-  Vec<R> times(Vec<R> x) const { return add_subtract(mul(re, x), mul(im, swap_parts(x))); }
+  Vec<R> times(Vec<R> x) const {
+    keep_in_place(x);
+    return add_subtract(mul(re, x), mul(im, swap_parts(x)));
+  }
 #else
   explicit Factor(Complex<R> v) : re(broadcast(v.re)), im(alternate(-v.im, v.im)) {}
-  Vec<R> times(Vec<R> x) const { return add(mul(re, x), mul(im, swap_parts(x))); }
+  Vec<R> times(Vec<R> x) const {
+    keep_in_place(x);
+    return add(mul(re, x), mul(im, swap_parts(x)));
+  }
 #endif
 };
 
