@@ -3,3 +3,22 @@ qtb_add_test(cache_test SOURCES service/cache_test.cpp LIBRARIES qtb_static qtb_
 qtb_add_test(thread_settings_test SOURCES service/thread_settings_test.cpp fuzz/environment_fuzz.cpp
   LIBRARIES qtb_static qtb_platform_fake)
 target_compile_definitions(thread_settings_test PRIVATE QTB_TEST_CORPUS="${CMAKE_CURRENT_SOURCE_DIR}/fuzz/corpus")
+qtb_add_test(cores_test SOURCES service/cores_test.cpp LIBRARIES qtb_static qtb_platform_fake)
+qtb_add_test(threads_test SOURCES service/threads_test.cpp LIBRARIES qtb_static qtb_platform_fake)
+qtb_add_test(memory_test SOURCES service/memory_test.cpp LIBRARIES qtb_static qtb_platform_fake)
+
+# On the real operating system: a program that is started under different circumstances, and an allocator library.
+add_executable(service_facts service/facts.cpp)
+target_include_directories(service_facts PRIVATE ${PROJECT_SOURCE_DIR})
+target_link_libraries(service_facts PRIVATE qtb_static qtb_platform_static OpenMP::OpenMP_CXX ${CMAKE_DL_LIBS})
+foreach(variant complete three_hooks null_hook)
+  add_library(qmalloc_${variant} MODULE service/qmalloc.cpp)
+  string(TOUPPER QMALLOC_${variant} definition)
+  target_compile_definitions(qmalloc_${variant} PRIVATE ${definition})
+  set_target_properties(qmalloc_${variant} PROPERTIES OUTPUT_NAME qmalloc
+    LIBRARY_OUTPUT_DIRECTORY ${CMAKE_CURRENT_BINARY_DIR}/qmalloc/${variant})
+endforeach()
+qtb_add_test(linux_test SOURCES service/linux_test.cpp LIBRARIES qtb_static qtb_platform_static)
+target_compile_definitions(linux_test PRIVATE QTB_TEST_FACTS="$<TARGET_FILE:service_facts>"
+  QTB_TEST_QMALLOC="${CMAKE_CURRENT_BINARY_DIR}/qmalloc")
+add_dependencies(linux_test service_facts qmalloc_complete qmalloc_three_hooks qmalloc_null_hook)
