@@ -163,7 +163,7 @@ TEST(Entries, each_takes_its_way_with_its_arguments_as_they_came) {
     steps.clear();
     EXPECT_TRUE(entry.call()) << entry.name << " must give back what it got";
     ASSERT_EQ(steps.size(), entry.has_checker ? 2U : 1U) << entry.name;
-    if (entry.has_checker) EXPECT_EQ(steps.front().what, "check") << entry.name;
+    EXPECT_EQ(steps.front().what == "check", entry.has_checker) << entry.name;
     EXPECT_EQ(steps.back().what, drivers.count(entry.name) != 0 ? "driver" : "slot") << entry.name;
     for (const Step &step : steps) EXPECT_TRUE(is_as_passed(step, entry)) << entry.name << " " << step.what;
     checked += entry.has_checker;
