@@ -1,6 +1,7 @@
 /*
  * QTB: dense linear-algebra kernels for 64-bit x86. The Basic Linear Algebra Subprograms of levels 1, 2 and 3 and the
- * sparse ones of level 1, in lower and upper case, for C and C++.
+ * sparse ones of level 1, in lower and upper case, for C and C++. One comment stands above all the types of a family;
+ * the file is long because every routine has its prototype.
  *
  * Calling convention
  *   Every argument is a pointer to the caller's variable, also scalars, dimensions and options; QTBGetVersionString

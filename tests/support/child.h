@@ -1,4 +1,5 @@
-// A piece of a test in a process of its own: state that a process sets once can so be set anew for every case.
+// A piece of a test in a process of its own: state that a process sets once can so be set anew for every case, and what
+// a process prints or dies of can be looked at.
 #pragma once
 
 #include <gtest/gtest.h>
@@ -6,6 +7,8 @@
 #include <unistd.h>
 
 #include <cstdio>
+#include <cstdlib>
+#include <string>
 
 namespace qtb::test {
 
@@ -26,6 +29,36 @@ void in_child(Body body, unsigned seconds = 20) {
   ASSERT_EQ(waitpid(child, &status, 0), child);
   ASSERT_TRUE(WIFEXITED(status)) << "the child ended with signal " << WTERMSIG(status);
   EXPECT_EQ(WEXITSTATUS(status), 0) << "the child failed";
+}
+
+struct ChildResult {
+  int exit_status = -1;  // -1 where a signal ended it
+  std::string output;    // what it wrote to standard output
+};
+
+// Runs body in a forked child, ended by an alarm after so many seconds, and returns how it ended. Where body returns,
+// the child ends with status 0 and without flushing its streams, so that only what the code under test flushed is seen.
+template <class Body>
+ChildResult capture_child(Body body, unsigned seconds = 20) {
+  std::fflush(nullptr);
+  std::FILE *const captured = std::tmpfile();
+  if (captured == nullptr) std::abort();
+  const pid_t child = fork();
+  if (child < 0) std::abort();
+  if (child == 0) {
+    alarm(seconds);
+    dup2(fileno(captured), STDOUT_FILENO);
+    body();
+    _exit(0);
+  }
+  ChildResult result;
+  int status = 0;
+  if (waitpid(child, &status, 0) == child && WIFEXITED(status)) result.exit_status = WEXITSTATUS(status);
+  std::rewind(captured);
+  char chunk[4096];
+  for (std::size_t got; (got = std::fread(chunk, 1, sizeof chunk, captured)) > 0;) result.output.append(chunk, got);
+  std::fclose(captured);
+  return result;
 }
 
 }  // namespace qtb::test

@@ -1,0 +1,8 @@
+qtb_add_test(entry_checks SOURCES entry/checks_test.cpp LIBRARIES qtb_static)
+qtb_add_test(entry_entries SOURCES entry/entries_test.cpp LIBRARIES qtb_static)
+qtb_add_test(entry_header SOURCES entry/header_test.cpp entry/header_c.c)
+qtb_add_test(entry_lsame SOURCES entry/lsame_test.cpp LIBRARIES qtb_static)
+qtb_add_test(entry_messages SOURCES entry/messages_test.cpp platform/fake_messages.cpp LIBRARIES qtb_static)
+qtb_add_test(entry_catalog SOURCES entry/catalog_test.cpp LIBRARIES qtb_static qtb_platform_static)
+qtb_add_test(entry_version SOURCES entry/version_test.cpp LIBRARIES qtb_static)
+qtb_add_test(entry_xerbla SOURCES entry/xerbla_test.cpp platform/fake_messages.cpp LIBRARIES qtb_static)
