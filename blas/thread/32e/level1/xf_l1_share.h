@@ -19,13 +19,12 @@ struct Level1Share {
 };
 
 // The share of thread rank, 0 to team - 1. The shares are disjoint and cover the n elements. All are equal but the
-// last, which takes the remainder; where the equal part is nothing, the last is the whole vector. An empty share starts
-// inside the vector too.
+// last, which takes the remainder; where the equal part is nothing, the last is the whole vector. Empty shares too
+// start inside the vector; below n of 1 no share has a positive length.
 inline Level1Share level1_share(QtbInt n, QtbInt team, QtbInt rank) {
   const QtbInt chunk = n / team / level1_grain * level1_grain;
-  const QtbInt begin = chunk * rank;
-  const QtbInt rest = n - begin > 0 ? n - begin : 0;
-  return {begin < n - 1 ? begin : n - 1, rank == team - 1 ? rest : chunk};
+  const QtbInt start = chunk * rank;
+  return {start, rank == team - 1 ? n - start : chunk};
 }
 
 // What to add to a vector's pointer, in elements, to pass a share of it as a vector of its own. By the published
