@@ -6,6 +6,7 @@
 #include <vector>
 
 #include "tests/product/program.h"
+#include "tests/product/surface/level1_shapes.h"
 #include "tests/product/surface/level2_shapes.h"
 #include "tests/product/surface/level3_shapes.h"
 #include "tests/product/surface/sweeps.h"
@@ -22,6 +23,8 @@ void *open_library() {
 
 template <ShapeName shape, class T, class Function>
 void add(void *library, const char *name) {
+  // Generation of rotations differs by design in signs and special cases.
+  if (std::strstr(name, "rotg") != nullptr || std::strstr(name, "rotmg") != nullptr) return;
   void *symbol = dlsym(library, (std::string(name) + "_").c_str());
   if (symbol != nullptr) register_sweeps<shape, T>(Routine<Function>(name, symbol));
 }

@@ -42,11 +42,12 @@ inline bool is_value(QuadComplex v, int value) { return v.re == value && v.im ==
 // Where a storage form keeps element (i, j) of a matrix, and which elements it keeps: those at most below under the
 // diagonal and at most above over it. A vector is a matrix of one column.
 struct Layout {
-  enum class Form { full, band, packed_upper, packed_lower, strided };
+  enum class Form { full, band, packed_upper, packed_lower, strided, indexed };
   Form form;
   QtbInt rows, cols;
   QtbInt below, above;
-  QtbInt step;  // leading dimension or increment
+  QtbInt step;                    // leading dimension or increment
+  const QtbInt *index = nullptr;  // one-based positions of a sparse vector's elements
 
   bool stores(QtbInt i, QtbInt j) const { return i - j <= below && j - i <= above; }
   QtbInt position(QtbInt i, QtbInt j) const {
@@ -61,6 +62,7 @@ struct Layout {
         return i + j * (2 * rows - j - 1) / 2;
       case Form::strided:
         return step >= 0 ? i * step : (i - (rows - 1)) * step;
+      case Form::indexed: return index[i] - 1;
     }
     return 0;
   }
@@ -91,6 +93,7 @@ inline Layout packed_triangle(char uplo, QtbInt n) {
   return {Layout::Form::packed_lower, n, n, n, 0, 0};
 }
 inline Layout strided(QtbInt n, QtbInt increment) { return {Layout::Form::strided, n, 1, n, 1, increment}; }
+inline Layout indexed(QtbInt n, const QtbInt *index) { return {Layout::Form::indexed, n, 1, n, 1, 0, index}; }
 
 // What the elements that a storage form does not keep are, and what its diagonal means.
 enum class Structure { general, symmetric, hermitian, triangular, unit_triangular };

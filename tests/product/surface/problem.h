@@ -27,8 +27,10 @@ class Draw {
     return least + static_cast<QtbInt>(bits() % static_cast<std::uint64_t>(most - least + 1));
   }
   bool one_in(QtbInt n) { return integer(1, n) == 1; }
-  // In (-1, 1), with 24 bits, so that it is the same number in both precisions.
-  double real() { return static_cast<double>(integer(-0xFFFFFF, 0xFFFFFF)) * 0x1p-24; }
+  // In (-1, 1), with all the digits of a double; a float takes what fits.
+  double real() {
+    return static_cast<double>(static_cast<std::int64_t>(bits() >> 10) - (std::int64_t{1} << 53)) * 0x1p-53;
+  }
   template <class C>
   auto one_of(const C &choices) {
     return std::begin(choices)[integer(0, static_cast<QtbInt>(std::size(choices)) - 1)];

@@ -17,6 +17,7 @@ namespace qtb::surface {
 using reference::Expectation;
 using reference::Expected;
 using reference::Outcome;
+using test::magnitude;
 using test::Quad;
 using test::QuadComplex;
 
@@ -111,13 +112,14 @@ class Session {
     tally().worst = std::fmax(tally().worst, worst);
   }
 
-  // A result that is not an array.
+  // A result that is not an array, and a difference of type T that must vanish.
   template <class T>
   void judge_value(T got, QuadComplex want, double gauge, double roundings) {
-    const Expected expected{want, gauge, Outcome::value};
-    const double ratio = this->ratio(expected, got, Expectation{{}, roundings, 1, {}});
-    if (ratio > limit()) fail("error / bound %g of the result", ratio);
-    tally().worst = std::fmax(tally().worst, ratio);
+    judge_one(got, {want, gauge, Outcome::value}, roundings);
+  }
+  template <class T>
+  void judge_residual(Quad residual, double gauge, double roundings) {
+    judge_one(T{}, {{residual, 0}, gauge, Outcome::residual}, roundings);
   }
   void require(bool holds, const char *what) {
     if (!holds) fail("%s", what);
@@ -129,6 +131,12 @@ class Session {
   // A rounding towards one side errs by up to twice as much.
   double limit() const { return surroundings_.rounds_to_nearest() ? 1 : 2; }
 
+  template <class T>
+  void judge_one(T got, const Expected &want, double roundings) {
+    const double ratio = this->ratio(want, got, Expectation{{}, roundings, 1, {}});
+    if (ratio > limit()) fail("error / bound %g of the result", ratio);
+    tally().worst = std::fmax(tally().worst, ratio);
+  }
   template <class T>
   double ratio(const Expected &want, T got, const Expectation &e) const {
     constexpr double wrong = std::numeric_limits<double>::infinity();
