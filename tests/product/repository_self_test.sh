@@ -49,6 +49,10 @@ printf 'int n;\r\n' >> blas/types.h
 expect return "blas/types.h:3: carriage return"
 printf '// %0121d\n' 0 >> blas/types.h
 expect long "blas/types.h:3: line of 124 characters"
+printf '// clang-format off\n// %0121d\n' 0 >> blas/types.h
+expect table ""
+printf '// clang-format off\n// clang-format on\n// %0121d\n' 0 >> blas/types.h
+expect "behind a table" "blas/types.h:5: line of 124 characters"
 printf '// TO''DO: later\n' >> blas/types.h
 expect later "blas/types.h:3: a note for later"
 printf 'int n;' >> blas/types.h

@@ -42,10 +42,22 @@ extern "C" double qtb_blas_def_xclean(double *x, const double *y) {
 END
 expect def clean ""
 
-compile baseline "" <<'END'
-extern "C" void qtb_blas_ssse3_xb(double *x) { x[0] += x[1]; }
+compile stray "" <<'END'
+extern "C" void stray(double *x) { x[0] += x[1]; }
 END
-expect def baseline "global symbol qtb_blas_ssse3_xb"
+expect def stray "global symbol stray"
+
+compile named "" <<'END'
+extern "C" void qtb_blas_ssse3_xnamed(double *x) { x[0] += x[1]; }
+END
+expect def named "global symbol qtb_blas_ssse3_xnamed"
+expect avx named "global symbol qtb_blas_ssse3_xnamed"
+
+compile shared "" <<'END'
+extern "C" void qtb_blas_sse42_xshared(double *x) { x[0] += x[1]; }
+extern "C" void qtb_blas_avx_xshared(double *x) __attribute__((alias("qtb_blas_sse42_xshared")));
+END
+expect sse42 shared ""
 
 compile weak "" <<'END'
 inline int shared(int n) { return n * n; }

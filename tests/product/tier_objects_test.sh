@@ -6,7 +6,7 @@
 #   static initialisers      run at load on every processor
 #   instructions             only those of mnemonics/*.txt up to the tier; the wider encoding (VEX, EVEX) only in the
 #                            avx tier's objects that mnemonics/vex_objects.txt names
-#   defined global symbols   only qtb_blas_<tier>_x<name>
+#   defined global symbols   only qtb_blas_<tier>_x<name>, and a higher tier's name for the same procedure
 #   undefined symbols        only the library's own, of no other tier, and the memory routines that a compiler calls
 set -eu
 
@@ -51,7 +51,21 @@ xargs "${OBJDUMP:-objdump}" -h -t -d -w -M intel --no-show-raw-insn < "$objects"
     count = split(text, parts, " ")
     for (i = 1; i <= count; i++) set[parts[i]] = 1
   }
+  # The rank of the tier in a name qtb_blas_<tier>_x..., 0 without one.
+  function rank_of(name,   word) {
+    split(name, word, "_")
+    return name ~ /^qtb_blas_[a-z0-9]+_x/ ? rank[word[3]] : 0
+  }
+  # At the end of an object: a name of a higher tier stands for a procedure that has a name of this one.
+  function settle(   name) {
+    for (name in borrowed)
+      if (!(borrowed[name] in procedures)) reject("global symbol " name)
+    split("", borrowed)
+    split("", procedures)
+  }
   BEGIN {
+    split("def sse3 ssse3 sse42 avx", order, " ")
+    for (i in order) rank[order[i]] = i
     set_of(allowed, is_allowed)
     set_of(wide, is_wide)
     set_of(vex_objects, may_be_wide)
@@ -60,6 +74,7 @@ xargs "${OBJDUMP:-objdump}" -h -t -d -w -M intel --no-show-raw-insn < "$objects"
   }
 
   / file format elf64-x86-64$/ {
+    settle()
     object = $1
     sub(/:$/, "", object)
     source = object
@@ -88,13 +103,14 @@ xargs "${OBJDUMP:-objdump}" -h -t -d -w -M intel --no-show-raw-insn < "$objects"
     else if (flags ~ /u/) reject("unique symbol " name)
     else if (section == "*COM*") reject("common symbol " name)
     else if (section == "*UND*") {
-      other = name
-      if (other ~ /^qtb_blas_(def|sse3|ssse3|sse42|avx)_x/ && index(other, "qtb_blas_" tier "_x") != 1)
-        reject("reference to another tier: " name)
-      else if (name !~ /^qtb_/ && !(name in is_runtime))
-        reject("undefined symbol " name)
-    } else if (flags ~ /g/ && index(name, "qtb_blas_" tier "_x") != 1)
-      reject("global symbol " name)
+      if (rank_of(name) && rank_of(name) != rank[tier]) reject("reference to another tier: " name)
+      else if (name !~ /^qtb_/ && !(name in is_runtime)) reject("undefined symbol " name)
+    } else if (flags ~ /g/) {
+      place = section " " substr($0, 1, 16)
+      if (rank_of(name) == rank[tier]) procedures[place] = 1
+      else if (rank_of(name) > rank[tier]) borrowed[name] = place
+      else reject("global symbol " name)
+    }
   }
 
   part == "code" && /^[0-9a-f]+ <.*>:$/ {
@@ -123,6 +139,7 @@ xargs "${OBJDUMP:-objdump}" -h -t -d -w -M intel --no-show-raw-insn < "$objects"
   }
 
   END {
+    settle()
     if (objects != expected) {
       print tier ": read " objects + 0 " objects of " expected
       rejected++
