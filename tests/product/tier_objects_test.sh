@@ -6,7 +6,7 @@
 #   static initialisers      run at load on every processor
 #   instructions             only those of mnemonics/*.txt up to the tier; the wider encoding (VEX, EVEX) only in the
 #                            avx tier's objects that mnemonics/vex_objects.txt names
-#   defined global symbols   only qtb_blas_<tier>_x<name>
+#   defined global symbols   only qtb_blas_<tier>_x<name>, and what mnemonics/shared_names.txt lists for the tier
 #   undefined symbols        only the library's own, of no other tier, and the memory routines that a compiler calls
 set -eu
 
@@ -30,6 +30,7 @@ words() {
   sed 's/#.*//' "$@" | tr -s ' \t' '\n' | sed '/^$/d'
 }
 
+shared_names=$(words "$lists/shared_names.txt" | sed -n "s/^$tier://p" | tr '\n' ' ')
 expected=$(grep -c . "$objects")
 allowed=$(for set in $sets; do words "$lists/$set.txt"; done | tr '\n' ' ')
 wide=
@@ -42,7 +43,7 @@ fi
 # awk's exit status is the pipeline's; an object that the disassembler cannot read shows as a missing one.
 xargs "${OBJDUMP:-objdump}" -h -t -d -w -M intel --no-show-raw-insn < "$objects" | awk \
   -v tier="$tier" -v allowed="$allowed" -v wide="$wide" -v vex_objects="$vex_objects" \
-  -v expected="$expected" '
+  -v shared_names="$shared_names" -v expected="$expected" '
   function reject(what) {
     print object ": " what
     rejected++
@@ -55,6 +56,7 @@ xargs "${OBJDUMP:-objdump}" -h -t -d -w -M intel --no-show-raw-insn < "$objects"
     set_of(allowed, is_allowed)
     set_of(wide, is_wide)
     set_of(vex_objects, may_be_wide)
+    set_of(shared_names, is_shared)
     set_of("memcpy memmove memset memcmp _GLOBAL_OFFSET_TABLE_", is_runtime)
     set_of("lock rep repz repnz data16 addr32 cs ds es ss notrack bnd", is_prefix)
   }
@@ -93,7 +95,7 @@ xargs "${OBJDUMP:-objdump}" -h -t -d -w -M intel --no-show-raw-insn < "$objects"
         reject("reference to another tier: " name)
       else if (name !~ /^qtb_/ && !(name in is_runtime))
         reject("undefined symbol " name)
-    } else if (flags ~ /g/ && index(name, "qtb_blas_" tier "_x") != 1)
+    } else if (flags ~ /g/ && index(name, "qtb_blas_" tier "_x") != 1 && !(name in is_shared))
       reject("global symbol " name)
   }
 
