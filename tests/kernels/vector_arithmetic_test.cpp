@@ -1,0 +1,253 @@
+// The arithmetic of the basic vector kernels: in what order a dot product is summed, and that no kernel depends on or
+// disturbs the floating-point state.
+
+#include <fenv.h>
+#include <xmmintrin.h>
+
+#include <limits>
+
+#include "tests/kernels/vector_routines.h"
+
+namespace qtb::test {
+namespace {
+
+// ---- The order of summation ----
+
+enum class Joined { in_a_chain, in_pairs };
+
+// A dot product of aligned vectors, element by element in the order of a tier: four accumulators of a vector's lanes,
+// which take the vectors in turn; a tail of less than a vector goes to lane 0 of the first accumulator before the join
+// (in a chain), or to the sum after it (in pairs). n is whole passes of the main loop and such a tail.
+template <class T>
+T modelled_dot(QtbInt n, const T *x, const T *y, Joined joined) {
+  constexpr int lanes = 16 / static_cast<int>(sizeof(T));
+  T a[4][lanes] = {};
+  const QtbInt vectors = n / lanes;
+  for (QtbInt v = 0; v < vectors; ++v)
+    for (int lane = 0; lane < lanes; ++lane) a[v % 4][lane] += x[v * lanes + lane] * y[v * lanes + lane];
+  T lane_sum[lanes];
+  if (joined == Joined::in_a_chain) {
+    for (QtbInt i = vectors * lanes; i < n; ++i) a[0][0] += x[i] * y[i];
+    for (int lane = 0; lane < lanes; ++lane) lane_sum[lane] = ((a[0][lane] + a[1][lane]) + a[2][lane]) + a[3][lane];
+  } else {
+    for (int lane = 0; lane < lanes; ++lane) lane_sum[lane] = (a[3][lane] + a[2][lane]) + (a[1][lane] + a[0][lane]);
+  }
+  T sum = lanes == 2 ? lane_sum[0] + lane_sum[1]
+                     : (lane_sum[0] + lane_sum[2 % lanes]) + (lane_sum[1] + lane_sum[3 % lanes]);
+  if (joined == Joined::in_pairs)
+    for (QtbInt i = vectors * lanes; i < n; ++i) sum += x[i] * y[i];
+  return sum;
+}
+
+template <class T>
+void expect_order(const Dot<T> &routine, int tier, QtbInt pass, Joined joined) {
+  if (!processor_runs(tier)) return;
+  constexpr QtbInt longest = 1000;
+  int told_apart = 0;
+  for (std::uint64_t seed = 0; seed < 20; ++seed) {
+    const Image<T> image_x(longest, 1, random_values<T>(longest, 2 * seed).data());
+    const Image<T> image_y(longest, 1, random_values<T>(longest, 2 * seed + 1).data());
+    Room room_x(image_x.size()), room_y(image_y.size());
+    const T *x = image_x.put(room_x.at(0)), *y = image_y.put(room_y.at(0));
+    for (QtbInt passes = 1; passes * pass + 3 < longest; ++passes)
+      for (QtbInt tail = 0; tail < 16 / QtbInt{sizeof(T)}; ++tail) {
+        const QtbInt n = passes * pass + tail;
+        const T got = routine.call(tier, n, x, 1, y, 1);
+        ASSERT_EQ(got, modelled_dot(n, x, y, joined)) << routine.name << ' ' << tier_name(tier) << " n " << n;
+        told_apart += got != modelled_dot(n, x, y, joined == Joined::in_pairs ? Joined::in_a_chain : Joined::in_pairs);
+      }
+  }
+  EXPECT_GT(told_apart, 0);
+}
+
+TEST(VectorArithmetic, def_joins_the_accumulators_of_a_dot_in_a_chain) {
+  expect_order(dot_of<double>("ddot", ddot_tiers), tier_def, 16, Joined::in_a_chain);
+  expect_order(dot_of<float>("sdot", sdot_tiers), tier_def, 32, Joined::in_a_chain);
+}
+
+TEST(VectorArithmetic, sse42_and_avx_join_the_accumulators_of_a_dot_in_pairs) {
+  for (const int tier : {tier_sse42, tier_avx}) {
+    expect_order(dot_of<double>("ddot", ddot_tiers), tier, 32, Joined::in_pairs);
+    expect_order(dot_of<float>("sdot", sdot_tiers), tier, 64, Joined::in_pairs);
+  }
+}
+
+TEST(VectorArithmetic, a_dot_gives_the_same_bits_for_the_same_alignment) {
+  for_each_dot([]<class T>(const Dot<T> &routine) {
+    const QtbInt n = 333;
+    const Image<T> x(n, 1, random_values<T>(n, 1).data()), y(n, 1, random_values<T>(n, 2).data());
+    Room room_x(x.size() + 512), room_y(y.size() + 512);
+    for_each_tier([&](int tier) {
+      // The upper tiers do not look at the alignment of contiguous operands at all.
+      const bool any_phase = tier >= tier_sse42;
+      const T at_boundaries = routine.call(tier, n, x.put(room_x.at(0)), 1, y.put(room_y.at(0)), 1);
+      for (int phase_x = 0; phase_x < 16; ++phase_x)
+        for (int phase_y = 0; phase_y < 16; ++phase_y) {
+          const T want = any_phase ? at_boundaries
+                                   : routine.call(tier, n, x.put(room_x.at(phase_x)), 1, y.put(room_y.at(phase_y)), 1);
+          for (int distance = 0; distance < 512; distance += 176) {
+            const T got = routine.call(tier, n, x.put(room_x.at(phase_x) + distance), 1,
+                                       y.put(room_y.at(phase_y) + 512 - 16 - distance), 1);
+            ASSERT_TRUE(same_bits(got, want)) << routine.name << ' ' << tier_name(tier);
+          }
+        }
+    });
+  });
+}
+
+// ---- The floating-point state ----
+
+constexpr QtbInt increments[][2] = {{1, 1}, {-1, -1}, {1, -2}, {3, 1}, {2, 2}};
+
+// f(n, incx, incy, phase_x, phase_y) over lengths, increments and, for contiguous operands, all phases.
+template <class F>
+void for_each_way(QtbInt longest, F &&f) {
+  for (QtbInt n = 0; n <= longest; ++n)
+    for (const auto &[incx, incy] : increments)
+      for (int phase_x = 0; phase_x < 16; ++phase_x)
+        for (int phase_y = 0; phase_y < 16; ++phase_y)
+          if ((phase_x * 5 + phase_y + n) % (incx == 1 && incy == 1 ? 4 : 32) == 0) f(n, incx, incy, phase_x, phase_y);
+}
+
+class TrapsInvalid {
+ public:
+  TrapsInvalid() {
+    feclearexcept(FE_ALL_EXCEPT);
+    feenableexcept(FE_INVALID);
+  }
+  ~TrapsInvalid() {
+    fedisableexcept(FE_INVALID);
+    feclearexcept(FE_ALL_EXCEPT);
+  }
+};
+
+template <class T>
+void call_among_signalling_nans(const Elementwise<T> &routine, Tally &tally) {
+  const std::vector<T> x = random_values<T>(140, 1), y = random_values<T>(140, 2);
+  Room room_x(1024 * sizeof(T)), room_y(1024 * sizeof(T));
+  for_each_way(140, [&](QtbInt n, QtbInt incx, QtbInt incy, int phase_x, int phase_y) {
+    const Image<T> image_x(n, incx, x.data()), image_y(n, incy, y.data());
+    for_each_tier([&](int tier) {
+      T *at_x = image_x.put(room_x.at(phase_x)), *at_y = image_y.put(room_y.at(phase_y));
+      const TrapsInvalid traps;
+      routine.call(tier, n, at_x, incx, at_y, incy);
+      tally.count(tier);
+    });
+  });
+}
+
+TEST(VectorArithmetic, finite_operands_raise_no_invalid_operation_among_signalling_nans) {
+  Tally tally;
+  for_each_elementwise([&](const auto &routine) { call_among_signalling_nans(routine, tally); });
+  for_each_dot([&]<class T>(const Dot<T> &routine) {
+    const std::vector<T> x = random_values<T>(140, 3), y = random_values<T>(140, 4);
+    Room room_x(1024 * sizeof(T)), room_y(1024 * sizeof(T));
+    for_each_way(140, [&](QtbInt n, QtbInt incx, QtbInt incy, int phase_x, int phase_y) {
+      const T *at_x = Image<T>(n, incx, x.data()).put(room_x.at(phase_x));
+      const T *at_y = Image<T>(n, incy, y.data()).put(room_y.at(phase_y));
+      for_each_tier([&](int tier) {
+        const TrapsInvalid traps;
+        routine.call(tier, n, at_x, incx, at_y, incy);
+        tally.count(tier);
+      });
+    });
+  });
+}
+
+// Spare lanes that held zeros would become NaN, and say so.
+TEST(VectorArithmetic, an_infinite_factor_of_nonzero_elements_raises_no_invalid_operation) {
+  Tally tally;
+  constexpr float single = std::numeric_limits<float>::infinity();
+  constexpr double wide = std::numeric_limits<double>::infinity();
+  call_among_signalling_nans(axpy_of<float>("saxpy", saxpy_tiers, single), tally);
+  call_among_signalling_nans(axpy_of<double>("daxpy", daxpy_tiers, wide), tally);
+  call_among_signalling_nans(scal_of<float, float>("sscal", sscal_tiers, single), tally);
+  call_among_signalling_nans(scal_of<double, double>("dscal", dscal_tiers, wide), tally);
+  call_among_signalling_nans(scal_of<cfloat, float>("csscal", csscal_tiers, single), tally);
+  call_among_signalling_nans(scal_of<cdouble, double>("zdscal", zdscal_tiers, wide), tally);
+}
+
+constexpr unsigned control_bits = 0xFFC0;  // of MXCSR: rounding, masks, flush to zero, denormals are zero
+
+// Runs f in a floating-point state and says whether the state was left alone.
+template <class F>
+bool keeps_state(unsigned control, F &&f) {
+  const unsigned before = _mm_getcsr();
+  _mm_setcsr((before & ~control_bits) | control);
+  f();
+  const unsigned after = _mm_getcsr();
+  _mm_setcsr(before);
+  return (after & control_bits) == control;
+}
+
+constexpr unsigned all_masked = 0x1F80;
+constexpr unsigned states[] = {all_masked | _MM_ROUND_NEAREST, all_masked | _MM_ROUND_DOWN, all_masked | _MM_ROUND_UP,
+                               all_masked | _MM_ROUND_TOWARD_ZERO, all_masked | _MM_FLUSH_ZERO_ON | 0x40};
+
+// A directed rounding errs by twice the roundoff of the nearest.
+constexpr double directed = 2;
+
+TEST(VectorArithmetic, elements_round_alike_in_every_place_in_all_rounding_modes) {
+  Tally tally;
+  for_each_elementwise([&]<class T>(const Elementwise<T> &routine) {
+    const std::vector<T> x = random_values<T>(140, 5), y = random_values<T>(140, 6);
+    Room room_x(1024 * sizeof(T)), room_y(1024 * sizeof(T));
+    for_each_tier([&](int tier) {
+      for (const unsigned state : states) {
+        std::vector<T> new_x = x, new_y = y;
+        const bool kept_by_single = keeps_state(state, [&] {
+          for (std::size_t i = 0; i < y.size(); ++i) routine.call(tier, 1, &new_x[i], 1, &new_y[i], 1);
+        });
+        ASSERT_TRUE(kept_by_single) << routine.name << ' ' << tier_name(tier);
+        for (std::size_t i = 0; routine.oracle && i < y.size(); ++i) {
+          const reference::Judged want = routine.oracle(x[i], y[i]);
+          const double ratio = error_ratio(new_y[i], want.value, want.gauge, directed * routine.roundings);
+          tally.error(routine.name, ratio);
+          ASSERT_LE(ratio, 1) << routine.name << ' ' << tier_name(tier);
+        }
+        for_each_way(140, [&](QtbInt n, QtbInt incx, QtbInt incy, int phase_x, int phase_y) {
+          if (n % 7 != 0 && n > 20) return;
+          const QtbInt used_incx = routine.one_vector ? 1 : incx;
+          unsigned char *at_x = room_x.at(phase_x), *at_y = room_y.at(phase_y);
+          T *put_x = Image<T>(n, used_incx, x.data()).put(at_x);
+          T *put_y = Image<T>(n, incy, y.data()).put(at_y);
+          const bool kept = keeps_state(state, [&] { routine.call(tier, n, put_x, used_incx, put_y, incy); });
+          tally.count(tier);
+          ASSERT_TRUE(kept && Image<T>(n, incy, new_y.data()).is_at(at_y) &&
+                      Image<T>(n, used_incx, new_x.data()).is_at(at_x))
+              << routine.name << ' ' << tier_name(tier) << " n " << n << " increments " << used_incx << ' ' << incy
+              << " phases " << phase_x << ' ' << phase_y << " state " << state;
+        });
+      }
+    });
+  });
+}
+
+TEST(VectorArithmetic, dots_keep_their_bound_and_the_state_in_all_rounding_modes) {
+  Tally tally;
+  for_each_dot([&]<class T>(const Dot<T> &routine) {
+    const std::vector<T> x = random_values<T>(140, 7), y = random_values<T>(140, 8);
+    Room room_x(1024 * sizeof(T)), room_y(1024 * sizeof(T));
+    for_each_way(140, [&](QtbInt n, QtbInt incx, QtbInt incy, int phase_x, int phase_y) {
+      if (n % 7 != 0 && n > 20) return;
+      const T *at_x = Image<T>(n, incx, x.data()).put(room_x.at(phase_x));
+      const T *at_y = Image<T>(n, incy, y.data()).put(room_y.at(phase_y));
+      const reference::Judged want = reference::dot(n, at_x, incx, at_y, incy, routine.conjugated);
+      for_each_tier([&](int tier) {
+        for (const unsigned state : states) {
+          T got;
+          ASSERT_TRUE(keeps_state(state, [&] { got = routine.call(tier, n, at_x, incx, at_y, incy); }));
+          const double terms = static_cast<double>(is_complex<T> ? 2 * n : n);
+          const double ratio = error_ratio(got, want.value, want.gauge, directed * terms);
+          tally.error(routine.name, ratio);
+          tally.count(tier);
+          ASSERT_LE(ratio, 1) << routine.name << ' ' << tier_name(tier) << " n " << n << " increments " << incx << ' '
+                              << incy << " phases " << phase_x << ' ' << phase_y << " state " << state;
+        }
+      });
+    });
+  });
+}
+
+}  // namespace
+}  // namespace qtb::test

@@ -1,0 +1,146 @@
+// The basic vector kernels touch nothing but their operands: arrays flush against trapping pages, inputs that cannot be
+// written, operands that must not even be read.
+
+#include "tests/kernels/vector_routines.h"
+#include "tests/support/guarded.h"
+
+namespace qtb::test {
+namespace {
+
+constexpr QtbInt longest_pass = 64;               // elements per pass of the widest kernels
+constexpr QtbInt longest = 4 * longest_pass + 3;  // four passes, and every way to end
+constexpr std::size_t room = 3 * (longest + 1);   // elements, for increments up to 3
+
+// n elements that end, or begin, at a trapping page.
+template <class T>
+T *flush_in(Guarded<T> &array, QtbInt n, QtbInt inc, bool at_back) {
+  const QtbInt length = n > 0 ? (n - 1) * (inc < 0 ? -inc : inc) + 1 : 0;
+  return at_back ? array.data() + (static_cast<QtbInt>(array.size()) - length) : array.data();
+}
+
+// An array whose first and last bytes both touch a trapping page.
+template <class T>
+std::size_t whole_pages() {
+  const std::size_t page = static_cast<std::size_t>(sysconf(_SC_PAGESIZE));
+  return (room * sizeof(T) + page - 1) / page * page / sizeof(T);
+}
+
+template <class T>
+void fill(Guarded<T> &array, std::uint64_t seed) {
+  const std::vector<T> values = random_values<T>(array.size(), seed);
+  std::memcpy(array.data(), values.data(), values.size() * sizeof(T));
+}
+
+constexpr QtbInt increments[][2] = {{1, 1}, {-1, -1}, {1, -1}, {2, 1}, {1, 3}, {-2, 3}, {0, 2}, {2, 0}};
+
+TEST(VectorMemory, elementwise_kernels_stay_between_trapping_pages) {
+  Tally tally;
+  for_each_elementwise([&]<class T>(const Elementwise<T> &routine) {
+    Guarded<T> x(whole_pages<T>()), y(whole_pages<T>());
+    fill(x, 1);
+    fill(y, 2);
+    if (!routine.stores_x) x.read_only();
+    for_each_tier([&](int tier) {
+      for (QtbInt n = 0; n <= longest; ++n)
+        for (const auto &[incx, incy] : increments)
+          for (int ends = 0; ends < 4; ++ends) {
+            routine.call(tier, n, flush_in(x, n, incx, ends & 1), incx, flush_in(y, n, incy, ends & 2), incy);
+            tally.count(tier);
+          }
+    });
+  });
+}
+
+TEST(VectorMemory, dots_stay_between_trapping_pages_and_only_read) {
+  Tally tally;
+  for_each_dot([&]<class T>(const Dot<T> &routine) {
+    Guarded<T> x(whole_pages<T>()), y(whole_pages<T>());
+    fill(x, 3);
+    fill(y, 4);
+    x.read_only();
+    y.read_only();
+    for_each_tier([&](int tier) {
+      for (QtbInt n = 0; n <= longest; ++n)
+        for (const auto &[incx, incy] : increments)
+          for (int ends = 0; ends < 4; ++ends) {
+            routine.call(tier, n, flush_in(x, n, incx, ends & 1), incx, flush_in(y, n, incy, ends & 2), incy);
+            tally.count(tier);
+          }
+    });
+  });
+}
+
+// One operand flush, and the other at each phase, so that every treatment of different phases meets the page.
+TEST(VectorMemory, operands_of_different_phases_stay_between_trapping_pages) {
+  Tally tally;
+  const auto at_phases = [&]<class T>(auto &&call, Guarded<T> &flush, Guarded<T> &other) {
+    for (QtbInt n = 0; n <= longest; n += n < 40 ? 1 : 13)
+      for (QtbInt bytes = 0; bytes < 16; ++bytes)
+        for (const bool at_back : {false, true}) {
+          unsigned char *base = reinterpret_cast<unsigned char *>(other.data());
+          call(n, flush_in(flush, n, 1, at_back), reinterpret_cast<T *>(base + bytes));
+        }
+  };
+  for_each_elementwise([&]<class T>(const Elementwise<T> &routine) {
+    Guarded<T> x(whole_pages<T>()), y(whole_pages<T>());
+    fill(x, 5);
+    fill(y, 6);
+    for_each_tier([&](int tier) {
+      at_phases([&](QtbInt n, T *a, T *b) { routine.call(tier, n, a, 1, b, 1), tally.count(tier); }, x, y);
+      at_phases([&](QtbInt n, T *a, T *b) { routine.call(tier, n, b, 1, a, 1), tally.count(tier); }, y, x);
+    });
+  });
+  for_each_dot([&]<class T>(const Dot<T> &routine) {
+    Guarded<T> x(whole_pages<T>()), y(whole_pages<T>());
+    fill(x, 7);
+    fill(y, 8);
+    for_each_tier([&](int tier) {
+      at_phases([&](QtbInt n, T *a, T *b) { routine.call(tier, n, a, 1, b, 1), tally.count(tier); }, x, y);
+      at_phases([&](QtbInt n, T *a, T *b) { routine.call(tier, n, b, 1, a, 1), tally.count(tier); }, y, x);
+    });
+  });
+}
+
+TEST(VectorMemory, no_operand_is_touched_for_lengths_below_one) {
+  for_each_elementwise([&]<class T>(const Elementwise<T> &routine) {
+    for_each_tier([&](int tier) {
+      for (const QtbInt n : {QtbInt{0}, QtbInt{-1}, QtbInt{-1} << 62})
+        for (const QtbInt inc : {1, -1, 0, 2}) routine.call(tier, n, nullptr, inc, nullptr, inc);
+    });
+  });
+  for_each_dot([&]<class T>(const Dot<T> &routine) {
+    for_each_tier([&](int tier) {
+      for (const QtbInt n : {QtbInt{0}, QtbInt{-1}, QtbInt{-1} << 62})
+        for (const QtbInt inc : {1, -1, 0, 2}) {
+          const T zero{};
+          EXPECT_TRUE(same_bits(routine.call(tier, n, nullptr, inc, nullptr, inc), zero))
+              << routine.name << ' ' << tier_name(tier);
+        }
+    });
+  });
+}
+
+template <class T>
+void expect_untouched(const char *name, Tiers<QTB_FUNCTION_TYPE(axpy, T)> &procedures, T alpha) {
+  for_each_tier([&](int tier) {
+    for (const QtbInt inc : {1, -1, 0, 2}) {
+      const QtbInt n = 40;
+      SCOPED_TRACE(std::string(name) + ' ' + tier_name(tier));
+      procedures[tier](&n, &alpha, nullptr, &inc, nullptr, &inc);
+    }
+  });
+}
+
+TEST(VectorMemory, axpy_with_a_zero_alpha_touches_neither_operand) {
+  expect_untouched<float>("saxpy", saxpy_tiers, 0.0f);
+  expect_untouched<float>("saxpy", saxpy_tiers, -0.0f);
+  expect_untouched<double>("daxpy", daxpy_tiers, 0.0);
+  expect_untouched<double>("daxpy", daxpy_tiers, -0.0);
+  expect_untouched<cfloat>("caxpy", caxpy_tiers, {0.0f, -0.0f});
+  expect_untouched<cfloat>("caxpy", caxpy_tiers, {-0.0f, 0.0f});
+  expect_untouched<cdouble>("zaxpy", zaxpy_tiers, {0.0, -0.0});
+  expect_untouched<cdouble>("zaxpy", zaxpy_tiers, {-0.0, 0.0});
+}
+
+}  // namespace
+}  // namespace qtb::test
