@@ -1,0 +1,4 @@
+qtb_add_test(gemm_blocks_test SOURCES kernels/gemm_blocks_test.cpp LIBRARIES qtb_static)
+qtb_add_test(gemm_copy_test SOURCES kernels/gemm_copy_test.cpp LIBRARIES qtb_static)
+qtb_add_test(gemm_pieces_test SOURCES kernels/gemm_pieces_test.cpp LIBRARIES qtb_static)
+qtb_add_test(triangle_pieces_test SOURCES kernels/triangle_pieces_test.cpp LIBRARIES qtb_static)
