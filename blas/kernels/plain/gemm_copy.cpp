@@ -15,6 +15,7 @@ namespace {
 template <class T, Op op, Family family = Family::base>
 QTB_FUNCTION(panel_copy, T, copy_a) {
   constexpr GemmRules rules = rules_of<T, family>;
+  if (*rows <= 0 || *cols <= 0) return;
   const Matrix<T> a{src, *ld, op};
   for (QtbInt i0 = 0; i0 + rules.mr <= *rows; i0 += rules.mr) {
     T *panel = dst + i0 / rules.mr * *ldp;
@@ -29,6 +30,7 @@ template <class T, Op op, Family family = Family::base>
 void copy_b(const QtbInt *rows, const QtbInt *cols, const T *src, const QtbInt *ld, T *dst, const QtbInt *ldp,
             const T *) {
   constexpr GemmRules rules = rules_of<T, family>;
+  if (*rows <= 0 || *cols <= 0) return;
   const Matrix<T> b{src, *ld, op};
   QtbInt q = 0;
   for (QtbInt j0 = 0, width; j0 < *cols; j0 += width, q++) {

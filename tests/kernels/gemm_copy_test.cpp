@@ -1,0 +1,128 @@
+// The copy routines of GEMM fill the packed format of their tile, and nothing else.
+#include "tests/kernels/gemm_families.h"
+
+namespace qtb::test {
+namespace {
+
+template <class T>
+class GemmCopies : public testing::Test {
+ protected:
+  static int ops() { return is_complex<T> ? 3 : 2; }
+};
+
+using Types = testing::Types<float, double, cfloat, cdouble>;
+TYPED_TEST_SUITE(GemmCopies, Types);
+
+TYPED_TEST(GemmCopies, PacksAWithAlphaAndZeroPaddingAndLeavesOutTheRowsBeyondATile) {
+  using T = TypeParam;
+  const T alpha = value<T>(0.75, -0.5);
+  for (const Pieces<T> &p : families<T>) {
+    if (!processor_runs(p.tier) || p.acopy[0] == nullptr) continue;
+    double &worst = tallies[std::string(p.name) + " acopy"].worst;
+    for (int op = 0; op < this->ops(); op++)
+      for (QtbInt m : row_counts(p))
+        for (QtbInt k : depths) {
+          Operand<T> a(op, m, k);
+          Panel<T> panel = a_panel(p, m, k);
+          p.acopy[op](&m, &k, a.stored.array.data(), &a.stored.ld, panel.array.data(), &panel.ldp, &alpha);
+          for (std::size_t e = 0; e < panel.array.size(); e++) {
+            const QtbInt at = static_cast<QtbInt>(e), i = at / panel.ldp * p.mr + at % p.mr, l = at % panel.ldp / p.mr;
+            if (l >= k) {
+              ASSERT_TRUE(same_bits(panel.array[e], T{})) << p.name << " padding at depth " << l;
+              continue;
+            }
+            const QuadComplex want = times(widen(alpha), widen(a.at(i, l)));
+            const Quad gauge = magnitude(widen(alpha)) * magnitude(widen(a.at(i, l)));
+            const double ratio = error_ratio(panel.array[e], want, gauge, is_complex<T> ? 2 : 1);
+            worst = std::fmax(worst, ratio);
+            ASSERT_LE(ratio, 1) << p.name << " " << letters[op] << " element (" << i << ", " << l << ")";
+          }
+          tallies[std::string(p.name) + " acopy"].cases++;
+        }
+  }
+}
+
+TYPED_TEST(GemmCopies, PacksBBitByBitWithZeroPaddingAndNarrowerEdges) {
+  using T = TypeParam;
+  const T unread = value<T>(NAN, NAN);
+  for (const Pieces<T> &p : families<T>) {
+    if (!processor_runs(p.tier) || p.bcopy[0] == nullptr) continue;
+    for (int op = 0; op < this->ops(); op++)
+      for (QtbInt n : column_counts(p))
+        for (QtbInt k : depths) {
+          Operand<T> b(op, k, n);
+          Panel<T> panel = b_panel(p, n, k);
+          p.bcopy[op](&k, &n, b.stored.array.data(), &b.stored.ld, panel.array.data(), &panel.ldp, &unread);
+          QtbInt j0 = 0, q = 0;
+          for (QtbInt w : widths(p.nr, n)) {
+            for (QtbInt l = 0; l < round_up(k, p.ku); l++)
+              for (QtbInt j = 0; j < w; j++) {
+                const T got = panel.array[static_cast<std::size_t>(q * panel.ldp + l * w + j)];
+                ASSERT_TRUE(same_bits(got, l < k ? b.at(l, j0 + j) : T{}))
+                    << p.name << " " << letters[op] << " element (" << l << ", " << j0 + j << ") of " << k << " x "
+                    << n;
+              }
+            j0 += w;
+            q++;
+          }
+          tallies[std::string(p.name) + " bcopy"].cases++;
+        }
+  }
+}
+
+TYPED_TEST(GemmCopies, SharesOfAPanelPackedApartMakeTheSamePanel) {
+  using T = TypeParam;
+  const T alpha = value<T>(0.75, -0.5);
+  for (const Pieces<T> &p : families<T>) {
+    if (!processor_runs(p.tier)) continue;
+    for (int op = 0; op < this->ops(); op++) {
+      const QtbInt m = 4 * p.mr, n = 3 * p.nr + 3, k = 4 * p.ku + 1;
+      const QtbInt rows = 2 * p.mr, columns = 2 * p.nr, depth = 2 * p.ku;
+      const QtbInt rest_rows = m - rows, rest_columns = n - columns, rest_depth = k - depth, kp = round_up(k, p.ku);
+      if (p.acopy[0] != nullptr) {
+        Operand<T> a(op, m, k);
+        Panel<T> whole = a_panel(p, m, k), by_rows = a_panel(p, m, k), by_depth = a_panel(p, m, k);
+        const auto pack = [&](Panel<T> &to, const QtbInt &r, const QtbInt &c, QtbInt i, QtbInt l, QtbInt offset) {
+          p.acopy[op](&r, &c, a.block(i, l), &a.stored.ld, to.array.data() + offset, &to.ldp, &alpha);
+        };
+        pack(whole, m, k, 0, 0, 0);
+        pack(by_rows, rows, k, 0, 0, 0);
+        pack(by_rows, rest_rows, k, rows, 0, rows * kp);
+        pack(by_depth, m, depth, 0, 0, 0);
+        pack(by_depth, m, rest_depth, 0, depth, depth * p.mr);
+        ASSERT_EQ(0, std::memcmp(whole.array.data(), by_rows.array.data(), whole.array.size() * sizeof(T))) << p.name;
+        ASSERT_EQ(0, std::memcmp(whole.array.data(), by_depth.array.data(), whole.array.size() * sizeof(T))) << p.name;
+      }
+      Operand<T> b(op, k, n);
+      Panel<T> whole = b_panel(p, n, k), apart = b_panel(p, n, k);
+      const auto pack = [&](Panel<T> &to, const QtbInt &c, QtbInt j) {
+        p.bcopy[op](&k, &c, b.block(0, j), &b.stored.ld, to.array.data() + j * kp, &to.ldp, &alpha);
+      };
+      pack(whole, n, 0);
+      pack(apart, columns, 0);
+      pack(apart, rest_columns, columns);
+      // An edge does not fill its step, so that the steps between hold what they held: the same NaN in both.
+      ASSERT_EQ(0, std::memcmp(whole.array.data(), apart.array.data(), whole.array.size() * sizeof(T))) << p.name;
+      tallies[std::string(p.name) + " bcopy"].cases++;
+    }
+  }
+}
+
+TYPED_TEST(GemmCopies, CopiesWriteNothingForNoRowsOrNoColumns) {
+  using T = TypeParam;
+  const T alpha = value<T>(1, 0);
+  Guarded<T> nothing(0);
+  const QtbInt ld = 4, ldp = 64, counts[][2] = {{0, 5}, {-1, 5}, {8, 0}, {8, -1}, {0, 0}, {-3, -2}};
+  for (const Pieces<T> &p : families<T>) {
+    if (!processor_runs(p.tier)) continue;
+    for (int op = 0; op < this->ops(); op++)
+      for (const auto &count : counts) {
+        p.bcopy[op](&count[0], &count[1], nothing.data(), &ld, nothing.data(), &ldp, &alpha);
+        if (p.acopy[0] != nullptr) p.acopy[op](&count[0], &count[1], nothing.data(), &ld, nothing.data(), &ldp, &alpha);
+        tallies[std::string(p.name) + " bcopy"].cases++;
+      }
+  }
+}
+
+}  // namespace
+}  // namespace qtb::test

@@ -1,0 +1,134 @@
+// What the tests of pieces share: matrices with trapping ends, the oracle of a product, a tally of what ran.
+#pragma once
+
+#include <gtest/gtest.h>
+
+#include <cstdio>
+#include <map>
+#include <random>
+#include <string>
+
+#include "tests/support/bounds.h"
+#include "tests/support/guarded.h"
+#include "tests/support/tiers.h"
+
+namespace qtb::test {
+namespace {
+
+constexpr char letters[3] = {'N', 'T', 'C'};
+
+std::mt19937_64 generator(20);
+
+template <class T>
+T draw() {
+  std::uniform_real_distribution<Real<T>> part(-1, 1);
+  if constexpr (is_complex<T>) {
+    const Real<T> re = part(generator), im = part(generator);
+    return {re, im};
+  } else {
+    return part(generator);
+  }
+}
+
+template <class T>
+T value(double re, double im) {
+  if constexpr (is_complex<T>)
+    return {static_cast<Real<T>>(re), static_cast<Real<T>>(im)};
+  else
+    return static_cast<T>(re);
+}
+
+// A rows x cols matrix with one spare row per column, filled with NaN; its last byte touches a trapping page.
+template <class T>
+struct Stored {
+  QtbInt rows, cols, ld;
+  Guarded<T> array;
+  Stored(QtbInt r, QtbInt c)
+      : rows(r), cols(c), ld(r + 1), array(r > 0 && c > 0 ? static_cast<std::size_t>(ld * (c - 1) + r) : 0) {
+    for (std::size_t i = 0; i < array.size(); i++)
+      array[i] = static_cast<QtbInt>(i) % ld < rows ? draw<T>() : value<T>(NAN, NAN);
+  }
+  T *at(QtbInt i, QtbInt j) { return array.data() + i + j * ld; }
+  void poison() {
+    for (QtbInt j = 0; j < cols; j++)
+      for (QtbInt i = 0; i < rows; i++) *at(i, j) = value<T>(NAN, NAN);
+  }
+  void take(const Stored &other) { std::memcpy(array.data(), other.array.data(), array.size() * sizeof(T)); }
+};
+
+// A stored matrix read as op(A).
+template <class T>
+struct Operand {
+  int op;
+  Stored<T> stored;
+  Operand(int o, QtbInt rows, QtbInt cols) : op(o), stored(o == 0 ? rows : cols, o == 0 ? cols : rows) {}
+  T at(QtbInt i, QtbInt j) {
+    T v = op == 0 ? *stored.at(i, j) : *stored.at(j, i);
+    if constexpr (is_complex<T>)
+      if (op == 2) v.im = -v.im;
+    return v;
+  }
+  T *block(QtbInt i, QtbInt j) { return op == 0 ? stored.at(i, j) : stored.at(j, i); }
+};
+
+QuadComplex times(QuadComplex a, QuadComplex b) { return {a.re * b.re - a.im * b.im, a.re * b.im + a.im * b.re}; }
+QuadComplex plus(QuadComplex a, QuadComplex b) { return {a.re + b.re, a.im + b.im}; }
+
+template <class T>
+bool same_bits(T a, T b) {
+  return std::memcmp(&a, &b, sizeof(T)) == 0;
+}
+
+// What ran, by family of pieces.
+struct Tally {
+  long cases = 0;
+  double worst = 0;  // error / bound
+};
+std::map<std::string, Tally> tallies;
+
+struct PrintTallies : testing::Environment {
+  void TearDown() override {
+    for (const auto &[name, tally] : tallies)
+      std::printf("%-40s %6ld cases, worst error/bound %.3f\n", name.c_str(), tally.cases, tally.worst);
+  }
+};
+const testing::Environment *const print_tallies = testing::AddGlobalTestEnvironment(new PrintTallies);
+
+// C against alpha*op(A)*op(B) + beta*before in higher precision, and its spare rows bit by bit.
+template <class T>
+void expect_product(const std::string &what, QtbInt k, T alpha, Operand<T> &a, Operand<T> &b, T beta, Stored<T> &before,
+                    Stored<T> &after) {
+  const double c = static_cast<double>(is_complex<T> ? 2 * k + 4 : k + 3);
+  const Quad scale = magnitude(widen(alpha));
+  const bool reads_c = magnitude(widen(beta)) != 0;
+  Tally &tally = tallies[what];
+  for (QtbInt j = 0; j < after.cols; j++) {
+    for (QtbInt i = 0; i < after.rows; i++) {
+      QuadComplex sum;
+      Quad gauge = 0;
+      for (QtbInt l = 0; l < k; l++) {
+        const QuadComplex x = widen(a.at(i, l)), y = widen(b.at(l, j));
+        sum = plus(sum, times(x, y));
+        gauge += magnitude(x) * magnitude(y);
+      }
+      QuadComplex want = times(widen(alpha), sum);
+      gauge *= scale;
+      if (reads_c) {
+        const QuadComplex old = widen(*before.at(i, j));
+        want = plus(want, times(widen(beta), old));
+        gauge += magnitude(widen(beta)) * magnitude(old);
+      }
+      const double ratio = error_ratio(*after.at(i, j), want, gauge, c, static_cast<double>(scale));
+      tally.worst = std::fmax(tally.worst, ratio);
+      ASSERT_LE(ratio, 1) << what << " C(" << i << ", " << j << ") of " << after.rows << " x " << after.cols << " x "
+                          << k;
+    }
+    if (after.rows > 0 && j + 1 < after.cols) {
+      ASSERT_TRUE(same_bits(*after.at(after.rows, j), *before.at(after.rows, j))) << what << " wrote a spare row";
+    }
+  }
+  tally.cases++;
+}
+
+}  // namespace
+}  // namespace qtb::test
