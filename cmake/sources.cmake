@@ -4,6 +4,10 @@
 set(QTB_KERNEL_SOURCES
   # level1
   blas/kernels/level1/asum.cpp
+  blas/kernels/level1/axpy.cpp
+  blas/kernels/level1/complex_dot.cpp
+  blas/kernels/level1/copy.cpp
+  blas/kernels/level1/dot.cpp
   blas/kernels/level1/extended_dot.cpp
   blas/kernels/level1/iamax.cpp
   blas/kernels/level1/nrm2.cpp
@@ -11,12 +15,8 @@ set(QTB_KERNEL_SOURCES
   blas/kernels/level1/rotg.cpp
   blas/kernels/level1/rotm.cpp
   blas/kernels/level1/rotmg.cpp
-  blas/kernels/level1/sparse.cpp
-  blas/kernels/level1/axpy.cpp
-  blas/kernels/level1/complex_dot.cpp
-  blas/kernels/level1/copy.cpp
-  blas/kernels/level1/dot.cpp
   blas/kernels/level1/scal.cpp
+  blas/kernels/level1/sparse.cpp
   blas/kernels/level1/swap.cpp
   # level3
   blas/kernels/level3/blocks.cpp

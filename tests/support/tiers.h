@@ -23,6 +23,13 @@ inline bool processor_runs(int tier) {
   }
 }
 
+// f(tier) for each tier that this processor runs.
+template <class F>
+void in_every_tier(F f) {
+  for (int tier = 0; tier < tier_count; ++tier)
+    if (processor_runs(tier)) f(tier);
+}
+
 // QTB_ALL_TIERS(daxpy): an initialiser of an array over tiers with the five implementations of a routine that all tiers
 // have. Only the named procedures are linked.
 #define QTB_TIER_PROCEDURE(tier, TIER, name) qtb_blas_##tier##_x##name,

@@ -5,7 +5,6 @@
 // rotation. Other increments go one element at a time from the start of the walk; 0 adds element 0 n times.
 
 #include "blas/kernels/simd/repeat.h"
-#include "blas/kernels/simd/scalar.h"
 #include "blas/kernels/simd/vec.h"
 
 namespace qtb::QTB_TIER {
@@ -39,20 +38,20 @@ inline __m128d load_magnitudes(const double *p) {
   return _mm_and_pd(peels ? load_aligned(p) : load_unaligned(p), mask);
 }
 
-inline float sum_of_lanes(__m128 v) {
+// Lanes by neighbours, in the one instruction for it, in the tiers that have it.
+inline float join_lanes(__m128 v) {
 #if defined(__SSE3__)
-  const __m128 pairs = _mm_hadd_ps(v, v);
-  return _mm_cvtss_f32(_mm_hadd_ps(pairs, pairs));
+  v = _mm_hadd_ps(v, v);
+  return _mm_cvtss_f32(_mm_hadd_ps(v, v));
 #else
-  const __m128 pairs = add(v, _mm_movehl_ps(v, v));
-  return _mm_cvtss_f32(_mm_add_ss(pairs, _mm_shuffle_ps(pairs, pairs, _MM_SHUFFLE(1, 1, 1, 1))));
+  return sum_lanes(v);
 #endif
 }
-inline double sum_of_lanes(__m128d v) {
+inline double join_lanes(__m128d v) {
 #if defined(__SSE3__)
   return _mm_cvtsd_f64(_mm_hadd_pd(v, v));
 #else
-  return _mm_cvtsd_f64(_mm_add_sd(v, _mm_unpackhi_pd(v, v)));
+  return sum_lanes(v);
 #endif
 }
 
@@ -61,6 +60,7 @@ template <QtbInt count, class T>
   repeat<count / lanes<T>>([&](auto k) __attribute__((always_inline)) {
     Vec<T> &accumulator = sum[k.value % accumulators];
     accumulator = add(accumulator, load_magnitudes(x + k.value * lanes<T>));
+    keep_in_place(accumulator);
   });
 }
 
@@ -84,18 +84,18 @@ T sum_contiguous(QtbInt n, const T *x) {
   constexpr QtbInt block = asum_block<T>;
   T singles = 0;
   if constexpr (peels)
-    for (; n > 0 && phase(x) != 0; --n, ++x) singles += absolute(element(x));
+    for (; n > 0 && phase(x) != 0; --n, ++x) singles += absolute(load_single(x));
   Vec<T> sum[accumulators] = {zero<T>(), zero<T>(), zero<T>(), zero<T>()};
   for (; n >= block; n -= block, x += block) add_vectors<block>(sum, x);
   x = add_remainder<block / 2>(sum, n, x);
-  for (n %= lanes<T>; n > 0; --n, ++x) singles += absolute(element(x));
-  return sum_of_lanes(add(add(add(sum[0], sum[1]), sum[2]), sum[3])) + singles;
+  for (n %= lanes<T>; n > 0; --n, ++x) singles += absolute(load_single(x));
+  return join_lanes(add(add(add(sum[0], sum[1]), sum[2]), sum[3])) + singles;
 }
 
 template <class T>
 T sum_strided(QtbInt n, const T *x, QtbInt inc) {
   T sum = 0;
-  for (x = walk_start(x, n, inc); n > 0; --n, x += inc) sum += absolute(element(x));
+  for (x = walk_start(x, n, inc); n > 0; --n, x += inc) sum += absolute(load_single(x));
   return sum;
 }
 
@@ -121,14 +121,14 @@ Real<T> sum_complex(const QtbInt *n, const T *x, const QtbInt *incx) {
   const QtbInt step = 2 * inc;
   R first = 0, second = 0;  // two chains of additions
   for (; count >= 2; count -= 2, p += 2 * step) {
-    first += absolute(element(p));
-    first += absolute(element(p + 1));
-    second += absolute(element(p + step)) + absolute(element(p + step + 1));
+    first += absolute(load_single(p));
+    first += absolute(load_single(p + 1));
+    second += absolute(load_single(p + step)) + absolute(load_single(p + step + 1));
   }
   R sum = first + second;
   if (count != 0) {
-    sum += absolute(element(p));
-    sum += absolute(element(p + 1));
+    sum += absolute(load_single(p));
+    sum += absolute(load_single(p + 1));
   }
   return sum;
 }

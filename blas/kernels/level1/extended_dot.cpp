@@ -3,14 +3,13 @@
 // x and y are read only, at any address; a negative increment walks its vector from the far end. A product of two
 // floats is exact in double. n below 1 gives 0, or sb.
 
-#include "blas/kernels/simd/scalar.h"
 #include "blas/kernels/simd/vec.h"
 
 namespace qtb::QTB_TIER {
 namespace {
 
 inline double product(const float *x, const float *y) {
-  return static_cast<double>(element(x)) * static_cast<double>(element(y));
+  return static_cast<double>(load_single(x)) * static_cast<double>(load_single(y));
 }
 
 // start + the sum of n products, in two chains of additions.

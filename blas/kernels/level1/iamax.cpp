@@ -5,7 +5,7 @@
 // The search keeps its best element only if an ordered comparison says so. Ties therefore go to the first occurrence,
 // and a NaN takes over from the best before it and gives way to the element after it, whatever that is.
 
-#include "blas/kernels/simd/scalar.h"
+#include "blas/kernels/simd/vec.h"
 
 namespace qtb::QTB_TIER {
 namespace {
@@ -13,9 +13,9 @@ namespace {
 template <class T>
 Real<T> magnitude(const T *x) {
   if constexpr (is_complex<T>)
-    return absolute(element(parts(x))) + absolute(element(parts(x) + 1));
+    return absolute(load_single(parts(x))) + absolute(load_single(parts(x) + 1));
   else
-    return absolute(element(x));
+    return absolute(load_single(x));
 }
 
 // The best of n random elements changes about log(n) times: a branch that is nearly always foretold, and far cheaper

@@ -7,7 +7,6 @@
 // Increments: every increment reads the elements that its absolute value reads; 0 reads element 0 n times.
 
 #include "blas/kernels/simd/repeat.h"
-#include "blas/kernels/simd/scalar.h"
 #include "blas/kernels/simd/vec.h"
 
 namespace qtb::QTB_TIER {
@@ -39,12 +38,12 @@ double norm_scaled(const QtbInt *n, const T *x, const QtbInt *incx) {
   constexpr QtbInt width = is_complex<T> ? 2 : 1;  // doubles per element
   const QtbInt count = *n;
   if (count < 1) return 0.0;
-  if (!is_complex<T> && count == 1) return absolute(element(parts(x)));
+  if (!is_complex<T> && count == 1) return absolute(load_single(parts(x)));
   const QtbInt step = width * (*incx < 0 ? -*incx : *incx);
   const double *p = parts(x);
   ScaledSquares sum;
   for (QtbInt i = 0; i < count; ++i, p += step)
-    for (QtbInt k = 0; k < width; ++k) add_scaled_square(sum, element(p + k));
+    for (QtbInt k = 0; k < width; ++k) add_scaled_square(sum, load_single(p + k));
   return sum.scale * square_root(sum.ssq);
 }
 
@@ -60,11 +59,14 @@ inline __m128d widen_pair(const float *p) {
   return _mm_cvtps_pd(_mm_castsi128_ps(_mm_loadl_epi64(reinterpret_cast<const __m128i *>(p))));
 }
 inline __m128d widen_two(const float *p, const float *q) {
-  return _mm_cvtps_pd(_mm_unpacklo_ps(_mm_set_ss(element(p)), _mm_set_ss(element(q))));
+  return _mm_cvtps_pd(_mm_unpacklo_ps(_mm_set_ss(load_single(p)), _mm_set_ss(load_single(q))));
 }
-inline __m128d widen_single(const float *p) { return _mm_set_sd(static_cast<double>(element(p))); }
+inline __m128d widen_single(const float *p) { return _mm_set_sd(static_cast<double>(load_single(p))); }
 
-inline void add_square(__m128d &sum, __m128d v) { sum = add(sum, mul(v, v)); }
+inline void add_square(__m128d &sum, __m128d v) {
+  sum = add(sum, mul(v, v));
+  keep_in_place(sum);
+}
 
 // 2 * pairs neighbouring floats, a pair to each chain in rotation.
 template <int pairs>

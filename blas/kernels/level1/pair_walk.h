@@ -5,7 +5,6 @@
 #pragma once
 
 #include "blas/kernels/simd/repeat.h"
-#include "blas/kernels/simd/scalar.h"
 #include "blas/kernels/simd/vec.h"
 
 namespace qtb::QTB_TIER {
@@ -35,10 +34,10 @@ void store_by(T *p, Vec<T> v) {
 
 template <class T, class Op>
 void transform_pair(T *x, T *y, const Op &op) {
-  T u = element(x), v = element(y);
+  T u = load_single(x), v = load_single(y);
   op(u, v);
-  set_element(x, u);
-  set_element(y, v);
+  store_single(x, u);
+  store_single(y, v);
 }
 
 // count elements, a vector at a time.

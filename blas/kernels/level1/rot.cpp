@@ -34,7 +34,7 @@ template <class T, Load other_load>
 void rotate_real(const QtbInt *n, T *x, const QtbInt *incx, T *y, const QtbInt *incy, const T *c, const T *s) {
   constexpr QtbInt block = 8, strided_block = 2;
   if (*n < 1) return;
-  const Rotation<T> rotation(element(c), element(s));
+  const Rotation<T> rotation(load_single(c), load_single(s));
   if (*incx == 1 && *incy == 1)
     transform_contiguous<block, block, other_load>(*n, x, y, rotation);
   else
@@ -45,7 +45,7 @@ inline void rotate_csrot(const QtbInt *n, cfloat *x, const QtbInt *incx, cfloat 
                          const float *s) {
   constexpr QtbInt same_phase = 2 * 24, other_phase = 2 * 16, strided_block = 4;
   if (*n < 1) return;
-  const Rotation<float> rotation(element(c), element(s));
+  const Rotation<float> rotation(load_single(c), load_single(s));
   if (*incx == 1 && *incy == 1)
     transform_contiguous<same_phase, other_phase, Load::unaligned>(2 * *n, parts(x), parts(y), rotation);
   else
@@ -67,7 +67,7 @@ inline void rotate_zdrot(const QtbInt *n, cdouble *x, const QtbInt *incx, cdoubl
   constexpr QtbInt width = 2, block = 4 * width;  // reals of an element, and of a contiguous pass
   QtbInt count = *n;
   if (count < 1) return;
-  const Rotation<double> rotation(element(c), element(s));
+  const Rotation<double> rotation(load_single(c), load_single(s));
   const QtbInt step_x = width * *incx, step_y = width * *incy;
   double *p = walk_start(parts(x), count, step_x), *q = walk_start(parts(y), count, step_y);
   if (step_x == width && step_y == width)

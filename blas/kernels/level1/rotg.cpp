@@ -4,21 +4,21 @@
 // Complex: a becomes r; b is only read. The formulas are evaluated as they stand: real ones are safe from overflow and
 // underflow by their scale, complex ones take the moduli of a and b directly. Nothing tests for infinities and NaNs.
 
-#include "blas/kernels/simd/scalar.h"
+#include "blas/kernels/simd/vec.h"
 
 namespace qtb::QTB_TIER {
 namespace {
 
 template <class T>
 void generate_real(T *a, T *b, T *c, T *s) {
-  const T va = element(a), vb = element(b);
+  const T va = load_single(a), vb = load_single(b);
   const T p = absolute(va), q = absolute(vb);
   const T scale = p + q;
   if (scale == 0) {
-    set_element(c, T(1));
-    set_element(s, T(0));
-    set_element(a, T(0));
-    set_element(b, T(0));
+    store_single(c, T(1));
+    store_single(s, T(0));
+    store_single(a, T(0));
+    store_single(b, T(0));
     return;
   }
   const T ratio_a = va / scale, ratio_b = vb / scale;
@@ -27,10 +27,10 @@ void generate_real(T *a, T *b, T *c, T *s) {
   const T cosine = va / r, sine = vb / r;
   T z = p > q ? sine : T(1);
   if (q >= p && cosine != 0) z = T(1) / cosine;
-  set_element(c, cosine);
-  set_element(s, sine);
-  set_element(a, r);
-  set_element(b, z);
+  store_single(c, cosine);
+  store_single(s, sine);
+  store_single(a, r);
+  store_single(b, z);
 }
 
 template <class T>
@@ -68,21 +68,21 @@ T square(T v) {
 
 template <class R, class T = Complex<R>>
 void generate_complex(T *ca, T *cb, R *c, T *s) {
-  const T a = element(ca), b = element(cb);
+  const T a = load_single(ca), b = load_single(cb);
   const R abs_a = modulus(a);
   if (abs_a == 0) {
-    set_element(c, R(0));
-    set_element(s, T{1, 0});
-    set_element(ca, b);
+    store_single(c, R(0));
+    store_single(s, T{1, 0});
+    store_single(ca, b);
     return;
   }
   const R scale = modulus(b) + abs_a;
   const R squares = square(a.re / scale) + square(a.im / scale) + square(b.re / scale) + square(b.im / scale);
   const R norm = scale * square_root(squares);
   const T alpha = divide_by_real(a, abs_a);
-  set_element(c, abs_a / norm);
-  set_element(s, divide_by_real(multiply(alpha, T{b.re, -b.im}), norm));
-  set_element(ca, T{alpha.re * norm, alpha.im * norm});
+  store_single(c, abs_a / norm);
+  store_single(s, divide_by_real(multiply(alpha, T{b.re, -b.im}), norm));
+  store_single(ca, T{alpha.re * norm, alpha.im * norm});
 }
 
 }  // namespace

@@ -24,7 +24,7 @@ struct Coefficient {
 
 template <class T>
 Coefficient<T> coefficient(bool stored, const T *h) {
-  const T value = stored ? element(h) : T(0);
+  const T value = stored ? load_single(h) : T(0);
   return {value, broadcast(value)};
 }
 
@@ -79,7 +79,7 @@ void rotate_by(QtbInt n, T *x, QtbInt incx, T *y, QtbInt incy, const T *param) {
 template <class T>
 void rotate(const QtbInt *n, T *x, const QtbInt *incx, T *y, const QtbInt *incy, const T *param) {
   if (*n < 1) return;
-  const T flag = element(param);
+  const T flag = load_single(param);
   if (flag + T(2) == 0) return;
   if (flag < 0)
     rotate_by<Form::full>(*n, x, *incx, y, *incy, param);

@@ -8,7 +8,7 @@
 // two things are particular here and stay: the multiplier rgam of single precision, which is not exactly 1/gam, and
 // what becomes of a large d2 in the zero-flag form (see rescale_d2).
 
-#include "blas/kernels/simd/scalar.h"
+#include "blas/kernels/simd/vec.h"
 
 namespace qtb::QTB_TIER {
 namespace {
@@ -90,26 +90,26 @@ void rescale_d2(T &d2, Matrix<T> &h) {
 template <class T>
 void store(const Matrix<T> &h, T *param) {
   if (h.flag != 0) {
-    set_element(param + 1, h.h11);
-    set_element(param + 4, h.h22);
+    store_single(param + 1, h.h11);
+    store_single(param + 4, h.h22);
   }
   if (h.flag <= 0) {
-    set_element(param + 2, h.h21);
-    set_element(param + 3, h.h12);
+    store_single(param + 2, h.h21);
+    store_single(param + 3, h.h12);
   }
-  set_element(param, h.flag);
+  store_single(param, h.flag);
 }
 
 template <class T>
 void generate(T *d1, T *d2, T *x1, const T *y1, T *param) {
-  T vd1 = element(d1), vd2 = element(d2), vx1 = element(x1);
-  const T vy1 = element(y1);
+  T vd1 = load_single(d1), vd2 = load_single(d2), vx1 = load_single(x1);
+  const T vy1 = load_single(y1);
   const T p2 = vd2 * vy1, q2 = p2 * vy1;
   Matrix<T> h;
   bool reset = vd1 < 0;
   if (!reset) {
     if (p2 == 0) {
-      set_element(param, T(-2));
+      store_single(param, T(-2));
       return;
     }
     const T p1 = vd1 * vx1;
@@ -144,9 +144,9 @@ void generate(T *d1, T *d2, T *x1, const T *y1, T *param) {
     rescale_d1(vd1, vx1, h);
     rescale_d2(vd2, h);
   }
-  set_element(d1, vd1);
-  set_element(d2, vd2);
-  set_element(x1, vx1);
+  store_single(d1, vd1);
+  store_single(d2, vd2);
+  store_single(x1, vx1);
   store(h, param);
 }
 

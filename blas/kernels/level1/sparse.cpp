@@ -8,7 +8,7 @@
 // what the one before it left. Positions are not tested. nz below 1 does nothing; a dot is then 0. x and y may stand at
 // any address. Every access to y goes to an address of its own, so that vectors would gain nothing.
 
-#include "blas/kernels/simd/scalar.h"
+#include "blas/kernels/simd/vec.h"
 
 namespace qtb::QTB_TIER {
 namespace {
@@ -28,11 +28,11 @@ template <class T>
 void add_scaled(const QtbInt *nz, const T *a, const T *x, const QtbInt *indx, T *y) {
   const QtbInt n = *nz;
   if (n < 1) return;
-  const T alpha = element(a);
+  const T alpha = load_single(a);
   if (alpha == 0) return;
   for_each_by_two(n, [=](QtbInt k) {
     T *target = y + (indx[k] - 1);
-    set_element(target, element(target) + alpha * element(x + k));
+    store_single(target, load_single(target) + alpha * load_single(x + k));
   });
 }
 
@@ -41,20 +41,20 @@ void add_scaled_complex(const QtbInt *nz, const T *a, const T *x, const QtbInt *
   using R = Real<T>;
   const QtbInt n = *nz;
   if (n < 1) return;
-  const R re = element(parts(a)), im = element(parts(a) + 1);
+  const R re = load_single(parts(a)), im = load_single(parts(a) + 1);
   if (re == 0 && im == 0) return;
   for (QtbInt k = 0; k < n; ++k) {
-    const R xr = element(parts(x + k)), xi = element(parts(x + k) + 1);
+    const R xr = load_single(parts(x + k)), xi = load_single(parts(x + k) + 1);
     R *target = parts(y + (indx[k] - 1));
-    set_element(target, element(target) + (re * xr - im * xi));
-    set_element(target + 1, element(target + 1) + (re * xi + im * xr));
+    store_single(target, load_single(target) + (re * xr - im * xi));
+    store_single(target + 1, load_single(target + 1) + (re * xi + im * xr));
   }
 }
 
 template <class T>
 T dot(const QtbInt *nz, const T *x, const QtbInt *indx, const T *y) {
   const QtbInt n = *nz;
-  const auto product = [=](QtbInt k) { return element(x + k) * element(y + (indx[k] - 1)); };
+  const auto product = [=](QtbInt k) { return load_single(x + k) * load_single(y + (indx[k] - 1)); };
   T first = 0, second = 0;  // two chains of additions
   QtbInt k = 0;
   for (; k + 2 <= n; k += 2) {
@@ -72,56 +72,48 @@ T *dot_complex(T *result, const QtbInt *nz, const T *x, const QtbInt *indx, cons
   R re = 0, im = 0;
   for (QtbInt k = 0; k < n; ++k) {
     const R *target = parts(y + (indx[k] - 1));
-    const R yr = element(target), yi = element(target + 1);
-    const R xr = element(parts(x + k)), imaginary = element(parts(x + k) + 1);
+    const R yr = load_single(target), yi = load_single(target + 1);
+    const R xr = load_single(parts(x + k)), imaginary = load_single(parts(x + k) + 1);
     const R xi = conjugate ? 0 - imaginary : imaginary;
     re += xr * yr - xi * yi;
     im += xr * yi + xi * yr;
   }
-  set_element(parts(result), re);
-  set_element(parts(result) + 1, im);
+  store_single(parts(result), re);
+  store_single(parts(result) + 1, im);
   return result;
 }
 
 // Gathers and scatters move bits, not values: the payload of a NaN arrives as it was.
 template <class T>
-void move(T *to, const T *from) {
-  __builtin_memcpy(to, from, sizeof(T));
-}
-
-template <class T>
-void gather(const QtbInt *nz, const T *y, T *x, const QtbInt *indx) {
-  const QtbInt n = *nz;
-  for_each_by_two(n, [=](QtbInt k) { move(x + k, y + (indx[k] - 1)); });
+void gather_elements(const QtbInt *nz, const T *y, T *x, const QtbInt *indx) {
+  for_each_by_two(*nz, [=](QtbInt k) { store_bits(x + k, load_bits(y + (indx[k] - 1))); });
 }
 
 template <class T>
 void gather_and_zero(const QtbInt *nz, T *y, T *x, const QtbInt *indx) {
-  const QtbInt n = *nz;
-  for_each_by_two(n, [=](QtbInt k) {
+  for_each_by_two(*nz, [=](QtbInt k) {
     T *source = y + (indx[k] - 1);
-    move(x + k, source);
-    __builtin_memset(source, 0, sizeof(T));
+    store_bits(x + k, load_bits(source));
+    store_single(source, T{});
   });
 }
 
 template <class T>
-void scatter(const QtbInt *nz, const T *x, const QtbInt *indx, T *y) {
-  const QtbInt n = *nz;
-  for_each_by_two(n, [=](QtbInt k) { move(y + (indx[k] - 1), x + k); });
+void scatter_elements(const QtbInt *nz, const T *x, const QtbInt *indx, T *y) {
+  for_each_by_two(*nz, [=](QtbInt k) { store_bits(y + (indx[k] - 1), load_bits(x + k)); });
 }
 
 template <class T>
 void rotate(const QtbInt *nz, T *x, const QtbInt *indx, T *y, const T *c, const T *s) {
   const QtbInt n = *nz;
   if (n < 1) return;
-  const T cosine = element(c), sine = element(s);
+  const T cosine = load_single(c), sine = load_single(s);
   if (cosine == 1 && sine == 0) return;
   for (QtbInt k = 0; k < n; ++k) {
     T *target = y + (indx[k] - 1);
-    const T u = element(x + k), t = element(target);
-    set_element(target, cosine * t - sine * u);
-    set_element(x + k, cosine * u + sine * t);
+    const T u = load_single(x + k), t = load_single(target);
+    store_single(target, cosine * t - sine * u);
+    store_single(x + k, cosine * u + sine * t);
   }
 }
 
@@ -137,18 +129,18 @@ QTB_KERNEL(cdotci, cdoti, cfloat, (dot_complex<cfloat, true>))
 QTB_KERNEL(cdotui, cdoti, cfloat, (dot_complex<cfloat, false>))
 QTB_KERNEL(zdotci, cdoti, cdouble, (dot_complex<cdouble, true>))
 QTB_KERNEL(zdotui, cdoti, cdouble, (dot_complex<cdouble, false>))
-QTB_KERNEL(sgthr, gthr, float, gather)
-QTB_KERNEL(dgthr, gthr, double, gather)
-QTB_KERNEL(cgthr, gthr, cfloat, gather)
-QTB_KERNEL(zgthr, gthr, cdouble, gather)
+QTB_KERNEL(sgthr, gthr, float, gather_elements)
+QTB_KERNEL(dgthr, gthr, double, gather_elements)
+QTB_KERNEL(cgthr, gthr, cfloat, gather_elements)
+QTB_KERNEL(zgthr, gthr, cdouble, gather_elements)
 QTB_KERNEL(sgthrz, gthrz, float, gather_and_zero)
 QTB_KERNEL(dgthrz, gthrz, double, gather_and_zero)
 QTB_KERNEL(cgthrz, gthrz, cfloat, gather_and_zero)
 QTB_KERNEL(zgthrz, gthrz, cdouble, gather_and_zero)
-QTB_KERNEL(ssctr, sctr, float, scatter)
-QTB_KERNEL(dsctr, sctr, double, scatter)
-QTB_KERNEL(csctr, sctr, cfloat, scatter)
-QTB_KERNEL(zsctr, sctr, cdouble, scatter)
+QTB_KERNEL(ssctr, sctr, float, scatter_elements)
+QTB_KERNEL(dsctr, sctr, double, scatter_elements)
+QTB_KERNEL(csctr, sctr, cfloat, scatter_elements)
+QTB_KERNEL(zsctr, sctr, cdouble, scatter_elements)
 QTB_KERNEL(sroti, roti, float, rotate)
 QTB_KERNEL(droti, roti, double, rotate)
 

@@ -13,23 +13,11 @@
 #pragma once
 
 #include "blas/kernels/level1/tuning.h"
+#include "blas/kernels/simd/repeat.h"
 #include "blas/kernels/simd/vec.h"
 
 namespace qtb::QTB_TIER {
 namespace {
-
-// f(Constant<0>()) to f(Constant<count - 1>()), written out.
-template <int k>
-struct Constant {
-  static constexpr int value = k;
-};
-template <int count, int k = 0, class F>
-[[gnu::always_inline]] inline void repeat(F &&f) {
-  if constexpr (k < count) {
-    f(Constant<k>());
-    repeat<count, k + 1>(f);
-  }
-}
 
 // ---- Cursors: an operand of a pass, and how its vectors are reached. T is const for an operand that is only read.
 // ----

@@ -288,5 +288,15 @@ T *walk_start(T *p, QtbInt n, QtbInt inc) {
   return inc < 0 ? p + (1 - n) * inc : p;
 }
 
+// |v| by clearing the sign bit: exact, and of a NaN that NaN without a sign.
+inline float absolute(float v) { return __builtin_fabsf(v); }
+inline double absolute(double v) { return __builtin_fabs(v); }
+
+inline float square_root(float v) { return _mm_cvtss_f32(_mm_sqrt_ss(_mm_set_ss(v))); }
+inline double square_root(double v) {
+  const __m128d w = _mm_set_sd(v);
+  return _mm_cvtsd_f64(_mm_sqrt_sd(w, w));
+}
+
 }  // namespace
 }  // namespace qtb::QTB_TIER
