@@ -9,10 +9,12 @@
 
 namespace qtb::test {
 
+constexpr std::size_t most_arguments = 20;
+
 struct RecordedCall {
   int slot = -1, tier = -1;  // -1: no procedure was called
   int argument_count = 0;
-  std::array<const void *, 16> arguments = {};
+  std::array<const void *, most_arguments> arguments = {};
 };
 inline thread_local RecordedCall recorded_call;
 

@@ -17,7 +17,7 @@ namespace qtb::test {
 namespace {
 
 // Addresses to call with, all different; nobody follows them.
-alignas(16) char places[16][16];
+alignas(16) char places[most_arguments][16];
 
 // Calls a slot's stub with a place of its own for each argument, and checks the result against the tier's.
 template <class Function>

@@ -85,7 +85,7 @@ TEST(SlotList, TheRoutesOfTheEntriesNameThePlainSlots) {
 TEST(SlotList, EverySlotOfARoutineIsInAllTiers) {
   const Names routines = words((std::string(routine_slots) + " " + front_end_slots).c_str());
   for (const SlotTargets &slot : slot_targets)
-    if (routines.count(slot.name) != 0) EXPECT_EQ(slot.tiers & ALL, ALL) << slot.name;
+    EXPECT_TRUE(routines.count(slot.name) == 0 || (slot.tiers & ALL) == ALL) << slot.name;
 }
 
 TEST(SlotList, TheSetsOfTiersHaveTheirSizes) {
