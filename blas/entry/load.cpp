@@ -1,12 +1,7 @@
 // What runs when the library is loaded: the choice of the allocator, and the registration that keeps a forked child
 // able to call any routine. All else is made at its first use.
 
-#include "blas/types.h"
-
-extern "C" {
-QTB_HIDDEN void qtb_serv_select_allocator();
-QTB_HIDDEN void qtb_serv_prepare_fork();
-}
+#include "service/memory.h"
 
 namespace {
 
