@@ -125,7 +125,7 @@ TEST_F(Catalog, a_cut_catalogue_gives_a_whole_text_or_none) {
     fs::resize_file(path, size);
     const std::string output = message_6();
     cut += output == builtin_6;
-    if (output != builtin_6) ASSERT_EQ(output, "wrong: 3 DGEMM \n") << size;
+    ASSERT_TRUE(output == builtin_6 || output == "wrong: 3 DGEMM \n") << size << ": " << output;
   }
   EXPECT_GT(cut, 0);
 }

@@ -1,8 +1,15 @@
-qtb_add_test(entry_checks SOURCES entry/checks_test.cpp LIBRARIES qtb_static)
-qtb_add_test(entry_entries SOURCES entry/entries_test.cpp LIBRARIES qtb_static)
-qtb_add_test(entry_header SOURCES entry/header_test.cpp entry/header_c.c)
-qtb_add_test(entry_lsame SOURCES entry/lsame_test.cpp LIBRARIES qtb_static)
-qtb_add_test(entry_messages SOURCES entry/messages_test.cpp platform/fake_messages.cpp LIBRARIES qtb_static)
-qtb_add_test(entry_catalog SOURCES entry/catalog_test.cpp LIBRARIES qtb_static qtb_platform_static)
-qtb_add_test(entry_version SOURCES entry/version_test.cpp LIBRARIES qtb_static)
-qtb_add_test(entry_xerbla SOURCES entry/xerbla_test.cpp platform/fake_messages.cpp LIBRARIES qtb_static)
+qtb_add_test(catalog_test SOURCES entry/catalog_test.cpp LIBRARIES qtb_static qtb_platform_static)
+qtb_add_test(checks_test SOURCES entry/checks_test.cpp LIBRARIES qtb_static)
+qtb_add_test(entries_test SOURCES entry/entries_test.cpp LIBRARIES qtb_static)
+qtb_add_test(header_test SOURCES entry/header_test.cpp entry/header_c.c)
+qtb_add_test(lsame_test SOURCES entry/lsame_test.cpp LIBRARIES qtb_static)
+qtb_add_test(messages_test SOURCES entry/messages_test.cpp platform/fake_messages.cpp LIBRARIES qtb_static)
+qtb_add_test(version_test SOURCES entry/version_test.cpp LIBRARIES qtb_static)
+qtb_add_test(xerbla_test SOURCES entry/xerbla_test.cpp platform/fake_messages.cpp LIBRARIES qtb_static)
+
+# The corpora of the fuzz targets.
+foreach(name catalog_text xerbla)
+  qtb_add_test(${name}_corpus_test SOURCES fuzz/replay_test.cpp fuzz/${name}_fuzz.cpp platform/fake_messages.cpp
+    LIBRARIES qtb_static)
+  target_compile_definitions(${name}_corpus_test PRIVATE QTB_TEST_CORPUS="${PROJECT_SOURCE_DIR}/tests/fuzz/corpus/${name}")
+endforeach()

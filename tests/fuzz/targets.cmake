@@ -22,3 +22,6 @@ function(qtb_add_fuzz name)
   math(EXPR limit "2 * ${QTB_FUZZ_SECONDS} + 60")
   set_tests_properties(${name}_fuzz.search PROPERTIES LABELS long TIMEOUT ${limit})
 endfunction()
+
+qtb_add_fuzz(catalog_text SOURCES fuzz/catalog_text_fuzz.cpp platform/fake_messages.cpp LIBRARIES qtb_static)
+qtb_add_fuzz(xerbla SOURCES fuzz/xerbla_fuzz.cpp platform/fake_messages.cpp LIBRARIES qtb_static)

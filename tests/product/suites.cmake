@@ -6,6 +6,11 @@ if(NOT QTB_INSTRUMENT)
     qtb_add_script_test(tier_objects_test.${tier} COMMAND product/tier_objects_test.sh ${tier} ${list})
   endforeach()
   qtb_add_script_test(tier_objects_self_test COMMAND product/tier_objects_self_test.sh)
+  qtb_add_script_test(exports_test
+    COMMAND product/exports_test.sh $<TARGET_FILE:qtb> ${PROJECT_SOURCE_DIR}/blas/routines.def)
+  qtb_add_script_test(exports_self_test
+    COMMAND product/exports_self_test.sh ${PROJECT_SOURCE_DIR}/blas/routines.def)
+  qtb_add_script_test(install_test COMMAND product/install_test.sh ${PROJECT_BINARY_DIR})
 endif()
 qtb_add_script_test(repository_test COMMAND product/repository_test.sh ${PROJECT_SOURCE_DIR})
 qtb_add_script_test(repository_self_test COMMAND product/repository_self_test.sh)
