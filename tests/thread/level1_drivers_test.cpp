@@ -205,22 +205,6 @@ double dot_ratio(const Operands<T> &o, T got) {
   return error_ratio(got, want, gauge, static_cast<double>(is_complex<T> ? 2 * a.n : a.n));
 }
 
-// The largest error / bound of alpha*x + y, from the operands before the call and y after it.
-template <class T>
-double axpy_ratio(const Operands<T> &before, const Vector<T> &y_after) {
-  const Level1Call<T> &a = before.call;
-  double worst = 0;
-  for (QtbInt i = 0; i < a.n; ++i) {
-    const QuadComplex alpha = widen(a.alpha), x = widen(a.x[place(i, a.n, a.incx)]),
-                      y = widen(a.y[place(i, a.n, a.incy)]), term = product(alpha, x);
-    const QuadComplex want = {term.re + y.re, term.im + y.im};
-    worst = std::max(worst, error_ratio(y_after.store.data()[place(i, a.n, a.incy)], want,
-                                        magnitude(alpha) * magnitude(x) + magnitude(y), is_complex<T> ? 3 : 2,
-                                        static_cast<double>(magnitude(alpha))));
-  }
-  return worst;
-}
-
 // ---- One call, checked in every respect ----
 
 long cases_of_tier[tier_count];
@@ -284,9 +268,8 @@ void check_dot(const Level1Routine<T> &r, int tier, const Operands<T> &o, int te
   ASSERT_LE(ratio, 1.0);
 }
 
-// Runs the driver and the tier's serial routine on like operands. Elementwise results are equal to the bit, gaps and
-// what is only read included; the complex axpy may round its parts in another order at another alignment and is held to
-// its bound.
+// Runs the driver and the tier's serial routine on like operands. Elementwise results are equal to the bit: each
+// element is computed alone, so that the team cannot change it. So are the gaps and what is only read.
 template <class T>
 void check(const Level1Routine<T> &r, int tier, QtbInt nthreads, const Problem &p, int expected_team) {
   SCOPED_TRACE(std::string(r.name) + " on " + tier_name(tier) + ": threads " + std::to_string(nthreads) + " n " +
@@ -310,14 +293,7 @@ void check(const Level1Routine<T> &r, int tier, QtbInt nthreads, const Problem &
   if (r.is_dot()) check_dot(r, tier, parallel, team, parallel.call.result);
   r.tier(tier, serial.call);
   ASSERT_TRUE(parallel.x.same_bits(serial.x)) << "x differs from the serial routine's";
-  if (is_complex<T> && r.shape == Shape::axpy) {
-    const Operands<T> before(p);
-    const double ratio = axpy_ratio(before, parallel.y);
-    worst_ratio[r.name] = std::max(worst_ratio[r.name], ratio);
-    ASSERT_LE(ratio, 1.0);
-  } else {
-    ASSERT_TRUE(parallel.y.same_bits(serial.y)) << "y differs from the serial routine's";
-  }
+  ASSERT_TRUE(parallel.y.same_bits(serial.y)) << "y differs from the serial routine's";
   ++cases_of_tier[tier];
 }
 
@@ -364,7 +340,7 @@ Problem random_problem(std::mt19937_64 &random, QtbInt n, std::size_t step) {
 }
 
 TEST_F(Level1Drivers, EveryTeamAndTierEqualsTheSerialRoutine) {
-  const int repeats = long_run() ? 50 : 5;
+  const int repeats = long_run() ? 50 : 2;
   std::mt19937_64 random(20);
   for (const int team : {1, 2, 3, 4, 5, 7, 8, 9, 10, 11, 16, 24, 33, 129})
     for (int repeat = 0; repeat < repeats; ++repeat)
@@ -381,10 +357,10 @@ TEST_F(Level1Drivers, EveryTeamAndTierEqualsTheSerialRoutine) {
 
 TEST_F(Level1Drivers, LengthsAroundTheChunksAtEveryIncrement) {
   for_each_level1_routine([&]<class T>(const Level1Routine<T> &r) {
-    for (const int team : {2, 3, 5})
+    for (const int team : {2, 5})
       for (const QtbInt n : {0, 1, team - 1, 8 * team - 1, 8 * team, 8 * team + 1, 40 * team + 7})
-        for (const QtbInt incx : {-3, -2, -1, 1, 2, 3})
-          for (const QtbInt incy : {-3, -1, 1, 2})
+        for (const QtbInt incx : {-2, -1, 1, 3})
+          for (const QtbInt incy : {-3, 1, 2})
             ASSERT_NO_FATAL_FAILURE(check(r, tier_sse42, team, {n, incx, incy}, team));
   });
 }
@@ -575,7 +551,6 @@ bool equals_serial(const Level1Routine<T> &r, int tier, QtbInt nthreads, const P
   r.driver(nthreads, parallel.call);
   r.tier(tier, serial.call);
   if (r.is_dot()) return dot_ratio(serial, parallel.call.result) <= 1;
-  if (is_complex<T> && r.shape == Shape::axpy) return axpy_ratio(Operands<T>(p), parallel.y) <= 1;
   return parallel.x.same_bits(serial.x) && parallel.y.same_bits(serial.y);
 }
 

@@ -1,6 +1,6 @@
 qtb_add_test(level1_decision_test SOURCES thread/level1_decision_test.cpp TIMEOUT 60)
-qtb_add_test(level1_drivers_test SOURCES thread/level1_drivers_test.cpp LIBRARIES qtb_static SHARDS 2 TIMEOUT 120)
+qtb_add_test(level1_drivers_test SOURCES thread/level1_drivers_test.cpp LIBRARIES qtb_static SHARDS 2)
 qtb_add_test(level1_front_ends_test SOURCES thread/level1_front_ends_test.cpp LIBRARIES qtb_static TIMEOUT 60)
 qtb_add_test(level1_library_test SOURCES thread/level1_library_test.cpp
-  LIBRARIES qtb_static qtb_platform_fake SHARDS 2 TIMEOUT 120)
+  LIBRARIES qtb_static qtb_platform_fake SHARDS 2)
 qtb_add_test(level1_share_test SOURCES thread/level1_share_test.cpp TIMEOUT 60)
