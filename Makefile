@@ -72,7 +72,7 @@ tsan:
 fuzz:
 	@tools/packages.sh build fuzz
 	cmake --preset fuzz -D QTB_FUZZ_SECONDS=$(FUZZ_SECONDS)
-	cmake --build --preset fuzz -j $(JOBS)
+	cmake --build --preset fuzz -j $(JOBS) --target fuzz_targets
 	ctest --preset fuzz -j $(JOBS)
 
 coverage:
