@@ -6,7 +6,7 @@
 #include <cstdint>
 
 // X(tier, TIER, ...) once per tier, in the order of their numbers.
-#define QTB_FOR_EACH_TIER(X, ...)  \
+#define QTB_FOR_EACH_TIER(X, ...)            \
   X(def, DEF __VA_OPT__(, ) __VA_ARGS__)     \
   X(sse3, SSE3 __VA_OPT__(, ) __VA_ARGS__)   \
   X(ssse3, SSSE3 __VA_OPT__(, ) __VA_ARGS__) \

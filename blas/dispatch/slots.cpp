@@ -10,7 +10,7 @@ namespace qtb {
 
 // Constant data: the conditions are constants, so a target that is not named is not referred to.
 #define QTB_TARGET(tier, TIER, name, tiers) \
-  ((tiers) & tier_set::TIER) != 0 ? reinterpret_cast<CodePointer>(&qtb_blas_##tier##_x##name) : &qtb_blas_noop,
+  (tier_set::TIER & (tiers)) != 0 ? reinterpret_cast<CodePointer>(&qtb_blas_##tier##_x##name) : &qtb_blas_noop,
 #define QTB_SLOT(name, shape, T, tiers) {#name, tiers, {QTB_FOR_EACH_TIER(QTB_TARGET, name, tiers)}},
 using namespace tier_set;
 const SlotTargets slot_targets[slot_count] = {
@@ -47,9 +47,9 @@ template <class Function, SlotNumber slot>
 }  // namespace qtb
 
 extern "C" {
-#define QTB_SLOT(name, shape, T, tiers)                                                              \
-  QTB_FUNCTION(shape, T, qtb_blas_x##name) {                                                         \
-    return qtb::resolve<QTB_FUNCTION_TYPE(shape, T), qtb::slot_##name>()(QTB_ARGS(shape));             \
+#define QTB_SLOT(name, shape, T, tiers)                                                    \
+  QTB_FUNCTION(shape, T, qtb_blas_x##name) {                                               \
+    return qtb::resolve<QTB_FUNCTION_TYPE(shape, T), qtb::slot_##name>()(QTB_ARGS(shape)); \
   }
 #include "blas/dispatch/slots.def"
 #undef QTB_SLOT

@@ -12,7 +12,7 @@
 // The stubs, and the implementations behind them: qtb_blas_<tier>_x<name>.
 extern "C" {
 #define QTB_DECLARE_TARGET(tier, TIER, name, shape, T) QTB_HIDDEN QTB_FUNCTION(shape, T, qtb_blas_##tier##_x##name);
-#define QTB_SLOT(name, shape, T, tiers)              \
+#define QTB_SLOT(name, shape, T, tiers)                \
   QTB_HIDDEN QTB_FUNCTION(shape, T, qtb_blas_x##name); \
   QTB_FOR_EACH_TIER(QTB_DECLARE_TARGET, name, shape, T)
 #include "blas/dispatch/slots.def"
