@@ -113,42 +113,42 @@
 
 // ---- Level 2 ----
 #define QTB_RESULT_gemv(T) void
-#define QTB_PARAMS_gemv(T)                                                                                            \
-  const char *trans, const QtbInt *m, const QtbInt *n, const T *alpha, const T *a, const QtbInt *lda, const T *x,     \
+#define QTB_PARAMS_gemv(T)                                                                                        \
+  const char *trans, const QtbInt *m, const QtbInt *n, const T *alpha, const T *a, const QtbInt *lda, const T *x, \
       const QtbInt *incx, const T *beta, T *y, const QtbInt *incy
 #define QTB_ARGS_gemv trans, m, n, alpha, a, lda, x, incx, beta, y, incy
 
 #define QTB_RESULT_gbmv(T) void
-#define QTB_PARAMS_gbmv(T)                                                                                            \
-  const char *trans, const QtbInt *m, const QtbInt *n, const QtbInt *kl, const QtbInt *ku, const T *alpha,            \
-      const T *a, const QtbInt *lda, const T *x, const QtbInt *incx, const T *beta, T *y, const QtbInt *incy
+#define QTB_PARAMS_gbmv(T)                                                                                             \
+  const char *trans, const QtbInt *m, const QtbInt *n, const QtbInt *kl, const QtbInt *ku, const T *alpha, const T *a, \
+      const QtbInt *lda, const T *x, const QtbInt *incx, const T *beta, T *y, const QtbInt *incy
 #define QTB_ARGS_gbmv trans, m, n, kl, ku, alpha, a, lda, x, incx, beta, y, incy
 
 #define QTB_RESULT_ger(T) void
-#define QTB_PARAMS_ger(T)                                                                                             \
-  const QtbInt *m, const QtbInt *n, const T *alpha, const T *x, const QtbInt *incx, const T *y, const QtbInt *incy,   \
+#define QTB_PARAMS_ger(T)                                                                                           \
+  const QtbInt *m, const QtbInt *n, const T *alpha, const T *x, const QtbInt *incx, const T *y, const QtbInt *incy, \
       T *a, const QtbInt *lda
 #define QTB_ARGS_ger m, n, alpha, x, incx, y, incy, a, lda
 
 // symv and hemv.
 #define QTB_RESULT_symv(T) void
-#define QTB_PARAMS_symv(T)                                                                                            \
-  const char *uplo, const QtbInt *n, const T *alpha, const T *a, const QtbInt *lda, const T *x, const QtbInt *incx,   \
+#define QTB_PARAMS_symv(T)                                                                                          \
+  const char *uplo, const QtbInt *n, const T *alpha, const T *a, const QtbInt *lda, const T *x, const QtbInt *incx, \
       const T *beta, T *y, const QtbInt *incy
 #define QTB_ARGS_symv uplo, n, alpha, a, lda, x, incx, beta, y, incy
 
 // sbmv and hbmv.
 #define QTB_RESULT_sbmv(T) void
-#define QTB_PARAMS_sbmv(T)                                                                                            \
-  const char *uplo, const QtbInt *n, const QtbInt *k, const T *alpha, const T *a, const QtbInt *lda, const T *x,      \
+#define QTB_PARAMS_sbmv(T)                                                                                       \
+  const char *uplo, const QtbInt *n, const QtbInt *k, const T *alpha, const T *a, const QtbInt *lda, const T *x, \
       const QtbInt *incx, const T *beta, T *y, const QtbInt *incy
 #define QTB_ARGS_sbmv uplo, n, k, alpha, a, lda, x, incx, beta, y, incy
 
 // spmv and hpmv.
 #define QTB_RESULT_spmv(T) void
-#define QTB_PARAMS_spmv(T)                                                                                            \
-  const char *uplo, const QtbInt *n, const T *alpha, const T *ap, const T *x, const QtbInt *incx, const T *beta,      \
-      T *y, const QtbInt *incy
+#define QTB_PARAMS_spmv(T)                                                                                             \
+  const char *uplo, const QtbInt *n, const T *alpha, const T *ap, const T *x, const QtbInt *incx, const T *beta, T *y, \
+      const QtbInt *incy
 #define QTB_ARGS_spmv uplo, n, alpha, ap, x, incx, beta, y, incy
 
 #define QTB_RESULT_syr(T) void
@@ -166,86 +166,85 @@
 #define QTB_ARGS_spr uplo, n, alpha, x, incx, ap
 
 #define QTB_RESULT_hpr(T) void
-#define QTB_PARAMS_hpr(T) \
-  const char *uplo, const QtbInt *n, const Real<T> *alpha, const T *x, const QtbInt *incx, T *ap
+#define QTB_PARAMS_hpr(T) const char *uplo, const QtbInt *n, const Real<T> *alpha, const T *x, const QtbInt *incx, T *ap
 #define QTB_ARGS_hpr uplo, n, alpha, x, incx, ap
 
 // syr2 and her2.
 #define QTB_RESULT_syr2(T) void
-#define QTB_PARAMS_syr2(T)                                                                                            \
-  const char *uplo, const QtbInt *n, const T *alpha, const T *x, const QtbInt *incx, const T *y, const QtbInt *incy,  \
+#define QTB_PARAMS_syr2(T)                                                                                           \
+  const char *uplo, const QtbInt *n, const T *alpha, const T *x, const QtbInt *incx, const T *y, const QtbInt *incy, \
       T *a, const QtbInt *lda
 #define QTB_ARGS_syr2 uplo, n, alpha, x, incx, y, incy, a, lda
 
 // spr2 and hpr2.
 #define QTB_RESULT_spr2(T) void
-#define QTB_PARAMS_spr2(T)                                                                                            \
-  const char *uplo, const QtbInt *n, const T *alpha, const T *x, const QtbInt *incx, const T *y, const QtbInt *incy,  \
+#define QTB_PARAMS_spr2(T)                                                                                           \
+  const char *uplo, const QtbInt *n, const T *alpha, const T *x, const QtbInt *incx, const T *y, const QtbInt *incy, \
       T *ap
 #define QTB_ARGS_spr2 uplo, n, alpha, x, incx, y, incy, ap
 
 // trmv and trsv.
 #define QTB_RESULT_trmv(T) void
-#define QTB_PARAMS_trmv(T)                                                                                            \
-  const char *uplo, const char *trans, const char *diag, const QtbInt *n, const T *a, const QtbInt *lda, T *x,        \
+#define QTB_PARAMS_trmv(T)                                                                                     \
+  const char *uplo, const char *trans, const char *diag, const QtbInt *n, const T *a, const QtbInt *lda, T *x, \
       const QtbInt *incx
 #define QTB_ARGS_trmv uplo, trans, diag, n, a, lda, x, incx
 
 // tbmv and tbsv.
 #define QTB_RESULT_tbmv(T) void
-#define QTB_PARAMS_tbmv(T)                                                                                            \
-  const char *uplo, const char *trans, const char *diag, const QtbInt *n, const QtbInt *k, const T *a,                \
+#define QTB_PARAMS_tbmv(T)                                                                             \
+  const char *uplo, const char *trans, const char *diag, const QtbInt *n, const QtbInt *k, const T *a, \
       const QtbInt *lda, T *x, const QtbInt *incx
 #define QTB_ARGS_tbmv uplo, trans, diag, n, k, a, lda, x, incx
 
 // tpmv and tpsv.
 #define QTB_RESULT_tpmv(T) void
-#define QTB_PARAMS_tpmv(T)                                                                                            \
+#define QTB_PARAMS_tpmv(T) \
   const char *uplo, const char *trans, const char *diag, const QtbInt *n, const T *ap, T *x, const QtbInt *incx
 #define QTB_ARGS_tpmv uplo, trans, diag, n, ap, x, incx
 
 // ---- Level 3 ----
 #define QTB_RESULT_gemm(T) void
-#define QTB_PARAMS_gemm(T)                                                                                            \
-  const char *transa, const char *transb, const QtbInt *m, const QtbInt *n, const QtbInt *k, const T *alpha,          \
+#define QTB_PARAMS_gemm(T)                                                                                   \
+  const char *transa, const char *transb, const QtbInt *m, const QtbInt *n, const QtbInt *k, const T *alpha, \
       const T *a, const QtbInt *lda, const T *b, const QtbInt *ldb, const T *beta, T *c, const QtbInt *ldc
 #define QTB_ARGS_gemm transa, transb, m, n, k, alpha, a, lda, b, ldb, beta, c, ldc
 
 // symm and hemm.
 #define QTB_RESULT_symm(T) void
-#define QTB_PARAMS_symm(T)                                                                                            \
-  const char *side, const char *uplo, const QtbInt *m, const QtbInt *n, const T *alpha, const T *a,                   \
-      const QtbInt *lda, const T *b, const QtbInt *ldb, const T *beta, T *c, const QtbInt *ldc
+#define QTB_PARAMS_symm(T)                                                                                             \
+  const char *side, const char *uplo, const QtbInt *m, const QtbInt *n, const T *alpha, const T *a, const QtbInt *lda, \
+      const T *b, const QtbInt *ldb, const T *beta, T *c, const QtbInt *ldc
 #define QTB_ARGS_symm side, uplo, m, n, alpha, a, lda, b, ldb, beta, c, ldc
 
 #define QTB_RESULT_syrk(T) void
-#define QTB_PARAMS_syrk(T)                                                                                            \
-  const char *uplo, const char *trans, const QtbInt *n, const QtbInt *k, const T *alpha, const T *a,                  \
+#define QTB_PARAMS_syrk(T)                                                                           \
+  const char *uplo, const char *trans, const QtbInt *n, const QtbInt *k, const T *alpha, const T *a, \
       const QtbInt *lda, const T *beta, T *c, const QtbInt *ldc
 #define QTB_ARGS_syrk uplo, trans, n, k, alpha, a, lda, beta, c, ldc
 
 #define QTB_RESULT_herk(T) void
-#define QTB_PARAMS_herk(T)                                                                                            \
-  const char *uplo, const char *trans, const QtbInt *n, const QtbInt *k, const Real<T> *alpha, const T *a,            \
+#define QTB_PARAMS_herk(T)                                                                                 \
+  const char *uplo, const char *trans, const QtbInt *n, const QtbInt *k, const Real<T> *alpha, const T *a, \
       const QtbInt *lda, const Real<T> *beta, T *c, const QtbInt *ldc
 #define QTB_ARGS_herk uplo, trans, n, k, alpha, a, lda, beta, c, ldc
 
 #define QTB_RESULT_syr2k(T) void
-#define QTB_PARAMS_syr2k(T)                                                                                           \
-  const char *uplo, const char *trans, const QtbInt *n, const QtbInt *k, const T *alpha, const T *a,                  \
+#define QTB_PARAMS_syr2k(T)                                                                          \
+  const char *uplo, const char *trans, const QtbInt *n, const QtbInt *k, const T *alpha, const T *a, \
       const QtbInt *lda, const T *b, const QtbInt *ldb, const T *beta, T *c, const QtbInt *ldc
 #define QTB_ARGS_syr2k uplo, trans, n, k, alpha, a, lda, b, ldb, beta, c, ldc
 
 #define QTB_RESULT_her2k(T) void
-#define QTB_PARAMS_her2k(T)                                                                                           \
-  const char *uplo, const char *trans, const QtbInt *n, const QtbInt *k, const T *alpha, const T *a,                  \
+#define QTB_PARAMS_her2k(T)                                                                          \
+  const char *uplo, const char *trans, const QtbInt *n, const QtbInt *k, const T *alpha, const T *a, \
       const QtbInt *lda, const T *b, const QtbInt *ldb, const Real<T> *beta, T *c, const QtbInt *ldc
 #define QTB_ARGS_her2k uplo, trans, n, k, alpha, a, lda, b, ldb, beta, c, ldc
 
 // trmm and trsm.
 #define QTB_RESULT_trmm(T) void
-#define QTB_PARAMS_trmm(T)                                                                                            \
-  const char *side, const char *uplo, const char *transa, const char *diag, const QtbInt *m, const QtbInt *n,         \
+#define QTB_PARAMS_trmm(T)                                                                                    \
+  const char *side, const char *uplo, const char *transa, const char *diag, const QtbInt *m, const QtbInt *n, \
       const T *alpha, const T *a, const QtbInt *lda, T *b, const QtbInt *ldb
 #define QTB_ARGS_trmm side, uplo, transa, diag, m, n, alpha, a, lda, b, ldb
 
@@ -253,21 +252,21 @@
 
 // A rank-1 update of len columns of a triangle, together with a rectangle of other rows above ("U") or below ("L") it.
 #define QTB_RESULT_syr_block(T) void
-#define QTB_PARAMS_syr_block(T)                                                                                       \
-  const char *uplo, const QtbInt *len, const T *alpha, const T *x, const QtbInt *incx, T *a, const QtbInt *lda,       \
+#define QTB_PARAMS_syr_block(T)                                                                                 \
+  const char *uplo, const QtbInt *len, const T *alpha, const T *x, const QtbInt *incx, T *a, const QtbInt *lda, \
       const QtbInt *other
 #define QTB_ARGS_syr_block uplo, len, alpha, x, incx, a, lda, other
 
 #define QTB_RESULT_syr2_block(T) void
-#define QTB_PARAMS_syr2_block(T)                                                                                      \
-  const char *uplo, const QtbInt *len, const T *alpha, const T *x, const QtbInt *incx, const T *y,                    \
-      const QtbInt *incy, T *a, const QtbInt *lda, const QtbInt *other
+#define QTB_PARAMS_syr2_block(T)                                                                                       \
+  const char *uplo, const QtbInt *len, const T *alpha, const T *x, const QtbInt *incx, const T *y, const QtbInt *incy, \
+      T *a, const QtbInt *lda, const QtbInt *other
 #define QTB_ARGS_syr2_block uplo, len, alpha, x, incx, y, incy, a, lda, other
 
 // len elements of a triangular product from extent elements of the contiguous copy work of the old x.
 #define QTB_RESULT_trmv_block(T) void
-#define QTB_PARAMS_trmv_block(T)                                                                                      \
-  const char *uplo, const char *trans, const char *diag, const QtbInt *extent, const T *a, const QtbInt *lda, T *x,   \
+#define QTB_PARAMS_trmv_block(T)                                                                                    \
+  const char *uplo, const char *trans, const char *diag, const QtbInt *extent, const T *a, const QtbInt *lda, T *x, \
       const QtbInt *incx, const QtbInt *len, const T *work
 #define QTB_ARGS_trmv_block uplo, trans, diag, extent, a, lda, x, incx, len, work
 
@@ -280,38 +279,38 @@
 
 // Block sizes: mb, nb and kb are in-out (a nonzero value stays), mr, nr and ku are out.
 #define QTB_RESULT_blocks(T) void
-#define QTB_PARAMS_blocks(T)                                                                                          \
-  const QtbInt *m, const QtbInt *n, const QtbInt *k, QtbInt *mb, QtbInt *nb, QtbInt *kb, QtbInt *mr, QtbInt *nr,      \
+#define QTB_PARAMS_blocks(T)                                                                                     \
+  const QtbInt *m, const QtbInt *n, const QtbInt *k, QtbInt *mb, QtbInt *nb, QtbInt *kb, QtbInt *mr, QtbInt *nr, \
       QtbInt *ku
 #define QTB_ARGS_blocks m, n, k, mb, nb, kb, mr, nr, ku
 
 // Packing of rows x cols of op(A) or op(B) at src into micro-panels that start ldp elements apart. A copies multiply by
 // alpha; B copies do not read it.
 #define QTB_RESULT_panel_copy(T) void
-#define QTB_PARAMS_panel_copy(T)                                                                                      \
+#define QTB_PARAMS_panel_copy(T) \
   const QtbInt *rows, const QtbInt *cols, const T *src, const QtbInt *ld, T *dst, const QtbInt *ldp, const T *alpha
 #define QTB_ARGS_panel_copy rows, cols, src, ld, dst, ldp, alpha
 
 // gemm with B packed outside: bp is the panel, ldbp the step of its micro-panels.
 #define QTB_RESULT_gemm_bpacked(T) void
-#define QTB_PARAMS_gemm_bpacked(T)                                                                                    \
-  const char *transa, const char *transb, const QtbInt *m, const QtbInt *n, const QtbInt *k, const T *alpha,          \
-      const T *a, const QtbInt *lda, const T *b, const QtbInt *ldb, const T *bp, const QtbInt *ldbp, const T *beta,   \
+#define QTB_PARAMS_gemm_bpacked(T)                                                                                  \
+  const char *transa, const char *transb, const QtbInt *m, const QtbInt *n, const QtbInt *k, const T *alpha,        \
+      const T *a, const QtbInt *lda, const T *b, const QtbInt *ldb, const T *bp, const QtbInt *ldbp, const T *beta, \
       T *c, const QtbInt *ldc
 #define QTB_ARGS_gemm_bpacked transa, transb, m, n, k, alpha, a, lda, b, ldb, bp, ldbp, beta, c, ldc
 
 // gemm with A packed outside, alpha folded in.
 #define QTB_RESULT_gemm_apacked(T) void
-#define QTB_PARAMS_gemm_apacked(T)                                                                                    \
-  const char *transa, const char *transb, const QtbInt *m, const QtbInt *n, const QtbInt *k, const T *alpha,          \
-      const T *a, const QtbInt *lda, const T *ap, const QtbInt *ldap, const T *b, const QtbInt *ldb, const T *beta,   \
+#define QTB_PARAMS_gemm_apacked(T)                                                                                  \
+  const char *transa, const char *transb, const QtbInt *m, const QtbInt *n, const QtbInt *k, const T *alpha,        \
+      const T *a, const QtbInt *lda, const T *ap, const QtbInt *ldap, const T *b, const QtbInt *ldb, const T *beta, \
       T *c, const QtbInt *ldc
 #define QTB_ARGS_gemm_apacked transa, transb, m, n, k, alpha, a, lda, ap, ldap, b, ldb, beta, c, ldc
 
 // gemm with both packed outside.
 #define QTB_RESULT_gemm_packed(T) void
-#define QTB_PARAMS_gemm_packed(T)                                                                                     \
-  const char *transa, const char *transb, const QtbInt *m, const QtbInt *n, const QtbInt *k, const T *alpha,          \
-      const T *a, const QtbInt *lda, const T *ap, const QtbInt *ldap, const T *b, const QtbInt *ldb, const T *bp,     \
+#define QTB_PARAMS_gemm_packed(T)                                                                                 \
+  const char *transa, const char *transb, const QtbInt *m, const QtbInt *n, const QtbInt *k, const T *alpha,      \
+      const T *a, const QtbInt *lda, const T *ap, const QtbInt *ldap, const T *b, const QtbInt *ldb, const T *bp, \
       const QtbInt *ldbp, const T *beta, T *c, const QtbInt *ldc
 #define QTB_ARGS_gemm_packed transa, transb, m, n, k, alpha, a, lda, ap, ldap, b, ldb, bp, ldbp, beta, c, ldc

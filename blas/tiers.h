@@ -6,7 +6,7 @@
 #include <cstdint>
 
 // X(tier, TIER, ...) once per tier, in the order of their numbers.
-#define QTB_FOR_EACH_TIER(X, ...)  \
+#define QTB_FOR_EACH_TIER(X, ...)            \
   X(def, DEF __VA_OPT__(, ) __VA_ARGS__)     \
   X(sse3, SSE3 __VA_OPT__(, ) __VA_ARGS__)   \
   X(ssse3, SSSE3 __VA_OPT__(, ) __VA_ARGS__) \
@@ -23,6 +23,5 @@ enum ProcessorTier : std::int32_t { QTB_FOR_EACH_TIER(QTB_TIER_NUMBER) tier_coun
 namespace qtb::tier_set {
 QTB_FOR_EACH_TIER(QTB_TIER_BIT)
 inline constexpr unsigned ALL = (1U << tier_count) - 1;
-inline constexpr unsigned AVX_RUNS_SSE42 = 1U << tier_count;  // added to a set: the avx tier runs the body of sse42
 }  // namespace qtb::tier_set
 #undef QTB_TIER_BIT

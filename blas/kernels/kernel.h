@@ -46,6 +46,6 @@ constexpr ProcessorTier this_tier = QTB_TIER_EXPAND(tier_, QTB_TIER, );
 // This tier's procedure under the name of another tier, whose build has none of its own.
 #define QTB_TIER_TEXT_OF(tier) #tier
 #define QTB_TIER_TEXT_EXPAND(tier) QTB_TIER_TEXT_OF(tier)
-#define QTB_KERNEL_SHARED(other, name, shape, T)                                   \
-  extern "C" QTB_HIDDEN QTB_FUNCTION(shape, T, qtb_blas_##other##_x##name)         \
+#define QTB_KERNEL_SHARED(other, name, shape, T)                           \
+  extern "C" QTB_HIDDEN QTB_FUNCTION(shape, T, qtb_blas_##other##_x##name) \
       __attribute__((alias("qtb_blas_" QTB_TIER_TEXT_EXPAND(QTB_TIER) "_x" #name)));

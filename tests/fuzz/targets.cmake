@@ -2,6 +2,8 @@
 # replay the corpora; the tests of this file run each target on new inputs too.
 set(QTB_FUZZ_SECONDS 60 CACHE STRING "How long each fuzz target runs")
 
+add_custom_target(fuzz_targets)
+
 # qtb_add_fuzz(name SOURCES source... [LIBRARIES library...]); sources relative to tests.
 function(qtb_add_fuzz name)
   cmake_parse_arguments(arg "" "" "SOURCES;LIBRARIES" ${ARGN})
@@ -11,6 +13,7 @@ function(qtb_add_fuzz name)
   target_compile_options(${name}_fuzz PRIVATE -Wall -Wextra)
   target_link_options(${name}_fuzz PRIVATE -fsanitize=fuzzer)
   target_link_libraries(${name}_fuzz PRIVATE ${arg_LIBRARIES} OpenMP::OpenMP_CXX ${CMAKE_DL_LIBS})
+  add_dependencies(fuzz_targets ${name}_fuzz)
   set(corpus ${PROJECT_SOURCE_DIR}/tests/fuzz/corpus/${name})
   set(scratch ${CMAKE_CURRENT_BINARY_DIR}/fuzz)
   file(MAKE_DIRECTORY ${scratch}/${name})
@@ -25,3 +28,4 @@ endfunction()
 
 qtb_add_fuzz(catalog_text SOURCES fuzz/catalog_text_fuzz.cpp platform/fake_messages.cpp LIBRARIES qtb_static)
 qtb_add_fuzz(xerbla SOURCES fuzz/xerbla_fuzz.cpp platform/fake_messages.cpp LIBRARIES qtb_static)
+qtb_add_fuzz(environment SOURCES fuzz/environment_fuzz.cpp LIBRARIES qtb_static qtb_platform_fake)

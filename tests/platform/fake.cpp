@@ -1,3 +1,5 @@
+// The made-up operating system; see fake.h.
+
 #include "tests/platform/fake.h"
 
 #include <algorithm>

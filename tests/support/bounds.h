@@ -42,14 +42,16 @@ double error_ratio(R got, Quad want, Quad gauge, double c, double alpha_magnitud
     const bool want_nan = is_nan(want), got_nan = std::isnan(got);
     const bool want_finite = !want_nan && magnitude(want) <= Quad(overflow);
     if (want_nan != got_nan) return std::numeric_limits<double>::infinity();
-    if (!want_nan && want_finite != static_cast<bool>(std::isfinite(got))) return std::numeric_limits<double>::infinity();
+    if (!want_nan && want_finite != static_cast<bool>(std::isfinite(got)))
+      return std::numeric_limits<double>::infinity();
     return 0;
   }
   if (!std::isfinite(got)) return std::numeric_limits<double>::infinity();
   const Quad error = magnitude(Quad(got) - want);
   if (error == 0) return 0;
   const Quad eta = Quad(std::numeric_limits<R>::denorm_min());
-  const Quad bound = Quad(c) * Quad(unit_roundoff<R>) * gauge + Quad(c) * eta * Quad(alpha_magnitude > 1 ? alpha_magnitude : 1);
+  const Quad bound =
+      Quad(c) * Quad(unit_roundoff<R>) * gauge + Quad(c) * eta * Quad(alpha_magnitude > 1 ? alpha_magnitude : 1);
   return static_cast<double>(error / bound);
 }
 

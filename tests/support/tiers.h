@@ -33,6 +33,7 @@ void in_every_tier(F f) {
 // QTB_ALL_TIERS(daxpy): an initialiser of an array over tiers with the five implementations of a routine that all tiers
 // have. Only the named procedures are linked.
 #define QTB_TIER_PROCEDURE(tier, TIER, name) qtb_blas_##tier##_x##name,
-#define QTB_ALL_TIERS(name) {QTB_FOR_EACH_TIER(QTB_TIER_PROCEDURE, name)}
+#define QTB_ALL_TIERS(name) \
+  { QTB_FOR_EACH_TIER(QTB_TIER_PROCEDURE, name) }
 
 }  // namespace qtb::test

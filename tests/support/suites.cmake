@@ -1,0 +1,10 @@
+# The thread sanitizer itself: a race sown on purpose is found, and ordered accesses are no race.
+if(QTB_INSTRUMENT STREQUAL "tsan")
+  add_executable(race_detector support/race_detector.cpp)
+  target_link_libraries(race_detector PRIVATE OpenMP::OpenMP_CXX)
+  foreach(case sown ordered)
+    add_test(NAME race_detector.${case} COMMAND race_detector ${case})
+    set_tests_properties(race_detector.${case} PROPERTIES ENVIRONMENT "${QTB_TEST_ENVIRONMENT}")
+  endforeach()
+  set_tests_properties(race_detector.sown PROPERTIES PASS_REGULAR_EXPRESSION "WARNING: ThreadSanitizer: data race")
+endif()
