@@ -11,13 +11,6 @@ set(QTB_TIER_FLAGS_sse42 -march=x86-64 -msse4.2 -mno-popcnt -mno-crc32)
 # The avx tier's kernels are those of sse42; only the double-precision GEMM kernel is built with the wider encoding.
 set(QTB_TIER_FLAGS_avx   -march=x86-64 -msse4.2 -mno-popcnt -mno-crc32)
 
-# Kernels that say themselves what is a vector. A compiler that vectorised their short scalar ends as well would make
-# them longer, and would compute in spare lanes, whose values can raise exceptions that the elements do not.
-set_source_files_properties(
-  blas/kernels/level1/axpy.cpp blas/kernels/level1/complex_dot.cpp blas/kernels/level1/copy.cpp
-  blas/kernels/level1/dot.cpp blas/kernels/level1/scal.cpp blas/kernels/level1/swap.cpp
-  PROPERTIES COMPILE_OPTIONS "-fno-tree-vectorize;-fno-tree-slp-vectorize")
-
 # qtb_add_tiers(source...): one object library qtb_<tier> per tier, each of all the sources.
 function(qtb_add_tiers)
   foreach(tier IN LISTS QTB_TIERS)
