@@ -110,10 +110,10 @@ const std::vector<Pieces<cdouble>> families<cdouble> = {
     {"avx z", tier_avx, 1, 4, 4, {}, COPIES_NTC(qtb_blas_avx_xzgemm_bcopy), qtb_blas_avx_xzgemm_bpacked, none, none},
 };
 
-QtbInt round_up(QtbInt v, QtbInt multiple) { return (v + multiple - 1) / multiple * multiple; }
+inline QtbInt round_up(QtbInt v, QtbInt multiple) { return (v + multiple - 1) / multiple * multiple; }
 
 // The widths of the micro-panels of n columns of B.
-std::vector<QtbInt> widths(QtbInt nr, QtbInt n) {
+inline std::vector<QtbInt> widths(QtbInt nr, QtbInt n) {
   std::vector<QtbInt> w(static_cast<std::size_t>(n / nr), nr);
   QtbInt rest = n % nr;
   if (nr == 8 && rest >= 4) {
@@ -125,7 +125,7 @@ std::vector<QtbInt> widths(QtbInt nr, QtbInt n) {
 }
 
 // Elements of a panel whose micro-panels are ldp apart, the last of width w and depth kp.
-std::size_t panel_size(std::size_t micro_panels, QtbInt ldp, QtbInt w, QtbInt kp) {
+inline std::size_t panel_size(std::size_t micro_panels, QtbInt ldp, QtbInt w, QtbInt kp) {
   return micro_panels == 0 ? 0 : (micro_panels - 1) * static_cast<std::size_t>(ldp) + static_cast<std::size_t>(w * kp);
 }
 

@@ -71,8 +71,10 @@ struct Operand {
   T *block(QtbInt i, QtbInt j) { return op == 0 ? stored.at(i, j) : stored.at(j, i); }
 };
 
-QuadComplex times(QuadComplex a, QuadComplex b) { return {a.re * b.re - a.im * b.im, a.re * b.im + a.im * b.re}; }
-QuadComplex plus(QuadComplex a, QuadComplex b) { return {a.re + b.re, a.im + b.im}; }
+inline QuadComplex times(QuadComplex a, QuadComplex b) {
+  return {a.re * b.re - a.im * b.im, a.re * b.im + a.im * b.re};
+}
+inline QuadComplex plus(QuadComplex a, QuadComplex b) { return {a.re + b.re, a.im + b.im}; }
 
 template <class T>
 bool same_bits(T a, T b) {

@@ -21,11 +21,11 @@ enum class Family { base, sse41, def_a, def_b };
 
 // How kb follows from k, with the length of the one value that a rule has.
 enum class Depth {
-  halved,       // 256; up to k = 511 in two equal parts, below 256 all of it but at least 128
-  stepped,      // 256; up to k = 1024 128, below 256 all of it but at least 128
-  dividing,     // the value or else 128 where it divides k; otherwise the value, or two equal parts below twice of it
-  halved_down,  // the value; up to twice of it in two parts that are a multiple of 4
-  whole,        // all of k below the value but at least 128, otherwise the value
+  halved,       // the value; two equal parts below twice of it; all of k below it, but at least 128
+  stepped,      // the value; half of it up to four times the value; all of k below it, but at least 128
+  dividing,     // the value or else 128 where it divides k; otherwise the value, two equal parts below twice of it
+  halved_down,  // the value; up to twice of it two parts, rounded down to a multiple of 4
+  whole,        // the value; all of k below it, but at least 128
   fixed         // the value, the remainder of k first
 };
 struct DepthRule {
