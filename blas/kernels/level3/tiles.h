@@ -138,12 +138,9 @@ constexpr QtbInt block_depth(DepthRule kb, QtbInt k) {
       if (k % kb.value == 0) return kb.value;
       if (k % least == 0) return least;
       return k > kb.value && k < 2 * kb.value ? round_up((k + 1) / 2, 2) : kb.value;
-    case Depth::halved_down:
-      return k > kb.value && k <= 2 * kb.value ? larger(round_down(k / 2, 4), 4) : kb.value;
-    case Depth::whole:
-      return k < kb.value ? larger(least, round_up(k, 4)) : kb.value;
-    case Depth::fixed:
-      return kb.value;
+    case Depth::halved_down: return k > kb.value && k <= 2 * kb.value ? larger(round_down(k / 2, 4), 4) : kb.value;
+    case Depth::whole: return k < kb.value ? larger(least, round_up(k, 4)) : kb.value;
+    case Depth::fixed: return kb.value;
   }
   __builtin_unreachable();
 }
@@ -167,21 +164,15 @@ inline QtbInt block_rows(const GemmRules &rules, QtbInt m, QtbInt n, QtbInt k, Q
   const QtbInt value = rules.mb.value, reduced = rules.mb.reduced_or_step, step = rules.mb.reduced_or_step;
   const QtbInt twice = 2 * rules.kb.value;
   switch (rules.mb.rule) {
-    case Rows::fixed:
-      return value;
-    case Rows::small_l2:
-      return level_is_small(caches, 2, small_l2_bytes) ? reduced : value;
-    case Rows::small_l3:
-      return level_is_small(caches, 3, small_l3_bytes) ? reduced : value;
+    case Rows::fixed: return value;
+    case Rows::small_l2: return level_is_small(caches, 2, small_l2_bytes) ? reduced : value;
+    case Rows::small_l3: return level_is_small(caches, 3, small_l3_bytes) ? reduced : value;
     case Rows::area_of_k:
       return smaller(larger(m, rules.mr),
                      round_down(value / smaller(kb, larger(round_up(k, rules.ku), rules.ku)), step));
-    case Rows::area_of_kb:
-      return smaller(larger(m, rules.mr), round_down(value / kb, step));
-    case Rows::capped:
-      return smaller(round_up(m, step), value);
-    case Rows::flat:
-      return is_flat(m, n, k, twice) ? flat_rows(smaller(k, kb)) : value;
+    case Rows::area_of_kb: return smaller(larger(m, rules.mr), round_down(value / kb, step));
+    case Rows::capped: return smaller(round_up(m, step), value);
+    case Rows::flat: return is_flat(m, n, k, twice) ? flat_rows(smaller(k, kb)) : value;
     case Rows::flat_or_huge:
       if (is_flat(m, n, k, twice)) return flat_rows(smaller(k, kb));
       return is_huge(m, n, k) ? reduced : value;
