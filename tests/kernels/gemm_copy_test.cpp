@@ -5,7 +5,7 @@ namespace qtb::test {
 namespace {
 
 template <class T>
-class GemmCopies : public testing::Test {
+class GemmCopies : public Seeded {
  protected:
   static int ops() { return is_complex<T> ? 3 : 2; }
 };
@@ -18,26 +18,28 @@ TYPED_TEST(GemmCopies, PacksAWithAlphaAndZeroPaddingAndLeavesOutTheRowsBeyondATi
   const T alpha = value<T>(0.75, -0.5);
   for (const Pieces<T> &p : families<T>) {
     if (!processor_runs(p.tier) || p.acopy[0] == nullptr) continue;
-    double &worst = tallies[std::string(p.name) + " acopy"].worst;
     for (int op = 0; op < this->ops(); op++)
       for (QtbInt m : row_counts(p))
         for (QtbInt k : depths) {
           Operand<T> a(op, m, k);
           Panel<T> panel = a_panel(p, m, k);
+          double worst = 0;
           p.acopy[op](&m, &k, a.stored.array.data(), &a.stored.ld, panel.array.data(), &panel.ldp, &alpha);
           for (std::size_t e = 0; e < panel.array.size(); e++) {
             const QtbInt at = static_cast<QtbInt>(e), i = at / panel.ldp * p.mr + at % p.mr, l = at % panel.ldp / p.mr;
             if (l >= k) {
-              ASSERT_TRUE(same_bits(panel.array[e], T{})) << p.name << " padding at depth " << l;
+              ASSERT_TRUE(same_bits(panel.array[e], T{}))
+                  << tier_name(p.tier) << " " << p.name << " padding at depth " << l;
               continue;
             }
             const QuadComplex want = times(widen(alpha), widen(a.at(i, l)));
             const Quad gauge = magnitude(widen(alpha)) * magnitude(widen(a.at(i, l)));
             const double ratio = error_ratio(panel.array[e], want, gauge, is_complex<T> ? 2 : 1);
             worst = std::fmax(worst, ratio);
-            ASSERT_LE(ratio, 1) << p.name << " " << letters[op] << " element (" << i << ", " << l << ")";
+            ASSERT_LE(ratio, 1) << tier_name(p.tier) << " " << p.name << " " << letters[op] << " element (" << i << ", "
+                                << l << ")";
           }
-          tallies[std::string(p.name) + " acopy"].cases++;
+          TallyReport::of((std::string(p.name) + "_acopy").c_str()).within(p.tier, worst);
         }
   }
 }
@@ -59,13 +61,13 @@ TYPED_TEST(GemmCopies, PacksBBitByBitWithZeroPaddingAndNarrowerEdges) {
               for (QtbInt j = 0; j < w; j++) {
                 const T got = panel.array[static_cast<std::size_t>(q * panel.ldp + l * w + j)];
                 ASSERT_TRUE(same_bits(got, l < k ? b.at(l, j0 + j) : T{}))
-                    << p.name << " " << letters[op] << " element (" << l << ", " << j0 + j << ") of " << k << " x "
-                    << n;
+                    << tier_name(p.tier) << " " << p.name << " " << letters[op] << " element (" << l << ", " << j0 + j
+                    << ") of " << k << " x " << n;
               }
             j0 += w;
             q++;
           }
-          tallies[std::string(p.name) + " bcopy"].cases++;
+          TallyReport::of((std::string(p.name) + "_bcopy").c_str()).exact(p.tier);
         }
   }
 }
@@ -90,8 +92,10 @@ TYPED_TEST(GemmCopies, SharesOfAPanelPackedApartMakeTheSamePanel) {
         pack(by_rows, rest_rows, k, rows, 0, rows * kp);
         pack(by_depth, m, depth, 0, 0, 0);
         pack(by_depth, m, rest_depth, 0, depth, depth * p.mr);
-        ASSERT_EQ(0, std::memcmp(whole.array.data(), by_rows.array.data(), whole.array.size() * sizeof(T))) << p.name;
-        ASSERT_EQ(0, std::memcmp(whole.array.data(), by_depth.array.data(), whole.array.size() * sizeof(T))) << p.name;
+        ASSERT_EQ(0, std::memcmp(whole.array.data(), by_rows.array.data(), whole.array.size() * sizeof(T)))
+            << tier_name(p.tier) << " " << p.name;
+        ASSERT_EQ(0, std::memcmp(whole.array.data(), by_depth.array.data(), whole.array.size() * sizeof(T)))
+            << tier_name(p.tier) << " " << p.name;
       }
       Operand<T> b(op, k, n);
       Panel<T> whole = b_panel(p, n, k), apart = b_panel(p, n, k);
@@ -102,8 +106,9 @@ TYPED_TEST(GemmCopies, SharesOfAPanelPackedApartMakeTheSamePanel) {
       pack(apart, columns, 0);
       pack(apart, rest_columns, columns);
       // An edge does not fill its step, so that the steps between hold what they held: the same NaN in both.
-      ASSERT_EQ(0, std::memcmp(whole.array.data(), apart.array.data(), whole.array.size() * sizeof(T))) << p.name;
-      tallies[std::string(p.name) + " bcopy"].cases++;
+      ASSERT_EQ(0, std::memcmp(whole.array.data(), apart.array.data(), whole.array.size() * sizeof(T)))
+          << tier_name(p.tier) << " " << p.name;
+      TallyReport::of((std::string(p.name) + "_bcopy").c_str()).exact(p.tier);
     }
   }
 }
@@ -119,7 +124,7 @@ TYPED_TEST(GemmCopies, CopiesWriteNothingForNoRowsOrNoColumns) {
       for (const auto &count : counts) {
         p.bcopy[op](&count[0], &count[1], nothing.data(), &ld, nothing.data(), &ldp, &alpha);
         if (p.acopy[0] != nullptr) p.acopy[op](&count[0], &count[1], nothing.data(), &ld, nothing.data(), &ldp, &alpha);
-        tallies[std::string(p.name) + " bcopy"].cases++;
+        TallyReport::of((std::string(p.name) + "_bcopy").c_str()).exact(p.tier);
       }
   }
 }

@@ -37,25 +37,25 @@ const std::vector<Pieces<T>> families;
 
 template <>
 const std::vector<Pieces<float>> families<float> = {
-    {"ssse3 s SSE4.1", tier_ssse3, 8, 4, 4, COPIES_NT(qtb_blas_ssse3_xsgemm_sse41_acopy),
+    {"sgemm_sse41", tier_ssse3, 8, 4, 4, COPIES_NT(qtb_blas_ssse3_xsgemm_sse41_acopy),
      COPIES_NT(qtb_blas_ssse3_xsgemm_sse41_bcopy), none, none, qtb_blas_ssse3_xsgemm_sse41_packed},
 };
 template <>
 const std::vector<Pieces<double>> families<double> = {
-    {"ssse3 d", tier_ssse3, 4, 4, 4, COPIES_NT(qtb_blas_ssse3_xdgemm_acopy), COPIES_NT(qtb_blas_ssse3_xdgemm_bcopy),
+    {"dgemm", tier_ssse3, 4, 4, 4, COPIES_NT(qtb_blas_ssse3_xdgemm_acopy), COPIES_NT(qtb_blas_ssse3_xdgemm_bcopy),
      qtb_blas_ssse3_xdgemm_bpacked, none, none},
-    {"ssse3 d SSE4.1", tier_ssse3, 4, 4, 4, COPIES_NT(qtb_blas_ssse3_xdgemm_sse41_acopy),
+    {"dgemm_sse41", tier_ssse3, 4, 4, 4, COPIES_NT(qtb_blas_ssse3_xdgemm_sse41_acopy),
      COPIES_NT(qtb_blas_ssse3_xdgemm_sse41_bcopy), none, none, qtb_blas_ssse3_xdgemm_sse41_packed},
-    {"sse42 d", tier_sse42, 2, 8, 4, COPIES_NT(qtb_blas_sse42_xdgemm_acopy), COPIES_NT(qtb_blas_sse42_xdgemm_bcopy),
+    {"dgemm", tier_sse42, 2, 8, 4, COPIES_NT(qtb_blas_sse42_xdgemm_acopy), COPIES_NT(qtb_blas_sse42_xdgemm_bcopy),
      qtb_blas_sse42_xdgemm_bpacked, qtb_blas_sse42_xdgemm_apacked, none},
-    {"avx d", tier_avx, 8, 4, 4, COPIES_NT(qtb_blas_avx_xdgemm_acopy), COPIES_NT(qtb_blas_avx_xdgemm_bcopy),
+    {"dgemm", tier_avx, 8, 4, 4, COPIES_NT(qtb_blas_avx_xdgemm_acopy), COPIES_NT(qtb_blas_avx_xdgemm_bcopy),
      qtb_blas_avx_xdgemm_bpacked, none, none},
 };
 template <>
 const std::vector<Pieces<cfloat>> families<cfloat> = {
-    {"def c", tier_def, 4, 4, 4, {}, COPIES_NTC(qtb_blas_def_xcgemm_bcopy), none, none, none},
-    {"sse3 c", tier_sse3, 4, 4, 4, {}, COPIES_NTC(qtb_blas_sse3_xcgemm_bcopy), none, none, none},
-    {"ssse3 c",
+    {"cgemm", tier_def, 4, 4, 4, {}, COPIES_NTC(qtb_blas_def_xcgemm_bcopy), none, none, none},
+    {"cgemm", tier_sse3, 4, 4, 4, {}, COPIES_NTC(qtb_blas_sse3_xcgemm_bcopy), none, none, none},
+    {"cgemm",
      tier_ssse3,
      4,
      2,
@@ -65,10 +65,10 @@ const std::vector<Pieces<cfloat>> families<cfloat> = {
      qtb_blas_ssse3_xcgemm_bpacked,
      none,
      none},
-    {"ssse3 c SSE4.1", tier_ssse3, 4, 2, 4, COPIES_NTC(qtb_blas_ssse3_xcgemm_sse41_acopy),
+    {"cgemm_sse41", tier_ssse3, 4, 2, 4, COPIES_NTC(qtb_blas_ssse3_xcgemm_sse41_acopy),
      COPIES_NTC(qtb_blas_ssse3_xcgemm_sse41_bcopy), qtb_blas_ssse3_xcgemm_sse41, none,
      qtb_blas_ssse3_xcgemm_sse41_packed},
-    {"sse42 c",
+    {"cgemm",
      tier_sse42,
      2,
      4,
@@ -78,13 +78,13 @@ const std::vector<Pieces<cfloat>> families<cfloat> = {
      qtb_blas_sse42_xcgemm_bpacked,
      none,
      none},
-    {"avx c", tier_avx, 2, 4, 4, {}, COPIES_NTC(qtb_blas_avx_xcgemm_bcopy), qtb_blas_avx_xcgemm_bpacked, none, none},
+    {"cgemm", tier_avx, 2, 4, 4, {}, COPIES_NTC(qtb_blas_avx_xcgemm_bcopy), qtb_blas_avx_xcgemm_bpacked, none, none},
 };
 template <>
 const std::vector<Pieces<cdouble>> families<cdouble> = {
-    {"def z", tier_def, 2, 4, 4, {}, COPIES_NTC(qtb_blas_def_xzgemm_bcopy), none, none, none},
-    {"sse3 z", tier_sse3, 2, 4, 4, {}, COPIES_NTC(qtb_blas_sse3_xzgemm_bcopy), none, none, none},
-    {"ssse3 z",
+    {"zgemm", tier_def, 2, 4, 4, {}, COPIES_NTC(qtb_blas_def_xzgemm_bcopy), none, none, none},
+    {"zgemm", tier_sse3, 2, 4, 4, {}, COPIES_NTC(qtb_blas_sse3_xzgemm_bcopy), none, none, none},
+    {"zgemm",
      tier_ssse3,
      2,
      2,
@@ -94,10 +94,10 @@ const std::vector<Pieces<cdouble>> families<cdouble> = {
      qtb_blas_ssse3_xzgemm_bpacked,
      none,
      none},
-    {"ssse3 z SSE4.1", tier_ssse3, 2, 2, 4, COPIES_NTC(qtb_blas_ssse3_xzgemm_sse41_acopy),
+    {"zgemm_sse41", tier_ssse3, 2, 2, 4, COPIES_NTC(qtb_blas_ssse3_xzgemm_sse41_acopy),
      COPIES_NTC(qtb_blas_ssse3_xzgemm_sse41_bcopy), qtb_blas_ssse3_xzgemm_sse41, none,
      qtb_blas_ssse3_xzgemm_sse41_packed},
-    {"sse42 z",
+    {"zgemm",
      tier_sse42,
      1,
      4,
@@ -107,13 +107,13 @@ const std::vector<Pieces<cdouble>> families<cdouble> = {
      qtb_blas_sse42_xzgemm_bpacked,
      none,
      none},
-    {"avx z", tier_avx, 1, 4, 4, {}, COPIES_NTC(qtb_blas_avx_xzgemm_bcopy), qtb_blas_avx_xzgemm_bpacked, none, none},
+    {"zgemm", tier_avx, 1, 4, 4, {}, COPIES_NTC(qtb_blas_avx_xzgemm_bcopy), qtb_blas_avx_xzgemm_bpacked, none, none},
 };
 
-QtbInt round_up(QtbInt v, QtbInt multiple) { return (v + multiple - 1) / multiple * multiple; }
+inline QtbInt round_up(QtbInt v, QtbInt multiple) { return (v + multiple - 1) / multiple * multiple; }
 
 // The widths of the micro-panels of n columns of B.
-std::vector<QtbInt> widths(QtbInt nr, QtbInt n) {
+inline std::vector<QtbInt> widths(QtbInt nr, QtbInt n) {
   std::vector<QtbInt> w(static_cast<std::size_t>(n / nr), nr);
   QtbInt rest = n % nr;
   if (nr == 8 && rest >= 4) {
@@ -125,7 +125,7 @@ std::vector<QtbInt> widths(QtbInt nr, QtbInt n) {
 }
 
 // Elements of a panel whose micro-panels are ldp apart, the last of width w and depth kp.
-std::size_t panel_size(std::size_t micro_panels, QtbInt ldp, QtbInt w, QtbInt kp) {
+inline std::size_t panel_size(std::size_t micro_panels, QtbInt ldp, QtbInt w, QtbInt kp) {
   return micro_panels == 0 ? 0 : (micro_panels - 1) * static_cast<std::size_t>(ldp) + static_cast<std::size_t>(w * kp);
 }
 

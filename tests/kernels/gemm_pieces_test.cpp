@@ -6,7 +6,7 @@ namespace qtb::test {
 namespace {
 
 template <class T>
-class GemmPieces : public testing::Test {
+class GemmPieces : public Seeded {
  protected:
   static int ops() { return is_complex<T> ? 3 : 2; }
 };
@@ -46,19 +46,19 @@ TYPED_TEST(GemmPieces, ProductsFromPanelsPackedOutsideAgreeWithTheOracle) {
                 reset();
                 p.bpacked(ta, tb, &m, &n, &k, &alpha, a0, &lda, b0, &ldb, bp.array.data(), &bp.ldp, &beta,
                           c.array.data(), &ldc);
-                expect_product(std::string(p.name) + " bpacked", k, alpha, a, b, beta, before, c);
+                expect_product(std::string(p.name) + "_bpacked", p.tier, k, alpha, a, b, beta, before, c);
               }
               if (p.apacked != nullptr) {
                 reset();
                 p.apacked(ta, tb, &m, &n, &k, &alpha, a0, &lda, ap.array.data(), &ap.ldp, b0, &ldb, &beta,
                           c.array.data(), &ldc);
-                expect_product(std::string(p.name) + " apacked", k, alpha, a, b, beta, before, c);
+                expect_product(std::string(p.name) + "_apacked", p.tier, k, alpha, a, b, beta, before, c);
               }
               if (p.packed != nullptr) {
                 reset();
                 p.packed(ta, tb, &m, &n, &k, &alpha, a0, &lda, ap.array.data(), &ap.ldp, b0, &ldb, bp.array.data(),
                          &bp.ldp, &beta, c.array.data(), &ldc);
-                expect_product(std::string(p.name) + " packed", k, alpha, a, b, beta, before, c);
+                expect_product(std::string(p.name) + "_packed", p.tier, k, alpha, a, b, beta, before, c);
               }
               if (this->HasFatalFailure()) return;
             }
@@ -94,18 +94,18 @@ template <class T>
 const std::vector<Body<T>> bodies;
 template <>
 const std::vector<Body<float>> bodies<float> = {
-    {"ssse3 sgemm_nobcopy", tier_ssse3, qtb_blas_ssse3_xsgemm_nobcopy},
-    {"sse42 sgemm_nobcopy", tier_sse42, qtb_blas_sse42_xsgemm_nobcopy},
-    {"avx sgemm_nobcopy", tier_avx, qtb_blas_avx_xsgemm_nobcopy},
-    {"ssse3 sgemm_sse41", tier_ssse3, qtb_blas_ssse3_xsgemm_sse41},
+    {"sgemm_nobcopy", tier_ssse3, qtb_blas_ssse3_xsgemm_nobcopy},
+    {"sgemm_nobcopy", tier_sse42, qtb_blas_sse42_xsgemm_nobcopy},
+    {"sgemm_nobcopy", tier_avx, qtb_blas_avx_xsgemm_nobcopy},
+    {"sgemm_sse41", tier_ssse3, qtb_blas_ssse3_xsgemm_sse41},
 };
 template <>
 const std::vector<Body<double>> bodies<double> = {
-    {"ssse3 dgemm_nobcopy", tier_ssse3, qtb_blas_ssse3_xdgemm_nobcopy},
-    {"sse42 dgemm_nobcopy", tier_sse42, qtb_blas_sse42_xdgemm_nobcopy},
-    {"ssse3 dgemm_sse41", tier_ssse3, qtb_blas_ssse3_xdgemm_sse41},
-    {"def dgemm_def_run_a", tier_def, qtb_blas_def_xdgemm_def_run_a},
-    {"def dgemm_def_run_b", tier_def, qtb_blas_def_xdgemm_def_run_b},
+    {"dgemm_nobcopy", tier_ssse3, qtb_blas_ssse3_xdgemm_nobcopy},
+    {"dgemm_nobcopy", tier_sse42, qtb_blas_sse42_xdgemm_nobcopy},
+    {"dgemm_sse41", tier_ssse3, qtb_blas_ssse3_xdgemm_sse41},
+    {"dgemm_def_run_a", tier_def, qtb_blas_def_xdgemm_def_run_a},
+    {"dgemm_def_run_b", tier_def, qtb_blas_def_xdgemm_def_run_b},
 };
 
 TYPED_TEST(GemmPieces, BodiesForSomeSizesComputeTheProduct) {
@@ -126,7 +126,7 @@ TYPED_TEST(GemmPieces, BodiesForSomeSizesComputeTheProduct) {
               if (magnitude(widen(beta)) == 0) c.poison();
               body.gemm(&letters[op_a], &letters[op_b], &m, &n, &k, &alpha, a.stored.array.data(), &a.stored.ld,
                         b.stored.array.data(), &b.stored.ld, &beta, c.array.data(), &c.ld);
-              expect_product(body.name, k, alpha, a, b, beta, before, c);
+              expect_product(body.name, body.tier, k, alpha, a, b, beta, before, c);
               if (this->HasFatalFailure()) return;
             }
   }
@@ -135,18 +135,19 @@ TYPED_TEST(GemmPieces, BodiesForSomeSizesComputeTheProduct) {
 template <class T>
 struct ScaleC {
   using Scale = QTB_FUNCTION_TYPE(scale_c, T);
+  const char *name;
   Scale *tiers[tier_count];
 };
 template <class T>
 const ScaleC<T> scale_c;
 template <>
-const ScaleC<float> scale_c<float> = {QTB_ALL_TIERS(sgemm_scale_c)};
+const ScaleC<float> scale_c<float> = {"sgemm_scale_c", QTB_ALL_TIERS(sgemm_scale_c)};
 template <>
-const ScaleC<double> scale_c<double> = {QTB_ALL_TIERS(dgemm_scale_c)};
+const ScaleC<double> scale_c<double> = {"dgemm_scale_c", QTB_ALL_TIERS(dgemm_scale_c)};
 template <>
-const ScaleC<cfloat> scale_c<cfloat> = {QTB_ALL_TIERS(cgemm_scale_c)};
+const ScaleC<cfloat> scale_c<cfloat> = {"cgemm_scale_c", QTB_ALL_TIERS(cgemm_scale_c)};
 template <>
-const ScaleC<cdouble> scale_c<cdouble> = {QTB_ALL_TIERS(zgemm_scale_c)};
+const ScaleC<cdouble> scale_c<cdouble> = {"zgemm_scale_c", QTB_ALL_TIERS(zgemm_scale_c)};
 
 TYPED_TEST(GemmPieces, ScalingOfCMultipliesAndStoresZerosWithoutReading) {
   using T = TypeParam;
@@ -154,8 +155,6 @@ TYPED_TEST(GemmPieces, ScalingOfCMultipliesAndStoresZerosWithoutReading) {
   const T zero{}, betas[] = {value<T>(0, 0), value<T>(1, 0), value<T>(-0.75, 0.5), value<T>(NAN, 0)};
   for (int tier = 0; tier < tier_count; tier++) {
     if (!processor_runs(tier)) continue;
-    const std::string name = std::string(tier_name(tier)) + (is_complex<T> ? " complex" : " real") + " scale_c " +
-                             std::to_string(sizeof(Real<T>)) + " bytes";
     for (const T beta : betas)
       for (QtbInt m : {-1, 0, 1, 2, 8, 9, 21})
         for (QtbInt n : {-1, 0, 1, 3, 4, 9}) {
@@ -164,7 +163,7 @@ TYPED_TEST(GemmPieces, ScalingOfCMultipliesAndStoresZerosWithoutReading) {
           if (m > 0 && n > 0) c.take(before);
           if (magnitude(widen(beta)) == 0) c.poison();
           scale_c<T>.tiers[tier](&m, &n, &beta, c.array.data(), &c.ld);
-          expect_product(name, none_deep, zero, a, b, beta, before, c);
+          expect_product(scale_c<T>.name, tier, none_deep, zero, a, b, beta, before, c);
           if (this->HasFatalFailure()) return;
         }
   }

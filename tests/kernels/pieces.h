@@ -1,15 +1,15 @@
-// What the tests of pieces share: matrices with trapping ends, the oracle of a product, a tally of what ran.
+// What the tests of pieces share: matrices with trapping ends, the oracle of a product.
 #pragma once
 
 #include <gtest/gtest.h>
 
-#include <cstdio>
-#include <map>
 #include <random>
 #include <string>
 
 #include "tests/support/bounds.h"
 #include "tests/support/guarded.h"
+#include "tests/support/placed.h"
+#include "tests/support/tally.h"
 #include "tests/support/tiers.h"
 
 namespace qtb::test {
@@ -71,37 +71,25 @@ struct Operand {
   T *block(QtbInt i, QtbInt j) { return op == 0 ? stored.at(i, j) : stored.at(j, i); }
 };
 
-QuadComplex times(QuadComplex a, QuadComplex b) { return {a.re * b.re - a.im * b.im, a.re * b.im + a.im * b.re}; }
-QuadComplex plus(QuadComplex a, QuadComplex b) { return {a.re + b.re, a.im + b.im}; }
-
-template <class T>
-bool same_bits(T a, T b) {
-  return std::memcmp(&a, &b, sizeof(T)) == 0;
+inline QuadComplex times(QuadComplex a, QuadComplex b) {
+  return {a.re * b.re - a.im * b.im, a.re * b.im + a.im * b.re};
 }
+inline QuadComplex plus(QuadComplex a, QuadComplex b) { return {a.re + b.re, a.im + b.im}; }
 
-// What ran, by family of pieces.
-struct Tally {
-  long cases = 0;
-  double worst = 0;  // error / bound
+// Every test draws the same data, whatever ran before it.
+class Seeded : public testing::Test {
+ protected:
+  void SetUp() override { generator.seed(20); }
 };
-std::map<std::string, Tally> tallies;
-
-struct PrintTallies : testing::Environment {
-  void TearDown() override {
-    for (const auto &[name, tally] : tallies)
-      std::printf("%-40s %6ld cases, worst error/bound %.3f\n", name.c_str(), tally.cases, tally.worst);
-  }
-};
-const testing::Environment *const print_tallies = testing::AddGlobalTestEnvironment(new PrintTallies);
 
 // C against alpha*op(A)*op(B) + beta*before in higher precision, and its spare rows bit by bit.
 template <class T>
-void expect_product(const std::string &what, QtbInt k, T alpha, Operand<T> &a, Operand<T> &b, T beta, Stored<T> &before,
-                    Stored<T> &after) {
+void expect_product(const std::string &what, int tier, QtbInt k, T alpha, Operand<T> &a, Operand<T> &b, T beta,
+                    Stored<T> &before, Stored<T> &after) {
   const double c = static_cast<double>(is_complex<T> ? 2 * k + 4 : k + 3);
   const Quad scale = magnitude(widen(alpha));
   const bool reads_c = magnitude(widen(beta)) != 0;
-  Tally &tally = tallies[what];
+  double worst = 0;
   for (QtbInt j = 0; j < after.cols; j++) {
     for (QtbInt i = 0; i < after.rows; i++) {
       QuadComplex sum;
@@ -119,15 +107,16 @@ void expect_product(const std::string &what, QtbInt k, T alpha, Operand<T> &a, O
         gauge += magnitude(widen(beta)) * magnitude(old);
       }
       const double ratio = error_ratio(*after.at(i, j), want, gauge, c, static_cast<double>(scale));
-      tally.worst = std::fmax(tally.worst, ratio);
-      ASSERT_LE(ratio, 1) << what << " C(" << i << ", " << j << ") of " << after.rows << " x " << after.cols << " x "
-                          << k;
+      worst = std::fmax(worst, ratio);
+      ASSERT_LE(ratio, 1) << tier_name(tier) << " " << what << " C(" << i << ", " << j << ") of " << after.rows << " x "
+                          << after.cols << " x " << k;
     }
     if (after.rows > 0 && j + 1 < after.cols) {
-      ASSERT_TRUE(same_bits(*after.at(after.rows, j), *before.at(after.rows, j))) << what << " wrote a spare row";
+      ASSERT_TRUE(same_bits(*after.at(after.rows, j), *before.at(after.rows, j)))
+          << tier_name(tier) << " " << what << " wrote a spare row";
     }
   }
-  tally.cases++;
+  TallyReport::of(what.c_str()).within(tier, worst);
 }
 
 }  // namespace

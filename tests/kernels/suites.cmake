@@ -6,7 +6,7 @@ qtb_add_test(vector_sweep_test SOURCES kernels/vector_sweep_test.cpp LIBRARIES q
 qtb_add_test(gemm_blocks_test SOURCES kernels/gemm_blocks_test.cpp LIBRARIES qtb_static)
 qtb_add_test(gemm_copy_test SOURCES kernels/gemm_copy_test.cpp LIBRARIES qtb_static)
 qtb_add_test(gemm_pieces_test SOURCES kernels/gemm_pieces_test.cpp LIBRARIES qtb_static)
-qtb_add_test(triangle_pieces_test SOURCES kernels/triangle_pieces_test.cpp LIBRARIES qtb_static)
+qtb_add_test(triangle_pieces_test SOURCES kernels/triangle_pieces_test.cpp LIBRARIES qtb_static SHARDS 2)
 # Every tier's kernels, called directly.
 # level1
 qtb_add_test(norms_test SOURCES kernels/norms_test.cpp LIBRARIES qtb_static)

@@ -16,18 +16,19 @@ constexpr int block_tiers[] = {tier_ssse3, tier_sse42, tier_avx};
 template <class T>
 struct Procedures {
   using TrmvBlock = QTB_FUNCTION_TYPE(trmv_block, T);
+  const char *name;
   TrmvBlock *trmv_block[3];
 };
 template <class T>
 constexpr Procedures<T> procedures;
 template <>
-constexpr Procedures<float> procedures<float> = {QTB_BLOCK_TIERS(strmv_block)};
+constexpr Procedures<float> procedures<float> = {"strmv_block", QTB_BLOCK_TIERS(strmv_block)};
 template <>
-constexpr Procedures<double> procedures<double> = {QTB_BLOCK_TIERS(dtrmv_block)};
+constexpr Procedures<double> procedures<double> = {"dtrmv_block", QTB_BLOCK_TIERS(dtrmv_block)};
 template <>
-constexpr Procedures<cfloat> procedures<cfloat> = {QTB_BLOCK_TIERS(ctrmv_block)};
+constexpr Procedures<cfloat> procedures<cfloat> = {"ctrmv_block", QTB_BLOCK_TIERS(ctrmv_block)};
 template <>
-constexpr Procedures<cdouble> procedures<cdouble> = {QTB_BLOCK_TIERS(ztrmv_block)};
+constexpr Procedures<cdouble> procedures<cdouble> = {"ztrmv_block", QTB_BLOCK_TIERS(ztrmv_block)};
 
 bool is_stored(bool upper, QtbInt i, QtbInt j) { return upper ? i <= j : i >= j; }
 
@@ -63,13 +64,7 @@ std::vector<std::vector<QtbInt>> cuts(QtbInt n) {
 }
 
 template <class T>
-class TrianglePieces : public testing::Test {
- protected:
-  static std::string name(int tier, const char *routine) {
-    return std::string(tier_name(tier)) + " " + (is_complex<T> ? "complex " : "real ") +
-           std::to_string(8 * sizeof(Real<T>)) + " bits " + routine;
-  }
-};
+class TrianglePieces : public Seeded {};
 using Types = testing::Types<float, double, cfloat, cdouble>;
 TYPED_TEST_SUITE(TrianglePieces, Types);
 
@@ -77,7 +72,7 @@ TYPED_TEST(TrianglePieces, OfATriangularProductTakeWhatLiesOutsideFromTheCopy) {
   using T = TypeParam;
   for (int which = 0; which < 3; which++) {
     if (!processor_runs(block_tiers[which])) continue;
-    Tally &tally = tallies[this->name(block_tiers[which], "trmv_block")];
+    Tally &tally = TallyReport::of(procedures<T>.name);
     for (const char *uplo : {"U", "l"})
       for (const char *trans : {"n", "T", "C"})
         for (const char *diag : {"N", "u"})
@@ -104,6 +99,7 @@ TYPED_TEST(TrianglePieces, OfATriangularProductTakeWhatLiesOutsideFromTheCopy) {
                   s += w;
                 }
                 const double c = static_cast<double>(is_complex<T> ? 2 * n + 4 : n + 2);
+                double worst = 0;
                 for (QtbInt i = 0; i < n; i++) {
                   QuadComplex want;
                   Quad gauge = 0;
@@ -117,10 +113,10 @@ TYPED_TEST(TrianglePieces, OfATriangularProductTakeWhatLiesOutsideFromTheCopy) {
                     gauge += magnitude(t) * magnitude(old);
                   }
                   const double ratio = error_ratio(*x.at(i), want, gauge, c);
-                  tally.worst = std::fmax(tally.worst, ratio);
+                  worst = std::fmax(worst, ratio);
                   ASSERT_LE(ratio, 1) << uplo << trans << diag << " n " << n << " incx " << incx << " element " << i;
                 }
-                tally.cases++;
+                tally.within(block_tiers[which], worst);
               }
   }
 }
@@ -134,22 +130,25 @@ template <class T>
 struct Updates {
   using SyrBlock = QTB_FUNCTION_TYPE(syr_block, T);
   using Syr2Block = QTB_FUNCTION_TYPE(syr2_block, T);
+  const char *syr_name, *syr2_name;
   SyrBlock *syr_block[3];
   Syr2Block *syr2_block[3];
 };
 template <class T>
 constexpr Updates<T> updates;
 template <>
-constexpr Updates<float> updates<float> = {QTB_BLOCK_TIERS(ssyr_block), QTB_BLOCK_TIERS(ssyr2_block)};
+constexpr Updates<float> updates<float> = {"ssyr_block", "ssyr2_block", QTB_BLOCK_TIERS(ssyr_block),
+                                           QTB_BLOCK_TIERS(ssyr2_block)};
 template <>
-constexpr Updates<double> updates<double> = {QTB_BLOCK_TIERS(dsyr_block), QTB_BLOCK_TIERS(dsyr2_block)};
+constexpr Updates<double> updates<double> = {"dsyr_block", "dsyr2_block", QTB_BLOCK_TIERS(dsyr_block),
+                                             QTB_BLOCK_TIERS(dsyr2_block)};
 
 TYPED_TEST(RealTrianglePieces, OfARankUpdateMakeTheWholeUpdate) {
   using T = TypeParam;
   for (int which = 0; which < 3; which++) {
     if (!processor_runs(block_tiers[which])) continue;
     for (const bool two : {false, true}) {
-      Tally &tally = tallies[this->name(block_tiers[which], two ? "syr2_block" : "syr_block")];
+      Tally &tally = TallyReport::of(two ? updates<T>.syr2_name : updates<T>.syr_name);
       for (const char *uplo : {"U", "u", "L", "l"})
         for (QtbInt n : {1, 4, 9, 41, 90})
           for (QtbInt incx : {1, -1, 3})
@@ -161,6 +160,7 @@ TYPED_TEST(RealTrianglePieces, OfARankUpdateMakeTheWholeUpdate) {
                   a.take(before);
                   Spread<T> x(n, incx), y(n, incy);
                   if (n > 2) *x.at(2) = *y.at(2) = *x.at(0) = 0;
+                  double worst = 0;
                   QtbInt s = 0;
                   for (const QtbInt w : cut) {
                     const QtbInt other = upper ? s : n - s - w, start = upper ? 0 : s, length = w + other;
@@ -184,10 +184,10 @@ TYPED_TEST(RealTrianglePieces, OfARankUpdateMakeTheWholeUpdate) {
                       const Quad added = two ? magnitude(xi * yj) + magnitude(yi * xj) : magnitude(sum);
                       const double ratio = error_ratio(*a.at(i, j), Quad(alpha) * sum + old,
                                                        magnitude(Quad(alpha)) * added + magnitude(old), two ? 5 : 3);
-                      tally.worst = std::fmax(tally.worst, ratio);
+                      worst = std::fmax(worst, ratio);
                       ASSERT_LE(ratio, 1) << uplo << " n " << n << " element (" << i << ", " << j << ")";
                     }
-                  tally.cases++;
+                  tally.within(block_tiers[which], worst);
                 }
     }
   }
@@ -200,7 +200,7 @@ void expect_rank_k(const char *routine, int tier,
                                 const QtbInt *, const S *, T *, const QtbInt *),
                    bool hermitian, std::initializer_list<QtbInt> orders) {
   if (!processor_runs(tier)) return;
-  Tally &tally = tallies[std::string(tier_name(tier)) + " " + routine];
+  Tally &tally = TallyReport::of(routine);
   const S scalars[][2] = {{value<S>(1, 0), value<S>(1, 0)},       {value<S>(0, 0), value<S>(1, 0)},
                           {value<S>(0, 0), value<S>(0, 0)},       {value<S>(0, 0), value<S>(0.5, -0.25)},
                           {value<S>(-0.75, 0.5), value<S>(0, 0)}, {value<S>(-0.75, 0.5), value<S>(0.5, 0.25)}};
@@ -224,6 +224,7 @@ void expect_rank_k(const char *routine, int tier,
               for (QtbInt j = 0; j < n; j++)
                 for (QtbInt i = 0; i < n; i++) *c.at(i, j) = value<T>(NAN, NAN);
             body(uplo, trans, &n, &k, &alpha, a.array.data(), &a.ld, &beta, c.array.data(), &c.ld);
+            double worst = 0;
             const double bound = static_cast<double>(is_complex<T> ? 2 * k + 4 : k + 3);
             for (QtbInt j = 0; j < n; j++)
               for (QtbInt i = 0; i < n; i++) {
@@ -251,7 +252,7 @@ void expect_rank_k(const char *routine, int tier,
                   gauge += magnitude(wide_beta) * magnitude(old);
                 }
                 const double ratio = error_ratio(*c.at(i, j), want, gauge, bound);
-                tally.worst = std::fmax(tally.worst, ratio);
+                worst = std::fmax(worst, ratio);
                 ASSERT_LE(ratio, 1) << routine << " " << uplo << *trans << " n " << n << " k " << k << " element (" << i
                                     << ", " << j << ")";
                 if constexpr (is_complex<T>)
@@ -259,11 +260,13 @@ void expect_rank_k(const char *routine, int tier,
                     ASSERT_EQ(c.at(i, j)->im, 0) << routine << " diagonal";
                   }
               }
-            tally.cases++;
+            tally.within(tier, worst);
           }
 }
 
-TEST(RankKBodies, UpdateTheirTriangleAlone) {
+class RankKBodies : public Seeded {};
+
+TEST_F(RankKBodies, UpdateTheirTriangleAlone) {
   const std::initializer_list<QtbInt> orders = {0, 1, 3, 4, 5, 12, 19, 73};
 #define QTB_EXPECT_BODIES(tier)                                                                             \
   expect_rank_k<float, float>("ssyrk_body", tier_##tier, qtb_blas_##tier##_xssyrk_body, false, orders);     \

@@ -21,11 +21,11 @@ enum class Family { base, sse41, def_a, def_b };
 
 // How kb follows from k, with the length of the one value that a rule has.
 enum class Depth {
-  halved,       // 256; up to k = 511 in two equal parts, below 256 all of it but at least 128
-  stepped,      // 256; up to k = 1024 128, below 256 all of it but at least 128
-  dividing,     // the value or else 128 where it divides k; otherwise the value, or two equal parts below twice of it
-  halved_down,  // the value; up to twice of it in two parts that are a multiple of 4
-  whole,        // all of k below the value but at least 128, otherwise the value
+  halved,       // the value; two equal parts below twice of it; all of k below it, but at least 128
+  stepped,      // the value; half of it up to four times the value; all of k below it, but at least 128
+  dividing,     // the value or else 128 where it divides k; otherwise the value, two equal parts below twice of it
+  halved_down,  // the value; up to twice of it two parts, rounded down to a multiple of 4
+  whole,        // the value; all of k below it, but at least 128
   fixed         // the value, the remainder of k first
 };
 struct DepthRule {
@@ -138,12 +138,9 @@ constexpr QtbInt block_depth(DepthRule kb, QtbInt k) {
       if (k % kb.value == 0) return kb.value;
       if (k % least == 0) return least;
       return k > kb.value && k < 2 * kb.value ? round_up((k + 1) / 2, 2) : kb.value;
-    case Depth::halved_down:
-      return k > kb.value && k <= 2 * kb.value ? larger(round_down(k / 2, 4), 4) : kb.value;
-    case Depth::whole:
-      return k < kb.value ? larger(least, round_up(k, 4)) : kb.value;
-    case Depth::fixed:
-      return kb.value;
+    case Depth::halved_down: return k > kb.value && k <= 2 * kb.value ? larger(round_down(k / 2, 4), 4) : kb.value;
+    case Depth::whole: return k < kb.value ? larger(least, round_up(k, 4)) : kb.value;
+    case Depth::fixed: return kb.value;
   }
   __builtin_unreachable();
 }
@@ -167,21 +164,15 @@ inline QtbInt block_rows(const GemmRules &rules, QtbInt m, QtbInt n, QtbInt k, Q
   const QtbInt value = rules.mb.value, reduced = rules.mb.reduced_or_step, step = rules.mb.reduced_or_step;
   const QtbInt twice = 2 * rules.kb.value;
   switch (rules.mb.rule) {
-    case Rows::fixed:
-      return value;
-    case Rows::small_l2:
-      return level_is_small(caches, 2, small_l2_bytes) ? reduced : value;
-    case Rows::small_l3:
-      return level_is_small(caches, 3, small_l3_bytes) ? reduced : value;
+    case Rows::fixed: return value;
+    case Rows::small_l2: return level_is_small(caches, 2, small_l2_bytes) ? reduced : value;
+    case Rows::small_l3: return level_is_small(caches, 3, small_l3_bytes) ? reduced : value;
     case Rows::area_of_k:
       return smaller(larger(m, rules.mr),
                      round_down(value / smaller(kb, larger(round_up(k, rules.ku), rules.ku)), step));
-    case Rows::area_of_kb:
-      return smaller(larger(m, rules.mr), round_down(value / kb, step));
-    case Rows::capped:
-      return smaller(round_up(m, step), value);
-    case Rows::flat:
-      return is_flat(m, n, k, twice) ? flat_rows(smaller(k, kb)) : value;
+    case Rows::area_of_kb: return smaller(larger(m, rules.mr), round_down(value / kb, step));
+    case Rows::capped: return smaller(round_up(m, step), value);
+    case Rows::flat: return is_flat(m, n, k, twice) ? flat_rows(smaller(k, kb)) : value;
     case Rows::flat_or_huge:
       if (is_flat(m, n, k, twice)) return flat_rows(smaller(k, kb));
       return is_huge(m, n, k) ? reduced : value;
