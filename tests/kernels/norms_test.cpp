@@ -39,13 +39,6 @@ Real<T> call(Norm<T> routine, const std::type_identity_t<T> (&x)[count], QtbInt 
 
 // ---- data ----
 
-RandomBits bits(1);
-
-template <class T>
-std::vector<T> random_vector(QtbInt n, int least, int most) {
-  return qtb::test::random_vector<T>(bits, n, least, most);
-}
-
 std::vector<QtbInt> lengths(QtbInt dense_up_to) {
   std::vector<QtbInt> n;
   for (QtbInt i = 0; i <= dense_up_to; ++i) n.push_back(i);
@@ -102,13 +95,14 @@ void sweep(const Routine<T> &routine, const std::vector<T> &values, QtbInt longe
 
 template <class T>
 void sweep_all(const Routine<T> &routine, const std::vector<std::pair<int, int>> &exponents) {
+  RandomBits bits(1);
   const QtbInt dense = 300, sparse = 40;
-  sweep(routine, random_vector<T>(dense, -8, 8), dense, 1);
-  for (const auto &[least, most] : exponents) sweep(routine, random_vector<T>(sparse, least, most), sparse, 4);
+  sweep(routine, random_vector<T>(bits, dense, -8, 8), dense, 1);
+  for (const auto &[least, most] : exponents) sweep(routine, random_vector<T>(bits, sparse, least, most), sparse, 4);
   // Some thousands: one length each, all offsets.
   Arena arena(arena_bytes);
   for (const QtbInt n : {1000, 2047, 5003}) {
-    const std::vector<T> values = random_vector<T>(n, -8, 8);
+    const std::vector<T> values = random_vector<T>(bits, n, -8, 8);
     RunningSums sums;
     for (const T v : values) sums.add(v);
     const Bounded want = routine.oracle(sums, n);
@@ -161,8 +155,10 @@ TEST(dzasum, is_within_its_bound_at_every_place) {
 // ---- dot products in double ----
 
 TEST(dsdot, and_sdsdot_are_within_their_bounds_at_every_place) {
+  RandomBits bits(2);
   const QtbInt longest = 70;
-  const std::vector<float> vx = random_vector<float>(longest, -12, 12), vy = random_vector<float>(longest, -12, 12);
+  const std::vector<float> vx = random_vector<float>(bits, longest, -12, 12),
+                           vy = random_vector<float>(bits, longest, -12, 12);
   const float sb = -1.0F / 3;
   Arena arena_x(arena_bytes), arena_y(arena_bytes);
   for (const QtbInt incx : {1, -1, 2, -2, 3, -3, 0})
@@ -322,12 +318,13 @@ TEST(norms_and_sums, take_element_0_n_times_at_increment_0) {
 }
 
 TEST(norms_and_sums, do_not_write_their_vector) {
+  RandomBits bits(3);
   Arena arena(4096);
   in_every_tier([&](int tier) {
     for_each_routine(tier, [&](auto routine) {
       using T = decltype(argument_of(routine));
       arena.writable();
-      const std::vector<T> values = random_vector<T>(50, -4, 4);
+      const std::vector<T> values = random_vector<T>(bits, 50, -4, 4);
       Placed<T> x(arena, values, 50, 1, Flush::back, 0);
       arena.read_only();
       EXPECT_GT(call<T>(routine, 50, x.data(), 1), 0);
@@ -346,11 +343,12 @@ TEST(norms, of_whole_numbers_with_a_whole_norm_are_exact) {
 }
 
 TEST(norms, are_the_same_in_every_tier_bit_for_bit) {
+  RandomBits bits(4);
   for (const QtbInt n : {2, 31, 100, 301}) {
-    const auto s = random_vector<float>(n, -20, 20);
-    const auto d = random_vector<double>(n, -20, 20);
-    const auto c = random_vector<cfloat>(n, -20, 20);
-    const auto z = random_vector<cdouble>(n, -20, 20);
+    const auto s = random_vector<float>(bits, n, -20, 20);
+    const auto d = random_vector<double>(bits, n, -20, 20);
+    const auto c = random_vector<cfloat>(bits, n, -20, 20);
+    const auto z = random_vector<cdouble>(bits, n, -20, 20);
     in_every_tier([&](int tier) {
       EXPECT_EQ(call(snrm2[tier], n, s.data(), 1), call(snrm2[tier_def], n, s.data(), 1));
       EXPECT_EQ(call(dnrm2[tier], n, d.data(), 1), call(dnrm2[tier_def], n, d.data(), 1));
@@ -422,9 +420,10 @@ TEST(sums, of_whole_numbers_are_exact) {
 }
 
 TEST(complex_sums, at_increment_1_are_the_sums_of_their_parts) {
+  RandomBits bits(5);
   for (const QtbInt n : {1, 7, 50, 301}) {
-    const auto c = random_vector<cfloat>(n, -9, 9);
-    const auto z = random_vector<cdouble>(n, -9, 9);
+    const auto c = random_vector<cfloat>(bits, n, -9, 9);
+    const auto z = random_vector<cdouble>(bits, n, -9, 9);
     in_every_tier([&](int tier) {
       EXPECT_EQ(call(dzasum[tier], n, z.data(), 1), call(dasum[tier], 2 * n, &z[0].re, 1)) << tier_name(tier);
       EXPECT_EQ(call(scasum[tier], n, c.data(), 1), call(sasum[tier], 2 * n, &c[0].re, 1)) << tier_name(tier);
@@ -448,10 +447,11 @@ T sum_in_stated_order(const std::vector<T> &x, int tier) {
 }
 
 TEST(real_sums, add_in_the_order_of_four_accumulators) {
+  RandomBits bits(6);
   Arena arena(4096);
   for (int trial = 0; trial < 20; ++trial) {
-    const auto s = random_vector<float>(192, -9, 9);
-    const auto d = random_vector<double>(192, -9, 9);
+    const auto s = random_vector<float>(bits, 192, -9, 9);
+    const auto d = random_vector<double>(bits, 192, -9, 9);
     in_every_tier([&](int tier) {
       Placed<float> x(arena, s, 192, 1, Flush::front, 0);
       EXPECT_EQ(call(sasum[tier], 192, x.data(), 1), sum_in_stated_order(s, tier)) << tier_name(tier);
