@@ -93,7 +93,7 @@ void *platform_open_catalog(const char *path) {
 
 bool platform_catalog_message(void *catalog, std::int32_t number, char *buffer, std::size_t size) {
   const char absent[] = "";
-  const char *text = number < 1 ? absent : catgets(catalog, NL_SETD, number, absent);
+  const char *text = catgets(catalog, NL_SETD, number, absent);
   const std::size_t length = std::strlen(text);
   if (text == absent || length >= size) return false;
   std::memcpy(buffer, text, length + 1);

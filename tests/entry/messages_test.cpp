@@ -165,6 +165,8 @@ TEST(Messages, a_text_too_long_to_print_keeps_the_built_in_one) {
   const std::string conversions = "%d %s";
   EXPECT_EQ(message_6_with(conversions + std::string(1000, 'x')), builtin_6);
   EXPECT_EQ(message_6_with(conversions + std::string(100000, 'x')), builtin_6);
+  fake_messages.texts[10] = std::string(514, 'x');
+  EXPECT_EQ(capture_child([] { qtb_serv_print(1, 10, 0); }).output, "\n");
 }
 
 // The limit counts a text's length less 1, against 512.

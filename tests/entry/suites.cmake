@@ -11,5 +11,6 @@ qtb_add_test(xerbla_test SOURCES entry/xerbla_test.cpp platform/fake_messages.cp
 foreach(name catalog_text xerbla)
   qtb_add_test(${name}_corpus_test SOURCES fuzz/replay_test.cpp fuzz/${name}_fuzz.cpp platform/fake_messages.cpp
     LIBRARIES qtb_static)
-  target_compile_definitions(${name}_corpus_test PRIVATE QTB_TEST_CORPUS="${PROJECT_SOURCE_DIR}/tests/fuzz/corpus/${name}")
+  target_compile_definitions(${name}_corpus_test PRIVATE
+    QTB_TEST_CORPUS="${PROJECT_SOURCE_DIR}/tests/fuzz/corpus/${name}")
 endforeach()

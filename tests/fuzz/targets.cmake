@@ -27,5 +27,5 @@ function(qtb_add_fuzz name)
 endfunction()
 
 qtb_add_fuzz(catalog_text SOURCES fuzz/catalog_text_fuzz.cpp platform/fake_messages.cpp LIBRARIES qtb_static)
-qtb_add_fuzz(xerbla SOURCES fuzz/xerbla_fuzz.cpp platform/fake_messages.cpp LIBRARIES qtb_static)
 qtb_add_fuzz(environment SOURCES fuzz/environment_fuzz.cpp LIBRARIES qtb_static qtb_platform_fake)
+qtb_add_fuzz(xerbla SOURCES fuzz/xerbla_fuzz.cpp platform/fake_messages.cpp LIBRARIES qtb_static)

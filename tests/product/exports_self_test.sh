@@ -38,7 +38,7 @@ sed 's/DAXPY/DAXPYX/' "$folder/clean.c" > "$folder/missing.c"
 expect missing "not exported: DAXPY" "$name"
 
 { cat "$folder/clean.c" && echo 'int qtb_serv_cell;'; } > "$folder/more.c"
-expect more "exported beside the list: qtb_serv_cell" "$name"
+expect more "not in the list: qtb_serv_cell" "$name"
 
 sed 's/void DGEMM(void) __attribute__((alias("dgemm")))/int other; void DGEMM(void) { other = 1; }/
      s/int other;/static int other;/' "$folder/clean.c" > "$folder/two.c"

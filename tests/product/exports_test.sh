@@ -22,7 +22,7 @@ printf '%s\n' "$lower" "$upper" QTBGetVersionString | LC_ALL=C sort > "$folder/e
 "${NM:-nm}" -D --defined-only "$library" > "$folder/symbols"
 awk '{ print $3 }' "$folder/symbols" | LC_ALL=C sort > "$folder/exported"
 for name in $(LC_ALL=C comm -23 "$folder/expected" "$folder/exported"); do finding "not exported: $name"; done
-for name in $(LC_ALL=C comm -13 "$folder/expected" "$folder/exported"); do finding "exported beside the list: $name"; done
+for name in $(LC_ALL=C comm -13 "$folder/expected" "$folder/exported"); do finding "not in the list: $name"; done
 
 two_addresses=$(awk '
   { address[$3] = $1 }

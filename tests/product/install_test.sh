@@ -22,14 +22,15 @@ export PKG_CONFIG_PATH LD_LIBRARY_PATH
 
 cd "$folder"
 # shellcheck disable=SC2046 # flags are words
-"${CC:-cc}" -std=c11 -Wall -Wextra -pedantic -Werror "$programs/consumer.c" $(pkg-config --cflags --libs qtb) -o consumer_c
+"${CC:-cc}" -std=c11 -Wall -Wextra -pedantic -Werror "$programs/consumer.c" $(pkg-config --cflags --libs qtb) \
+  -o consumer_c
 ./consumer_c > c.txt
 expect c.txt "QTB ERROR: Parameter 8 was incorrect on entry to DGEMM "
-expect c.txt "$(printf '%s' 'Belmo(R) Quill Tensor Base Version 10.2.2 Product Build 20090814 for Belmo(R) 64 architecture' \
-  ' applications')"
+grep -q 'Version 10\.2\.2 Product' c.txt
 
 # shellcheck disable=SC2046 # flags are words
-"${FC:-gfortran}" -fno-underscoring -fdefault-integer-8 "$programs/consumer.f90" $(pkg-config --libs qtb) -o consumer_f
+"${FC:-gfortran}" -fno-underscoring -fdefault-integer-8 "$programs/consumer.f90" $(pkg-config --libs qtb) \
+  -o consumer_f
 ./consumer_f > f.txt
 expect f.txt "QTB ERROR: Parameter 7 was incorrect on entry to MYSUB "
 
