@@ -371,7 +371,6 @@ TEST_F(Level1Drivers, NothingIsDoneForLengthsBelowOne) {
       for (const QtbInt inc : {1, -2}) {
         Operands<T> o({0, inc, inc});
         o.call.n = n;
-        o.call.x = o.call.y = nullptr;
         r.driver(4, o.call);
         if (r.is_dot()) {
           EXPECT_TRUE(same_bits(o.call.result, T{})) << r.name;
