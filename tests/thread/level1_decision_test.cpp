@@ -170,13 +170,11 @@ Outcome transcription(const Rules &rules, QtbInt n, QtbInt incx, QtbInt incy, co
   switch (answers.tier) {
     case tier_def:
     case tier_sse3:
-    case tier_avx:
-      return serial();
+    case tier_avx: return serial();
     case tier_ssse3:
       if (below(rules.min_n_ssse3)) return serial();
       break;
-    default:
-      break;
+    default: break;
   }
   if (incx * incy == 0) return serial();
   ask(ask_threads);

@@ -10,7 +10,6 @@
 
 #include <atomic>
 #include <cstdlib>
-#include <functional>
 #include <map>
 #include <string>
 #include <vector>
@@ -110,7 +109,10 @@ int ddot_team(QtbInt n) {
 class Level1Library : public testing::Test {
  protected:
   static constexpr unsigned seconds_per_process = 60;
-  void SetUp() override { testing::GTEST_FLAG(death_test_style) = "threadsafe"; }
+  void SetUp() override {
+    testing::GTEST_FLAG(death_test_style) = "threadsafe";
+    if (!processor_runs(tier_sse42)) GTEST_SKIP() << "the tiers with a parallel path need SSE4.2";
+  }
 };
 
 Machine machine(const char *tier, const char *threads, const char *dynamic = nullptr, int cores = 8) {

@@ -148,7 +148,7 @@ TYPED_TEST(Level1Sum, EqualsTheModelForEveryTeamAndAddress) {
   std::mt19937_64 random(1);
   alignas(16) unsigned char store[210 * sizeof(T)];
   long cases = 0;
-  for (const std::size_t offset : {0, 4, 8, 12, 1, 2, 6, 15})
+  for (const std::size_t offset : {0U, 4U, 8U, 12U, 1U, 2U, 6U, 15U})
     for (int team = 2; team <= 200; ++team)
       for (int repeat = 0; repeat < 5; ++repeat, ++cases) {
         T *const partial = reinterpret_cast<T *>(store + offset);

@@ -70,14 +70,14 @@ inline QtbInt level1_threads_sse42(const Level1Limits &limits, QtbInt n, QtbInt 
 
 inline QtbInt level1_threads_small_cache(const Level1Limits &limits, QtbInt n, QtbInt threads) {
   if (n < limits.wide_n && threads > 4) return 4;
-  if (n >= limits.wide_n && n < limits.cap16_n && threads > 16) return 16;
+  if (n < limits.cap16_n && threads > 16) return 16;
   if (n < limits.two_n && threads == 2) return level1_serial;
   return threads;
 }
 
 inline QtbInt level1_threads_large_cache(const Level1Limits &limits, QtbInt n, QtbInt threads) {
   if (n < limits.low_n && threads > 2) return 2;
-  if (n >= limits.low_n && n < limits.mid_n && threads > 4) return 4;
+  if (n < limits.mid_n && threads > 4) return 4;
   return threads;
 }
 
