@@ -9,3 +9,9 @@ if(NOT QTB_INSTRUMENT)
 endif()
 qtb_add_script_test(repository_test COMMAND product/repository_test.sh ${PROJECT_SOURCE_DIR})
 qtb_add_script_test(repository_self_test COMMAND product/repository_self_test.sh)
+
+# The exported routines of the shared library, each suite once per tier.
+qtb_add_test(surface_level1_test TIERS SOURCES product/surface_level1_test.cpp LIBRARIES qtb)
+qtb_add_test(surface_level2_test TIERS SOURCES product/surface_level2_test.cpp LIBRARIES qtb)
+qtb_add_test(surface_level3_test TIERS SOURCES product/surface_level3_test.cpp LIBRARIES qtb)
+qtb_add_test(second_oracle_test SOURCES product/second_oracle_test.cpp)
