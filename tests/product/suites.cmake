@@ -16,3 +16,9 @@ qtb_add_test(interface_test SOURCES product/interface_test.cpp LIBRARIES qtb)
 qtb_add_script_test(repository_test COMMAND product/repository_test.sh ${PROJECT_SOURCE_DIR})
 qtb_add_script_test(repository_self_test COMMAND product/repository_self_test.sh)
 qtb_add_script_test(packages_test COMMAND product/packages_test.sh ${PROJECT_SOURCE_DIR}/tools/packages.sh)
+
+# The exported routines of the shared library, each suite once per tier.
+qtb_add_test(surface_level1_test TIERS SOURCES product/surface_level1_test.cpp LIBRARIES qtb)
+qtb_add_test(surface_level2_test TIERS SOURCES product/surface_level2_test.cpp LIBRARIES qtb)
+qtb_add_test(surface_level3_test TIERS SOURCES product/surface_level3_test.cpp LIBRARIES qtb)
+qtb_add_test(second_oracle_test SOURCES product/second_oracle_test.cpp)

@@ -62,7 +62,8 @@ struct Layout {
         return i + j * (2 * rows - j - 1) / 2;
       case Form::strided:
         return step >= 0 ? i * step : (i - (rows - 1)) * step;
-      case Form::indexed: return index[i] - 1;
+      case Form::indexed:
+        return index[i] - 1;
     }
     return 0;
   }

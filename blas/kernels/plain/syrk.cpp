@@ -13,6 +13,8 @@ void rank_k_update(Part part, bool hermitian, bool transposed, QtbInt n, QtbInt 
                    S beta, T *c, QtbInt ldc) {
   const bool nothing_to_add = is_zero(alpha) || k <= 0;
   if (n <= 0 || (nothing_to_add && is_one(beta))) return;
+  // The imaginary parts that stand on the diagonal are not of the matrix, and the scaling would compute with them.
+  if (hermitian) clear_imaginary_diagonal(n, c, ldc);
   scale_part(part, n, n, beta, c, ldc);
   if (!nothing_to_add) {
     const Matrix<T> plain{a, lda, Op::none}, turned{a, lda, hermitian ? Op::conjugate : Op::transpose};
