@@ -195,6 +195,12 @@ TEST(dsdot, adds_even_and_odd_pairs_in_two_chains_and_the_odd_last_pair_to_their
   });
 }
 
+TEST(sdsdot, starts_the_chain_of_even_pairs_with_sb) {
+  const float sb = 0x1p60F, x[] = {1, -0x1p60F}, one[] = {1, 1};
+  const QtbInt n = 2, inc = 1;
+  in_every_tier([&](int tier) { EXPECT_EQ(sdsdot[tier](&n, &sb, x, &inc, one, &inc), 0) << tier_name(tier); });
+}
+
 TEST(sdsdot, rounds_to_single_once) {
   const float sb = 1, x[] = {0x1p-24F, 0x1p-50F}, y[] = {1, 1};
   const QtbInt n = 2, inc = 1;

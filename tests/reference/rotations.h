@@ -67,22 +67,18 @@ Generated<R> rotg(R a, R b) {
   return {r, z, c, s};
 }
 
-// in_double: divide as complex numbers in double.
-template <class R>
-Generated<Complex<R>> rotg(Complex<R> a, Complex<R> b, bool in_double) {
+// W: the precision of what follows the norm.
+template <class W, class R>
+Generated<Complex<R>> rotg(Complex<R> a, Complex<R> b) {
   const R abs_a = std::sqrt(a.re * a.re + a.im * a.im);
   if (abs_a == 0) return {b, b, 0, {1, 0}};
   const R abs_b = std::sqrt(b.re * b.re + b.im * b.im);
   const R scale = abs_b + abs_a;
   const R t1 = a.re / scale, t2 = a.im / scale, t3 = b.re / scale, t4 = b.im / scale;
   const R norm = scale * std::sqrt(t1 * t1 + t2 * t2 + t3 * t3 + t4 * t4);
-  const auto over = [in_double](R v, R divisor) {
-    const double wide = divisor;
-    return in_double ? static_cast<R>((v * wide) / (wide * wide)) : v / divisor;
-  };
-  const R alpha_re = over(a.re, abs_a), alpha_im = over(a.im, abs_a);
-  const R s_re = alpha_re * b.re + alpha_im * b.im, s_im = alpha_im * b.re - alpha_re * b.im;
-  return {{alpha_re * norm, alpha_im * norm}, b, abs_a / norm, {over(s_re, norm), over(s_im, norm)}};
+  const W alpha_re = W(a.re) / W(abs_a), alpha_im = W(a.im) / W(abs_a);
+  const W s_re = alpha_re * W(b.re) + alpha_im * W(b.im), s_im = alpha_im * W(b.re) - alpha_re * W(b.im);
+  return {{R(alpha_re * W(norm)), R(alpha_im * W(norm))}, b, abs_a / norm, {R(s_re / W(norm)), R(s_im / W(norm))}};
 }
 
 template <class R>

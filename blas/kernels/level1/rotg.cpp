@@ -33,56 +33,47 @@ void generate_real(T *a, T *b, T *c, T *s) {
   store_single(b, z);
 }
 
-template <class T>
-T modulus(Complex<T> v) {
+template <class R>
+R modulus(Complex<R> v) {
   return square_root(v.re * v.re + v.im * v.im);
 }
 
-template <class T>
-Complex<T> multiply(Complex<T> u, Complex<T> v) {
-  return {u.re * v.re - u.im * v.im, u.re * v.im + u.im * v.re};
-}
-
-template <class T>
-Complex<T> divide(Complex<T> u, Complex<T> v) {
-  const T norm = v.re * v.re + v.im * v.im;
-  return {(u.re * v.re + u.im * v.im) / norm, (u.im * v.re - u.re * v.im) / norm};
-}
-
-// u / v for a real v. In single precision the tiers above def divide as complex numbers in double and round once more,
-// which shows in the last bit only.
-template <class T>
-Complex<T> divide_by_real(Complex<T> u, T v) {
-  if constexpr (sizeof(T) == sizeof(float) && this_tier >= tier_sse3) {
-    const cdouble wide = divide(cdouble{double(u.re), double(u.im)}, cdouble{double(v), 0.0});
-    return {static_cast<T>(wide.re), static_cast<T>(wide.im)};
-  } else {
-    return {u.re / v, u.im / v};
-  }
-}
-
-template <class T>
-T square(T v) {
+template <class R>
+R square(R v) {
   return v * v;
 }
 
-template <class R, class T = Complex<R>>
-void generate_complex(T *ca, T *cb, R *c, T *s) {
-  const T a = load_single(ca), b = load_single(cb);
+// The precision of what follows the norm: the element's in tier def, double in the others, which shows in the last bit
+// of a single result only.
+template <class R, bool in_double>
+struct PrecisionOf {
+  using Type = R;
+};
+template <class R>
+struct PrecisionOf<R, true> {
+  using Type = double;
+};
+
+template <class R>
+void generate_complex(Complex<R> *ca, Complex<R> *cb, R *c, Complex<R> *s) {
+  using Work = typename PrecisionOf<R, (this_tier > tier_def)>::Type;
+  const Complex<R> a = load_single(ca), b = load_single(cb);
   const R abs_a = modulus(a);
   if (abs_a == 0) {
     store_single(c, R(0));
-    store_single(s, T{1, 0});
+    store_single(s, Complex<R>{1, 0});
     store_single(ca, b);
     return;
   }
   const R scale = modulus(b) + abs_a;
   const R squares = square(a.re / scale) + square(a.im / scale) + square(b.re / scale) + square(b.im / scale);
   const R norm = scale * square_root(squares);
-  const T alpha = divide_by_real(a, abs_a);
+  const Work length = norm, size = abs_a, br = b.re, bi = b.im;
+  const Complex<Work> alpha = {Work(a.re) / size, Work(a.im) / size};
+  const Complex<Work> product = {alpha.re * br + alpha.im * bi, alpha.im * br - alpha.re * bi};  // alpha * conj(b)
   store_single(c, abs_a / norm);
-  store_single(s, divide_by_real(multiply(alpha, T{b.re, -b.im}), norm));
-  store_single(ca, T{alpha.re * norm, alpha.im * norm});
+  store_single(s, Complex<R>{static_cast<R>(product.re / length), static_cast<R>(product.im / length)});
+  store_single(ca, Complex<R>{static_cast<R>(alpha.re * length), static_cast<R>(alpha.im * length)});
 }
 
 }  // namespace
