@@ -22,3 +22,5 @@ function(qtb_add_fuzz name)
   math(EXPR limit "2 * ${QTB_FUZZ_SECONDS} + 60")
   set_tests_properties(${name}_fuzz.search PROPERTIES LABELS long TIMEOUT ${limit})
 endfunction()
+
+qtb_add_fuzz(environment SOURCES fuzz/environment_fuzz.cpp LIBRARIES qtb_static qtb_platform_fake)
