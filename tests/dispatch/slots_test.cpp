@@ -3,13 +3,12 @@
 
 #include "blas/dispatch/slots.h"
 
-#include <thread>
 #include <utility>
 
 #include "tests/dispatch/recording_kernels.h"
 #include "tests/platform/fake.h"
 #include "tests/support/child.h"
-#include "tests/support/tiers.h"
+#include "tests/support/together.h"
 
 extern "C" std::int64_t lsame(const char *a, const char *b);
 
@@ -144,32 +143,18 @@ TEST(Slots, WithoutAnOverrideFollowTheProcessor) {
   });
 }
 
-// 16 threads that start together.
-template <class Body>
-void on_16_threads(Body body) {
-  std::atomic<int> waiting{16};
-  std::vector<std::thread> threads;
-  for (int i = 0; i < 16; ++i)
-    threads.emplace_back([&, i] {
-      for (--waiting; waiting != 0;) {
-      }
-      body(i);
-    });
-  for (std::thread &thread : threads) thread.join();
-}
-
 TEST(Slots, ThreadsThatRaceOnTheFirstCallOfASlotAllReachTheTarget) {
   for (const SlotNumber slot : {slot_ddot, slot_cdotc, slot_dgemm, slot_idamax})
     in_child([&] {
       fake.environment["QTB_DEBUG_CPU_TYPE"] = "3";
-      on_16_threads([&](int) { expect_call(slot, tier_sse42); });
+      on_threads(16, [&](int) { expect_call(slot, tier_sse42); });
     });
 }
 
 TEST(Slots, ThreadsThatRaceOnTheFirstCallsOfDifferentSlotsAgreeOnTheTier) {
   in_child([] {
     fake.environment["QTB_DEBUG_CPU_TYPE"] = "1";
-    on_16_threads([](int thread) {
+    on_threads(16, [](int thread) {
       for (int slot = 0; slot < slot_count; ++slot) expect_call((slot + thread * 16) % slot_count, tier_sse3);
     });
   });

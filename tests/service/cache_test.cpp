@@ -3,11 +3,11 @@
 #include "service/cache.h"
 
 #include <array>
-#include <thread>
 
 #include "service/memory.h"
 #include "tests/platform/fake.h"
 #include "tests/support/child.h"
+#include "tests/support/together.h"
 
 namespace qtb::test {
 namespace {
@@ -116,16 +116,8 @@ TEST(CacheSizes, ANullPointerStillFillsTheTableAndItIsFilledOnce) {
 TEST(CacheSizes, RacingReadersSeeAWholeTableThatOneOfThemFilled) {
   in_child([] {
     fake.processors[0].caches = {first_data, first_code, second, third};
-    std::atomic<int> waiting{16};
     Table found[16];
-    std::vector<std::thread> threads;
-    for (Table &table : found)
-      threads.emplace_back([&] {
-        for (--waiting; waiting != 0;) {
-        }
-        qtb_serv_get_cache_sizes(table.data());
-      });
-    for (std::thread &thread : threads) thread.join();
+    on_threads(16, [&](int i) { qtb_serv_get_cache_sizes(found[i].data()); });
     for (const Table &table : found) EXPECT_EQ(table, (Table{3, 32768, 262144, 8388608, 0}));
     EXPECT_EQ(fake.cpuid_calls, 5);
   });

@@ -3,11 +3,11 @@
 #include "service/cpu.h"
 
 #include <optional>
-#include <thread>
 
 #include "tests/platform/fake.h"
 #include "tests/support/child.h"
 #include "tests/support/tiers.h"
+#include "tests/support/together.h"
 
 namespace qtb::test {
 namespace {
@@ -95,16 +95,8 @@ TEST(CpuDetect, ThreadsThatRaceOnTheFirstCallAgree) {
     in_child([&] {
       fake.processors[0].features_ecx = everything;
       fake.environment[override_name] = text;
-      std::atomic<int> waiting{16};
       ProcessorTier found[16];
-      std::vector<std::thread> threads;
-      for (ProcessorTier &tier : found)
-        threads.emplace_back([&] {
-          for (--waiting; waiting != 0;) {
-          }
-          tier = qtb_serv_cpu_detect();
-        });
-      for (std::thread &thread : threads) thread.join();
+      on_threads(16, [&](int i) { found[i] = qtb_serv_cpu_detect(); });
       for (const ProcessorTier tier : found) EXPECT_EQ(tier, *text != '\0' ? tier_avx : tier_sse42);
     });
   }

@@ -2,10 +2,12 @@
 
 #include "service/memory.h"
 
+#include <random>
 #include <thread>
 
 #include "tests/service/recording_allocator.h"
 #include "tests/support/child.h"
+#include "tests/support/together.h"
 
 namespace qtb::test {
 namespace {
@@ -428,9 +430,7 @@ TEST(Lists, AThreadBeyondTheLimitGetsPlainMemoryAndTheOthersKeepTheirs) {
 
 TEST(Lists, OneThreadWordServesAllThreads) {
   with_service([] {
-    std::vector<std::thread> threads;
-    for (int i = 0; i < 16; ++i) threads.emplace_back([] { qtb_serv_malloc(1000, 128); });
-    for (std::thread &thread : threads) thread.join();
+    on_threads(16, [](int) { qtb_serv_malloc(1000, 128); });
     EXPECT_EQ(fake.thread_words, 1);
     EXPECT_EQ(fake.environment_reads.size(), 2U);
     EXPECT_EQ(allocator.requests.size(), 32U);
@@ -449,52 +449,47 @@ struct Parcel {
 TEST(Threads, AllocateHandOverAndReleaseWithoutLosingOrSharingABuffer) {
   with_service(
       [] {
-        constexpr int thread_count = 16;
-        const int rounds = std::getenv("QTB_TEST_LONG") != nullptr ? 200'000 : 2'000;
+        const int rounds = std::getenv("QTB_TEST_LONG") != nullptr ? 5'000 : 200;
+        constexpr std::size_t shelf_size = 24;
         std::mutex mutex;
         std::vector<Parcel> shelf;
         std::atomic<int> damaged{0};
         std::atomic<std::uint64_t> marks{0};
-        const auto work = [&](unsigned seed) {
+        on_threads(16, [&](int thread) {
+          std::mt19937 random(static_cast<unsigned>(thread));
           for (int round = 0; round < rounds; ++round) {
-            seed = seed * 1103515245 + 12345;
-            const std::size_t count = 16 + (seed >> 16) % 8 * 32;
-            Parcel made = {static_cast<std::uint64_t *>(qtb_serv_malloc(count * 8, 64)), count, ++marks};
+            const std::size_t count = 16 + random() % 8 * 32;
+            const Parcel made = {static_cast<std::uint64_t *>(qtb_serv_malloc(count * 8, 64)), count, ++marks};
             for (std::size_t i = 0; i < count; ++i) made.words[i] = made.mark;
             Parcel taken;
             {
               const std::lock_guard guard(mutex);
               shelf.push_back(made);
-              if (shelf.size() <= 24) continue;
-              taken = shelf[(seed >> 20) % shelf.size()];
-              std::erase_if(shelf, [&](const Parcel &p) { return p.mark == taken.mark; });
+              if (shelf.size() <= shelf_size) continue;
+              std::swap(shelf[random() % shelf.size()], shelf.back());
+              taken = shelf.back();
+              shelf.pop_back();
             }
             for (std::size_t i = 0; i < taken.count; ++i) damaged += taken.words[i] != taken.mark;
             qtb_serv_free(taken.words);
           }
-        };
-        std::vector<std::thread> threads;
-        for (unsigned i = 0; i < thread_count; ++i) threads.emplace_back(work, i + 1);
-        for (std::thread &thread : threads) thread.join();
+        });
         for (const Parcel &parcel : shelf) qtb_serv_free(parcel.words);
         EXPECT_EQ(damaged, 0);
       },
-      120);
+      280);
 }
 
 TEST(Lock, LetsOneThreadInAtATime) {
   in_child([] {
     int plain = 0;
-    std::vector<std::thread> threads;
-    for (int i = 0; i < 16; ++i)
-      threads.emplace_back([&] {
-        for (int round = 0; round < 500; ++round) {
-          qtb_serv_lock();
-          ++plain;
-          qtb_serv_unlock();
-        }
-      });
-    for (std::thread &thread : threads) thread.join();
+    on_threads(16, [&](int) {
+      for (int round = 0; round < 500; ++round) {
+        qtb_serv_lock();
+        ++plain;
+        qtb_serv_unlock();
+      }
+    });
     EXPECT_EQ(plain, 8000);
   });
 }

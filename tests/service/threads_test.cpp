@@ -4,10 +4,9 @@
 
 #include <omp.h>
 
-#include <thread>
-
 #include "tests/platform/fake.h"
 #include "tests/support/child.h"
+#include "tests/support/together.h"
 
 namespace qtb::test {
 namespace {
@@ -201,17 +200,11 @@ TEST(ReadThreadEnv, LeavesTheNextQueryToReadAgain) {
 TEST(MaxThreads, RacingFirstCallsAgree) {
   in_child([] {
     set_up(8, 8, {{"QTB_DOMAIN_NUM_THREADS", "QTB_BLAS=3"}});
-    std::atomic<int> waiting{16};
     std::int32_t found[16], modes[16];
-    std::vector<std::thread> threads;
-    for (int i = 0; i < 16; ++i)
-      threads.emplace_back([&, i] {
-        for (--waiting; waiting != 0;) {
-        }
-        found[i] = qtb_serv_get_max_threads(domain_blas);
-        modes[i] = qtb_serv_get_dynamic();
-      });
-    for (std::thread &thread : threads) thread.join();
+    on_threads(16, [&](int i) {
+      found[i] = qtb_serv_get_max_threads(domain_blas);
+      modes[i] = qtb_serv_get_dynamic();
+    });
     for (int i = 0; i < 16; ++i) {
       EXPECT_EQ(found[i], 3);
       EXPECT_EQ(modes[i], 1);
