@@ -65,9 +65,9 @@ set(QTB_CORE_SOURCES
   service/cores.cpp
   service/cpu.cpp
   service/memory.cpp
+  service/messages.cpp
   service/thread_settings.cpp
   service/threads.cpp
-  service/messages.cpp
 )
 
 # The operating system behind service/platform/platform.h.

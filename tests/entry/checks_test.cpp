@@ -174,11 +174,7 @@ Call legal_call(const FamilyRules &family, unsigned letter, QtbInt size) {
 class Arguments {
  public:
   explicit Arguments(const FamilyRules &family)
-      : family_(family),
-        parameters_(words(family.parameters)),
-        integers_(parameters_.size()),
-        options_(4),
-        nothing_(0) {}
+      : parameters_(words(family.parameters)), integers_(parameters_.size()), options_(4), nothing_(0) {}
 
   // Calls the checker and returns the number that it reported, 0 for none.
   QtbInt check(const Checker &checker, const Call &call) {
@@ -217,7 +213,6 @@ class Arguments {
  private:
   // data() of an empty array lies at the end of its pages: what follows traps.
   static constexpr std::size_t page_inside_the_guard = 64;
-  const FamilyRules &family_;
   std::vector<std::string> parameters_;
   qtb::test::Guarded<QtbInt> integers_;
   qtb::test::Guarded<unsigned char> options_;
