@@ -425,6 +425,21 @@ TEST(sums, of_whole_numbers_are_exact) {
   });
 }
 
+// Both are the contiguous walk, forward from x.
+TEST(real_norms_and_sums, at_increment_minus_1_have_the_bits_of_increment_1) {
+  RandomBits bits(7);
+  for (const QtbInt n : {5, 50, 301}) {
+    const auto s = random_vector<float>(bits, n, -9, 9);
+    const auto d = random_vector<double>(bits, n, -9, 9);
+    in_every_tier([&](int tier) {
+      EXPECT_EQ(call(sasum[tier], n, s.data(), -1), call(sasum[tier], n, s.data(), 1)) << tier_name(tier);
+      EXPECT_EQ(call(dasum[tier], n, d.data(), -1), call(dasum[tier], n, d.data(), 1)) << tier_name(tier);
+      EXPECT_EQ(call(snrm2[tier], n, s.data(), -1), call(snrm2[tier], n, s.data(), 1)) << tier_name(tier);
+      EXPECT_EQ(call(dnrm2[tier], n, d.data(), -1), call(dnrm2[tier], n, d.data(), 1)) << tier_name(tier);
+    });
+  }
+}
+
 TEST(complex_sums, at_increment_1_are_the_sums_of_their_parts) {
   RandomBits bits(5);
   for (const QtbInt n : {1, 7, 50, 301}) {
