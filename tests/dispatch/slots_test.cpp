@@ -68,7 +68,7 @@ const SlotStub stubs[slot_count] = {
 // The tier whose procedure stands in a slot, or -1 for the empty routine.
 int tier_in_slot(int slot, int tier) {
   if ((slot_targets[slot].tiers >> tier & 1) == 0) return -1;
-  return slot == slot_sscal && tier == tier_avx ? tier_sse42 : tier;
+  return tier;
 }
 
 void expect_call(int slot, int tier) {
