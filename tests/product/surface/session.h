@@ -5,6 +5,8 @@
 #include <immintrin.h>
 #include <pthread.h>
 
+#include <cstdarg>
+#include <cstdio>
 #include <cstdlib>
 #include <map>
 #include <string>
@@ -170,10 +172,12 @@ class Session {
       fail("wrote an input");
   }
 
-  template <class... A>
-  void fail(const char *format, A... values) {
+  [[gnu::format(printf, 2, 3)]] void fail(const char *format, ...) {
     char text[200];
-    std::snprintf(text, sizeof text, format, values...);
+    va_list values;
+    va_start(values, format);
+    std::vsnprintf(text, sizeof text, format, values);
+    va_end(values);
     ADD_FAILURE() << current_problem << "\n" << text;
     ++failures_;
   }
