@@ -20,10 +20,12 @@ set(QTB_KERNEL_SOURCES
   blas/kernels/level1/swap.cpp
   # level3
   blas/kernels/level3/blocks.cpp
+  blas/kernels/level3/gemm.cpp
   blas/kernels/level3/pack.cpp
+  blas/kernels/level3/scale_c.cpp
+  blas/kernels/level3/small.cpp
   # plain
   blas/kernels/plain/gemm.cpp
-  blas/kernels/plain/gemm_packed.cpp
   blas/kernels/plain/gemv.cpp
   blas/kernels/plain/ger.cpp
   blas/kernels/plain/symm.cpp
