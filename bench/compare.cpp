@@ -1,6 +1,6 @@
 // compare: this library and another BLAS shared library on the same calls, in turn, in one run.
 //
-//   compare --library LIBRARY [--tier 0..4] [--peer LIBRARY] [--peer-setting NAME=VALUE] --routines ddot,daxpy
+//   compare --library LIBRARY [--tier 0..4] [--peer LIBRARY] [--peer-setting NAME=VALUE] [--routines ddot,daxpy]
 //           [--sizes 8,4000] [--increment 1] [--threads 1] [--pairs 21] [--csv FILE]
 //
 // A tier is a process-wide choice of this library, and a peer's environment setting (how it is held to an instruction
@@ -155,7 +155,7 @@ int run(int argc, char **argv) {
   if (csv != nullptr)
     std::fprintf(csv, "routine,n,increment,ns,rate,peer_rate,unit,ratio,ratio_low,ratio_high,of_limit\n");
   for (const Routine &routine : routines) {
-    bool wanted = false;
+    bool wanted = options.routines.empty() && !routine.is_matrix();
     for (const std::string &name : options.routines) wanted = wanted || name == routine.name;
     if (!wanted) continue;
     for (const long size : options.sizes) compare(options, ours, peer, limits, routine, size, csv);

@@ -47,6 +47,11 @@ std::size_t skip(std::string_view text, std::size_t from, std::string_view skipp
   return next == text.npos ? text.size() : next;
 }
 
+// The characters from begin up to end. (substr would check its arguments, and throw.)
+std::string_view part(std::string_view text, std::size_t begin, std::size_t end) {
+  return {text.data() + begin, end - begin};
+}
+
 // Entries key=number between separators, as in QTB_BLAS=4, QTB_FFT=2.
 void read_domains(ThreadSettings *settings, std::string_view text) {
   const struct {
@@ -68,8 +73,8 @@ void read_domains(ThreadSettings *settings, std::string_view text) {
     const std::size_t number_end = end_of(text, number_begin, separators);
     at = number_end + 1;
 
-    const std::string_view key = text.substr(key_begin, key_end - key_begin);
-    const std::int32_t number = number_or_one(text.substr(number_begin, number_end - number_begin));
+    const std::string_view key = part(text, key_begin, key_end);
+    const std::int32_t number = number_or_one(part(text, number_begin, number_end));
     for (const auto &domain : domains)
       if (key == domain.key) give_first(domain.field, number);
   }
@@ -77,7 +82,7 @@ void read_domains(ThreadSettings *settings, std::string_view text) {
 
 bool says_false(std::string_view text) {
   const std::size_t begin = skip(text, 0, blank_or_quote);
-  const std::string_view token = text.substr(begin, end_of(text, begin, blank_or_quote) - begin);
+  const std::string_view token = part(text, begin, end_of(text, begin, blank_or_quote));
   return token == "FALSE" || token == "false";
 }
 

@@ -1,3 +1,5 @@
+// The recording procedures of every tier; see recording_kernels.h.
+
 #include "tests/dispatch/recording_kernels.h"
 
 namespace qtb::test {

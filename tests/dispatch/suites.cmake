@@ -2,8 +2,8 @@ qtb_add_test(slots_test SOURCES dispatch/slots_test.cpp dispatch/recording_kerne
   LIBRARIES qtb_static qtb_platform_fake)
 qtb_add_test(slot_table_test SOURCES dispatch/table_test.cpp LIBRARIES qtb_static qtb_platform_static)
 
-# Static, since the system's dynamic loader refuses to start on vendors that it does not know; neither the sanitizers nor
-# clang's OpenMP runtime come that way.
+# Static, since the system's dynamic loader refuses to start on vendors that it does not know; neither the sanitizers
+# nor clang's OpenMP runtime come that way.
 if(NOT QTB_INSTRUMENT AND CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
   add_executable(dispatch_diagnostic dispatch/diagnostic.cpp)
   target_include_directories(dispatch_diagnostic PRIVATE ${PROJECT_SOURCE_DIR})

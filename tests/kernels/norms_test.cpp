@@ -1,4 +1,4 @@
-// Norms, sums of magnitudes, dcabs1 and the dot products in double, in every tier, against the oracle.
+// Norms, sums of magnitudes and dcabs1, in every tier, against the oracle.
 
 #include <gtest/gtest.h>
 
@@ -17,16 +17,11 @@ using qtb::reference::RunningSums;
 
 template <class T>
 using Norm = Real<T> (*)(const QtbInt *, const T *, const QtbInt *);
-using Dot = double (*)(const QtbInt *, const float *, const QtbInt *, const float *, const QtbInt *);
-using SingleDot = float (*)(const QtbInt *, const float *, const float *, const QtbInt *, const float *,
-                            const QtbInt *);
 
 const Norm<float> snrm2[] = QTB_ALL_TIERS(snrm2), sasum[] = QTB_ALL_TIERS(sasum);
 const Norm<double> dnrm2[] = QTB_ALL_TIERS(dnrm2), dasum[] = QTB_ALL_TIERS(dasum);
 const Norm<cfloat> scnrm2[] = QTB_ALL_TIERS(scnrm2), scasum[] = QTB_ALL_TIERS(scasum);
 const Norm<cdouble> dznrm2[] = QTB_ALL_TIERS(dznrm2), dzasum[] = QTB_ALL_TIERS(dzasum);
-const Dot dsdot[] = QTB_ALL_TIERS(dsdot);
-const SingleDot sdsdot[] = QTB_ALL_TIERS(sdsdot);
 
 template <class T>
 Real<T> call(Norm<T> routine, QtbInt n, const T *x, QtbInt incx) {
@@ -150,74 +145,6 @@ TEST(scasum, is_within_its_bound_at_every_place) {
 }
 TEST(dzasum, is_within_its_bound_at_every_place) {
   sweep_all<cdouble>({"dzasum", dzasum, asum_of<cdouble>, false}, double_ends);
-}
-
-// ---- dot products in double ----
-
-TEST(dsdot, and_sdsdot_are_within_their_bounds_at_every_place) {
-  RandomBits bits(2);
-  const QtbInt longest = 70;
-  const std::vector<float> vx = random_vector<float>(bits, longest, -12, 12),
-                           vy = random_vector<float>(bits, longest, -12, 12);
-  const float sb = -1.0F / 3;
-  Arena arena_x(arena_bytes), arena_y(arena_bytes);
-  for (const QtbInt incx : {1, -1, 2, -2, 3, -3, 0})
-    for (const QtbInt incy : {1, -1, 2, -2, 3, -3, 0})
-      for (QtbInt n = 0; n <= longest; n += n < 9 ? 1 : 7) {
-        std::vector<float> x = vx, y = vy;
-        if (incx == 0) std::fill(x.begin(), x.end(), vx[0]);
-        if (incy == 0) std::fill(y.begin(), y.end(), vy[0]);
-        const Bounded sum = qtb::reference::dot(0, n, x, y), sum_and_sb = qtb::reference::dot(Quad(sb), n, x, y);
-        for (std::size_t offset = 0; offset < 16; ++offset) {
-          Placed<float> px(arena_x, x, n, incx, Flush::back, offset);
-          Placed<float> py(arena_y, y, n, incy, Flush::back, (5 * offset) % 16);
-          in_every_tier([&](int tier) {
-            FiniteOnly guard;
-            const double got = dsdot[tier](&n, px.data(), &incx, py.data(), &incy);
-            const float got_single = sdsdot[tier](&n, &sb, px.data(), &incx, py.data(), &incy);
-            const double r = error_ratio(got, sum.value, sum.gauge, sum.roundings);
-            const double r_single = qtb::reference::ratio_of_rounded(got_single, sum_and_sb);
-            TallyReport::of("dsdot").within(tier, r);
-            TallyReport::of("sdsdot").within(tier, r_single);
-            ASSERT_LE(r, 1) << tier_name(tier) << " n " << n << " increments " << incx << " " << incy;
-            ASSERT_LE(r_single, 1) << tier_name(tier) << " n " << n << " increments " << incx << " " << incy;
-          });
-        }
-      }
-}
-
-TEST(dsdot, adds_even_and_odd_pairs_in_two_chains_and_the_odd_last_pair_to_their_sum) {
-  const float x[] = {0x1p60F, 1, -0x1p60F, 0}, one[] = {1, 1, 1, 1};
-  const QtbInt inc = 1;
-  in_every_tier([&](int tier) {
-    for (const auto &[n, want] : {std::pair<QtbInt, double>{4, 1}, {3, 0}})
-      EXPECT_EQ(dsdot[tier](&n, x, &inc, one, &inc), want) << tier_name(tier);
-  });
-}
-
-TEST(sdsdot, starts_the_chain_of_even_pairs_with_sb) {
-  const float sb = 0x1p60F, x[] = {1, -0x1p60F}, one[] = {1, 1};
-  const QtbInt n = 2, inc = 1;
-  in_every_tier([&](int tier) { EXPECT_EQ(sdsdot[tier](&n, &sb, x, &inc, one, &inc), 0) << tier_name(tier); });
-}
-
-TEST(sdsdot, rounds_to_single_once) {
-  const float sb = 1, x[] = {0x1p-24F, 0x1p-50F}, y[] = {1, 1};
-  const QtbInt n = 2, inc = 1;
-  in_every_tier([&](int tier) { EXPECT_EQ(sdsdot[tier](&n, &sb, x, &inc, y, &inc), 1 + 0x1p-23F) << tier_name(tier); });
-}
-
-TEST(sdsdot, of_nothing_is_sb_and_reads_no_vector) {
-  Arena nothing(0);
-  const float *unreadable = reinterpret_cast<const float *>(nothing.data());
-  const float sb = 2.5F;
-  const QtbInt inc = 1;
-  in_every_tier([&](int tier) {
-    for (const QtbInt n : {QtbInt{0}, QtbInt{-3}}) {
-      EXPECT_EQ(sdsdot[tier](&n, &sb, unreadable, &inc, unreadable, &inc), sb) << tier_name(tier);
-      EXPECT_EQ(dsdot[tier](&n, unreadable, &inc, unreadable, &inc), 0) << tier_name(tier);
-    }
-  });
 }
 
 // ---- edges ----
@@ -423,6 +350,21 @@ TEST(sums, of_whole_numbers_are_exact) {
       }
     });
   });
+}
+
+// Both are the contiguous walk, forward from x.
+TEST(real_norms_and_sums, at_increment_minus_1_have_the_bits_of_increment_1) {
+  RandomBits bits(7);
+  for (const QtbInt n : {5, 50, 301}) {
+    const auto s = random_vector<float>(bits, n, -9, 9);
+    const auto d = random_vector<double>(bits, n, -9, 9);
+    in_every_tier([&](int tier) {
+      EXPECT_EQ(call(sasum[tier], n, s.data(), -1), call(sasum[tier], n, s.data(), 1)) << tier_name(tier);
+      EXPECT_EQ(call(dasum[tier], n, d.data(), -1), call(dasum[tier], n, d.data(), 1)) << tier_name(tier);
+      EXPECT_EQ(call(snrm2[tier], n, s.data(), -1), call(snrm2[tier], n, s.data(), 1)) << tier_name(tier);
+      EXPECT_EQ(call(dnrm2[tier], n, d.data(), -1), call(dnrm2[tier], n, d.data(), 1)) << tier_name(tier);
+    });
+  }
 }
 
 TEST(complex_sums, at_increment_1_are_the_sums_of_their_parts) {

@@ -8,8 +8,9 @@ qtb_add_test(gemm_copy_test SOURCES kernels/gemm_copy_test.cpp LIBRARIES qtb_sta
 qtb_add_test(gemm_kernels_test SOURCES kernels/gemm_kernels_test.cpp LIBRARIES qtb_static)
 qtb_add_test(gemm_pieces_test SOURCES kernels/gemm_pieces_test.cpp LIBRARIES qtb_static)
 qtb_add_test(triangle_pieces_test SOURCES kernels/triangle_pieces_test.cpp LIBRARIES qtb_static SHARDS 2)
-# Every tier's kernels, called directly.
 # level1
+qtb_add_test(extended_dot_test SOURCES kernels/extended_dot_test.cpp LIBRARIES qtb_static)
+qtb_add_test(generated_rotations_test SOURCES kernels/generated_rotations_test.cpp LIBRARIES qtb_static)
 qtb_add_test(norms_test SOURCES kernels/norms_test.cpp LIBRARIES qtb_static)
 qtb_add_test(rotations_test SOURCES kernels/rotations_test.cpp LIBRARIES qtb_static)
 qtb_add_test(searches_test SOURCES kernels/searches_test.cpp LIBRARIES qtb_static)

@@ -163,6 +163,10 @@ TEST(VectorArithmetic, an_infinite_factor_of_nonzero_elements_raises_no_invalid_
   call_among_signalling_nans(axpy_of<double>("daxpy", daxpy_tiers, wide), tally);
   call_among_signalling_nans(scal_of<float, float>("sscal", sscal_tiers, single), tally);
   call_among_signalling_nans(scal_of<double, double>("dscal", dscal_tiers, wide), tally);
+  call_among_signalling_nans(axpy_of<cfloat>("caxpy", caxpy_tiers, {single, 2}), tally);
+  call_among_signalling_nans(axpy_of<cdouble>("zaxpy", zaxpy_tiers, {2, wide}), tally);
+  call_among_signalling_nans(scal_of<cfloat, cfloat>("cscal", cscal_tiers, {2, single}), tally);
+  call_among_signalling_nans(scal_of<cdouble, cdouble>("zscal", zscal_tiers, {wide, 2}), tally);
   call_among_signalling_nans(scal_of<cfloat, float>("csscal", csscal_tiers, single), tally);
   call_among_signalling_nans(scal_of<cdouble, double>("zdscal", zdscal_tiers, wide), tally);
 }

@@ -57,7 +57,7 @@ expect() {
 expect "nothing missing" 0 "" 0 "" build test demo bench lint sanitizers fuzz coverage
 expect "missing for another purpose" 0 "" 0 gcovr build test
 expect "one missing" 0 "apt-get update,apt-get install ninja-build" 0 ninja-build build test
-expect "missing for two purposes" 0 "apt-get update,apt-get install clang libomp-dev" 0 "libomp-dev clang" fuzz sanitizers
+expect "missing twice" 0 "apt-get update,apt-get install clang libomp-dev" 0 "libomp-dev clang" fuzz sanitizers
 expect "not root" 0 "sudo apt-get update,sudo apt-get install gfortran" 1000 gfortran test
 expect "no such purpose" 2 "" 0 "" build everything
 

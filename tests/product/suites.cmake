@@ -21,4 +21,8 @@ qtb_add_script_test(packages_test COMMAND product/packages_test.sh ${PROJECT_SOU
 qtb_add_test(surface_level1_test TIERS SOURCES product/surface_level1_test.cpp LIBRARIES qtb)
 qtb_add_test(surface_level2_test TIERS SOURCES product/surface_level2_test.cpp LIBRARIES qtb)
 qtb_add_test(surface_level3_test TIERS SOURCES product/surface_level3_test.cpp LIBRARIES qtb)
+qtb_add_test(published_level2_test TIERS SOURCES product/published_level2_test.cpp LIBRARIES qtb)
+qtb_add_test(published_level3_test TIERS SOURCES product/published_level3_test.cpp LIBRARIES qtb)
+qtb_add_test(first_calls_test TIERS SOURCES product/first_calls_test.cpp LIBRARIES qtb)
+qtb_add_test(published_errors_test SOURCES product/published_errors_test.cpp LIBRARIES qtb)
 qtb_add_test(second_oracle_test SOURCES product/second_oracle_test.cpp)

@@ -2,4 +2,6 @@
 // against the oracle.
 
 #include "tests/product/surface/level1_shapes.h"
+#include "tests/product/surface/sweeps.h"
+
 #include "tests/product/surface/suite.h"

@@ -3,6 +3,7 @@
 #include "service/cache.h"
 
 #include <array>
+#include <chrono>
 
 #include "service/memory.h"
 #include "tests/platform/fake.h"
@@ -56,9 +57,12 @@ TEST(CacheSizes, TheListEndsAtTypeZeroOrWhereTheShapeIsZero) {
 }
 
 TEST(CacheSizes, OnlyTheTypeFieldSaysWhatACacheIs) {
-  CpuidRegisters level = first_data;
-  level.eax |= 0xFFFFFFE0;  // level, sharing and the rest
-  expect_table({level}, {1, 32768, 0, 0, 0});
+  const auto with_other_fields = [](CpuidRegisters cache) {
+    cache.eax |= 0xFFFFFFE0;  // level, sharing and the rest
+    return cache;
+  };
+  const CpuidRegisters end = with_other_fields({0, first_data.ebx, first_data.ecx, 0});
+  expect_table({with_other_fields(first_code), with_other_fields(first_data), end, second}, {1, 32768, 0, 0, 0});
 }
 
 TEST(CacheSizes, FourLevelsAreHandedOutAndSevenCounted) {
@@ -117,7 +121,19 @@ TEST(CacheSizes, RacingReadersSeeAWholeTableThatOneOfThemFilled) {
   in_child([] {
     fake.processors[0].caches = {first_data, first_code, second, third};
     Table found[16];
-    on_threads(16, [&](int i) { qtb_serv_get_cache_sizes(found[i].data()); });
+    // All of them find the table empty, and wait for the lock.
+    qtb_serv_lock();
+    std::atomic<int> started{0};
+    std::thread opener([&] {
+      while (started != 16) std::this_thread::yield();
+      std::this_thread::sleep_for(std::chrono::milliseconds(20));
+      qtb_serv_unlock();
+    });
+    on_threads(16, [&](int i) {
+      ++started;
+      qtb_serv_get_cache_sizes(found[i].data());
+    });
+    opener.join();
     for (const Table &table : found) EXPECT_EQ(table, (Table{3, 32768, 262144, 8388608, 0}));
     EXPECT_EQ(fake.cpuid_calls, 5);
   });

@@ -79,6 +79,11 @@ TEST(CoreProbe, CountsCoresAndNotTheirThreads) {
       }
 }
 
+TEST(CoreProbe, CountsPackagesThatFillTheirFields) {
+  belmo_machine(2, 64, 2);
+  EXPECT_EQ(probe(), (Counts{256, 128}));
+}
+
 TEST(CoreProbe, TheOrderInWhichProcessorsAreNumberedPlaysNoPart) {
   belmo_machine(2, 4, 2);
   std::vector<FakeProcessor> shuffled;
@@ -103,6 +108,8 @@ TEST(CoreProbe, WithoutLeaf4APackageIsOneCore) {
   belmo_machine(2, 2, 2);
   for (FakeProcessor &processor : fake.processors) processor.highest_leaf = 3;
   EXPECT_EQ(probe(), (Counts{8, 2}));
+  for (FakeProcessor &processor : fake.processors) processor.highest_leaf = 4;
+  EXPECT_EQ(probe(), (Counts{8, 4}));
 }
 
 TEST(CoreProbe, WithoutLeaf1TheVendorDoesNotCount) {

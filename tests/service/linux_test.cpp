@@ -319,25 +319,29 @@ TEST(Fork, OfAProcessWithOneThreadLeavesTheChildItsThreads) {
   });
 }
 
-TEST(Fork, WhileOtherThreadsUseTheLockLeavesNoChildWaiting) {
+TEST(Fork, WhileOtherThreadsUseTheLockLeavesNoChildWaitingAndTheLockIntact) {
   constexpr int forks = 200;
   in_child(
       [] {
         qtb_serv_prepare_fork();
         std::atomic<bool> done{false};
+        std::atomic<int> inside{0}, met{0};
         std::vector<std::thread> threads;
         for (int i = 0; i < 3; ++i)
           threads.emplace_back([&] {
             while (!done) {
               qtb_serv_free(qtb_serv_malloc(50'000'000, 0));
               qtb_serv_lock();
+              met += ++inside != 1;
               for (int held = 0; held < 10'000; ++held) asm volatile("");
+              --inside;
               qtb_serv_unlock();
             }
           });
         for (int i = 0; i < forks && !::testing::Test::HasFailure(); ++i) in_child(use_services, 10);
         done = true;
         for (std::thread &thread : threads) thread.join();
+        EXPECT_EQ(met, 0) << "two threads held the lock at once";
         std::printf("%d forks survived\n", forks);
       },
       120);

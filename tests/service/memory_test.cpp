@@ -2,6 +2,7 @@
 
 #include "service/memory.h"
 
+#include <chrono>
 #include <random>
 #include <thread>
 
@@ -430,7 +431,19 @@ TEST(Lists, AThreadBeyondTheLimitGetsPlainMemoryAndTheOthersKeepTheirs) {
 
 TEST(Lists, OneThreadWordServesAllThreads) {
   with_service([] {
-    on_threads(16, [](int) { qtb_serv_malloc(1000, 128); });
+    // All of them find that there is none, and wait for the lock.
+    qtb_serv_lock();
+    std::atomic<int> started{0};
+    std::thread opener([&] {
+      while (started != 16) std::this_thread::yield();
+      std::this_thread::sleep_for(std::chrono::milliseconds(20));
+      qtb_serv_unlock();
+    });
+    on_threads(16, [&](int) {
+      ++started;
+      qtb_serv_malloc(1000, 128);
+    });
+    opener.join();
     EXPECT_EQ(fake.thread_words, 1);
     EXPECT_EQ(fake.environment_reads.size(), 2U);
     EXPECT_EQ(allocator.requests.size(), 32U);

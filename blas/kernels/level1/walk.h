@@ -19,12 +19,14 @@
 namespace qtb::QTB_TIER {
 namespace {
 
-// ---- Cursors: an operand of a pass, and how its vectors are reached. T is const for an operand that is only read.
-// ----
+// ---- Cursors ----
+//
+// An operand of a pass, and how its vectors are reached; T is const for an operand that is only read. beyond is the
+// number of elements that a load takes from behind its own vector.
 
 template <class T>
 struct Aligned {
-  static constexpr QtbInt beyond = 0;  // elements that a load reads behind its vector
+  static constexpr QtbInt beyond = 0;
   T *p;
   auto load(int k) const { return load_aligned(p + k * lanes<T>); }
   void store(int k, Vec<T> v) const { store_aligned(p + k * lanes<T>, v); }
@@ -136,16 +138,14 @@ template <Row row, class X, class Y, class Body>
   if (walk.n < 2 * lanes<Y>) return;
   const Aligned<Y> y{walk.y};
   switch (phase(walk.x)) {
-    case 8:
-      return vector_passes<count>(walk, Rejoined<X, 8>(walk.x), y, body);
+    case 8: return vector_passes<count>(walk, Rejoined<X, 8>(walk.x), y, body);
     case 4:
       if constexpr (sizeof(Y) == sizeof(float)) return vector_passes<count>(walk, Rejoined<X, 4>(walk.x), y, body);
       break;
     case 12:
       if constexpr (sizeof(Y) == sizeof(float)) return vector_passes<count>(walk, Rejoined<X, 12>(walk.x), y, body);
       break;
-    default:
-      break;
+    default: break;
   }
   vector_passes<count>(walk, Unaligned<X>{walk.x}, y, body);
 }

@@ -87,10 +87,11 @@ void scaled_product(QtbInt m, QtbInt n, QtbInt k, T alpha, A a, B b, T beta, T *
   if (!is_zero(alpha)) add_product(Part::whole, m, n, k, alpha, a, b, c, ldc);
 }
 
-// The diagonal of an updated Hermitian matrix is real.
+// The diagonal of a Hermitian matrix is real. Nothing is read.
 template <class T>
 void clear_imaginary_diagonal(QtbInt n, T *c, QtbInt ldc) {
-  for (QtbInt j = 0; j < n; j++) c[j + j * ldc] = real_only(c[j + j * ldc]);
+  if constexpr (is_complex<T>)
+    for (QtbInt j = 0; j < n; j++) c[j + j * ldc].im = 0;
 }
 
 }  // namespace

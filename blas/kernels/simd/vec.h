@@ -59,19 +59,33 @@ inline void store_aligned(double *p, __m128d v) { _mm_store_pd(p, v); }
 inline void store_unaligned(float *p, __m128 v) { _mm_storeu_ps(p, v); }
 inline void store_unaligned(double *p, __m128d v) { _mm_storeu_pd(p, v); }
 
+// One real element, at any address: the type tells the compiler that the address need not be a multiple of the width.
+template <class T>
+struct [[gnu::packed, gnu::may_alias]] AnyAddress {
+  T value;
+};
+template <class T>
+T load_single(const T *p) {
+  return reinterpret_cast<const AnyAddress<T> *>(p)->value;
+}
+template <class T>
+void store_single(T *p, T v) {
+  reinterpret_cast<AnyAddress<T> *>(p)->value = v;
+}
+
 // Two 8-byte loads, for the tiers whose processors read a misaligned vector slowly.
 inline __m128 load_halves(const float *p) {
   return _mm_loadh_pi(_mm_loadl_pi(_mm_setzero_ps(), reinterpret_cast<const __m64 *>(p)),
                       reinterpret_cast<const __m64 *>(p + 2));
 }
-inline __m128d load_halves(const double *p) { return _mm_loadh_pd(_mm_load_sd(p), p + 1); }
+inline __m128d load_halves(const double *p) { return _mm_set_pd(load_single(p + 1), load_single(p)); }
 inline void store_halves(float *p, __m128 v) {
   _mm_storel_pi(reinterpret_cast<__m64 *>(p), v);
   _mm_storeh_pi(reinterpret_cast<__m64 *>(p + 2), v);
 }
 inline void store_halves(double *p, __m128d v) {
-  _mm_storel_pd(p, v);
-  _mm_storeh_pd(p + 1, v);
+  store_single(p, _mm_cvtsd_f64(v));
+  store_single(p + 1, _mm_cvtsd_f64(_mm_unpackhi_pd(v, v)));
 }
 
 // The parts of elements: of a real element, itself.
@@ -100,20 +114,6 @@ void store_aligned(Complex<R> *p, Vec<R> v) {
 template <class R>
 void store_unaligned(Complex<R> *p, Vec<R> v) {
   store_unaligned(parts(p), v);
-}
-
-// One real element, at any address: the type tells the compiler that the address need not be a multiple of the width.
-template <class T>
-struct [[gnu::packed, gnu::may_alias]] AnyAddress {
-  T value;
-};
-template <class T>
-T load_single(const T *p) {
-  return reinterpret_cast<const AnyAddress<T> *>(p)->value;
-}
-template <class T>
-void store_single(T *p, T v) {
-  reinterpret_cast<AnyAddress<T> *>(p)->value = v;
 }
 
 // One element's bit pattern, at any address: a move that no floating-point instruction has a hand in.
@@ -153,8 +153,8 @@ inline __m128 gather(const cfloat *p, QtbInt inc) {
 }
 inline __m128d gather(const cdouble *p, QtbInt) { return load_unaligned(p); }
 inline void scatter(double *p, QtbInt inc, __m128d v) {
-  _mm_storel_pd(p, v);
-  _mm_storeh_pd(p + inc, v);
+  store_single(p, _mm_cvtsd_f64(v));
+  store_single(p + inc, _mm_cvtsd_f64(_mm_unpackhi_pd(v, v)));
 }
 inline void scatter(cfloat *p, QtbInt inc, __m128 v) { scatter(reinterpret_cast<double *>(p), inc, _mm_castps_pd(v)); }
 inline void scatter(cdouble *p, QtbInt, __m128d v) { store_unaligned(p, v); }

@@ -1,9 +1,10 @@
 // The main program of a suite of the surface: the exported names of the shared library, in both cases, and nothing else
-// of it.
+// of it. A suite includes this file last: register_routine(), of sweeps.h or published.h, says what a routine goes
+// through.
 #pragma once
 
 #include "tests/product/program.h"
-#include "tests/product/surface/sweeps.h"
+#include "tests/product/surface/registry.h"
 
 extern "C" {
 #define QTB_ROUTINE(name, NAME, shape, T, route) \
@@ -18,7 +19,7 @@ int main(int argc, char **argv) {
   testing::InitGoogleTest(&argc, argv);
   if (!qtb::test::processor_runs_forced_tier()) return qtb::test::exit_skipped;
 #define QTB_ROUTINE(name, NAME, shape, T, route) \
-  register_sweeps<#shape, T>(Routine<QTB_FUNCTION_TYPE(shape, T)>(#name, &name, &NAME));
+  register_routine<#shape, T>(Routine<QTB_FUNCTION_TYPE(shape, T)>(#name, &name, &NAME));
 #include "blas/routines.def"
 #undef QTB_ROUTINE
   std::signal(SIGSEGV, on_trap);

@@ -1,38 +1,12 @@
-// What every routine goes through, and the main program of a suite. A suite includes this file behind the shapes that
-// it tests, and registers the routines of blas/routines.def whose shape has a run() by then.
+// What every routine goes through: random problems of all options. A suite includes this file behind the shapes that it
+// tests: the routines of blas/routines.def whose shape has a run() by then are tested.
 #pragma once
 
-#include <unistd.h>
-#include <csignal>
-#include <cstdlib>
 #include <string>
 
-#include "tests/product/surface/session.h"
+#include "tests/product/surface/registry.h"
 
 namespace qtb::surface {
-
-// ---- counts and seeds ----
-
-inline bool is_long() {
-  const char *value = std::getenv("QTB_TEST_LONG");
-  return value != nullptr && *value != '\0' && *value != '0';
-}
-inline int times(int count) { return is_long() ? 20 * count : count; }
-
-// QTB_TEST_SEED starts the draws elsewhere.
-inline std::uint64_t first_seed() {
-  const char *value = std::getenv("QTB_TEST_SEED");
-  return value != nullptr ? std::strtoull(value, nullptr, 10) : 20;
-}
-
-// A seed of its own for each routine and case.
-inline std::uint64_t seed_of(const char *routine, int number) {
-  std::uint64_t seed = first_seed() * 1000003;
-  for (const char *c = routine; *c != '\0'; ++c) seed = seed * 131 + static_cast<unsigned char>(*c);
-  return seed * 1000003 + static_cast<std::uint64_t>(number);
-}
-
-// ---- the sweeps ----
 
 template <class S, class T, class R>
 class Sweeps {
@@ -93,23 +67,9 @@ class Sweeps {
   R routine_;
 };
 
-template <class Body>
-void register_test(const char *suite, const char *name, Body body) {
-  class Test : public testing::Test {
-   public:
-    explicit Test(Body b) : body_(b) {}
-    void TestBody() override { body_(); }
-
-   private:
-    Body body_;
-  };
-  testing::RegisterTest(suite, name, nullptr, nullptr, __FILE__, __LINE__,
-                        [body]() -> testing::Test * { return new Test(body); });
-}
-
 // All sweeps of a routine, if this program tests its shape.
 template <ShapeName shape, class T, class R>
-void register_sweeps(const R &routine) {
+void register_routine(const R &routine) {
   if constexpr (requires(Problem p, Session s) { run<T>(Shape<shape>(), routine, p, s); }) {
     const Sweeps<Shape<shape>, T, R> sweeps(routine);
     const char *name = routine.name();
@@ -120,30 +80,6 @@ void register_sweeps(const R &routine) {
     register_test("floating_point_state_is_honoured_and_kept", name, [=] { sweeps.rounding_modes(); });
     register_test("little_stack_is_enough", name, [=] { sweeps.small_stack(); });
   }
-}
-
-// ---- the program ----
-
-// Names the problem that trapped.
-inline void on_trap(int signal) {
-  const auto put = [](const char *text) { (void)!write(STDERR_FILENO, text, std::strlen(text)); };
-  put("\ntrapped in ");
-  put(current_problem);
-  put("\n");
-  std::signal(signal, SIG_DFL);
-  std::raise(signal);
-}
-
-inline void report() {
-  long cases = 0;
-  for (const auto &[routine, tally] : tallies()) {
-    std::printf("%-8s %7ld cases, worst error / bound %.3f\n", routine.c_str(), tally.cases, tally.worst);
-    cases += tally.cases;
-  }
-  if (cases == 0) return;
-  const char *tier = std::getenv("QTB_DEBUG_CPU_TYPE");
-  std::printf("tier %s: %ld cases from seed %llu\n", tier != nullptr ? tier : "(chosen)", cases,
-              static_cast<unsigned long long>(first_seed()));
 }
 
 }  // namespace qtb::surface

@@ -1,0 +1,75 @@
+// What the suites of the surface share: seeds, the registration of a test per routine, the report, the handler of a
+// trap.
+#pragma once
+
+#include <unistd.h>
+
+#include <csignal>
+#include <cstdlib>
+
+#include "tests/product/surface/session.h"
+
+namespace qtb::surface {
+
+// ---- counts and seeds ----
+
+inline bool is_long() {
+  const char *value = std::getenv("QTB_TEST_LONG");
+  return value != nullptr && *value != '\0' && *value != '0';
+}
+inline int times(int count) { return is_long() ? 20 * count : count; }
+
+// QTB_TEST_SEED starts the draws elsewhere.
+inline std::uint64_t first_seed() {
+  const char *value = std::getenv("QTB_TEST_SEED");
+  return value != nullptr ? std::strtoull(value, nullptr, 10) : 20;
+}
+
+// A seed of its own for each routine and case.
+inline std::uint64_t seed_of(const char *routine, int number) {
+  std::uint64_t seed = first_seed() * 1000003;
+  for (const char *c = routine; *c != '\0'; ++c) seed = seed * 131 + static_cast<unsigned char>(*c);
+  return seed * 1000003 + static_cast<std::uint64_t>(number);
+}
+
+// ---- tests ----
+
+template <class Body>
+void register_test(const char *suite, const char *name, Body body) {
+  class Test : public testing::Test {
+   public:
+    explicit Test(Body b) : body_(b) {}
+    void TestBody() override { body_(); }
+
+   private:
+    Body body_;
+  };
+  testing::RegisterTest(suite, name, nullptr, nullptr, __FILE__, __LINE__,
+                        [body]() -> testing::Test * { return new Test(body); });
+}
+
+// ---- the program ----
+
+// Names the problem that trapped.
+inline void on_trap(int signal) {
+  const auto put = [](const char *text) { (void)!write(STDERR_FILENO, text, std::strlen(text)); };
+  put("\ntrapped in ");
+  put(current_problem);
+  put("\n");
+  std::signal(signal, SIG_DFL);
+  std::raise(signal);
+}
+
+inline void report() {
+  long cases = 0;
+  for (const auto &[routine, tally] : tallies()) {
+    std::printf("%-8s %7ld cases, worst error / bound %.3f\n", routine.c_str(), tally.cases, tally.worst);
+    cases += tally.cases;
+  }
+  if (cases == 0) return;
+  const char *tier = std::getenv("QTB_DEBUG_CPU_TYPE");
+  std::printf("tier %s: %ld cases from seed %llu\n", tier != nullptr ? tier : "(chosen)", cases,
+              static_cast<unsigned long long>(first_seed()));
+}
+
+}  // namespace qtb::surface
