@@ -48,10 +48,7 @@ set(QTB_KERNEL_SOURCES_avx
   blas/kernels/level3/avx/dgemm_kernel.cpp
   blas/kernels/level3/sse42/gemm_kernel.cpp
 )
-set(qtb_tier_sources "")
-foreach(tier IN LISTS QTB_TIERS)
-  list(APPEND qtb_tier_sources ${QTB_KERNEL_SOURCES_${tier}})
-endforeach()
+set(qtb_tier_sources ${QTB_KERNEL_SOURCES_sse42} ${QTB_KERNEL_SOURCES_avx})
 # Of these, the ones in the wider encoding: tests/product/mnemonics/vex_objects.txt has the same list.
 set(QTB_WIDE_KERNEL_SOURCES
   blas/kernels/level3/avx/dgemm_kernel.cpp
