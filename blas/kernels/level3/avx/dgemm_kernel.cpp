@@ -26,7 +26,9 @@ constexpr std::uintptr_t wide_vector_bytes = 32;
 // first row of a tile in C.
 constexpr int prefetch_a_first = 1536, prefetch_a_second = 1664, prefetch_c = 40;
 
-inline void prefetch(const double *p, int bytes) { _mm_prefetch(reinterpret_cast<const char *>(p) + bytes, _MM_HINT_T0); }
+inline void prefetch(const double *p, int bytes) {
+  _mm_prefetch(reinterpret_cast<const char *>(p) + bytes, _MM_HINT_T0);
+}
 
 [[gnu::always_inline]] inline __m256d load_rows(const double *a) {
   return _mm256_insertf128_pd(_mm256_castpd128_pd256(_mm_load_pd(a)), _mm_load_pd(a + half_length), 1);
@@ -87,8 +89,8 @@ struct Tile {
 
 // The rows of A against one micro-panel of B.
 template <int width, bool aligned>
-[[gnu::noinline, gnu::flatten]] void multiply_micro_panel(QtbInt m, QtbInt kp, const double *ap, QtbInt ldap, const double *bp, double *c, QtbInt ldc,
-                          double *stage) {
+[[gnu::noinline, gnu::flatten]] void multiply_micro_panel(QtbInt m, QtbInt kp, const double *ap, QtbInt ldap,
+                                                          const double *bp, double *c, QtbInt ldc, double *stage) {
   for (QtbInt e = 0; e < kp * width; e += vector_length) _mm256_store_pd(stage + e, _mm256_load_pd(bp + e));
   for (; m > 0; m -= mr, ap += ldap, c += mr) {
     for (int j = 0; j < width; j++) prefetch(c + j * ldc, prefetch_c);

@@ -134,7 +134,8 @@ struct Tile {
 
 // The rows of A against one micro-panel of B.
 template <class T, int width, bool aligned>
-[[gnu::noinline, gnu::flatten]] void multiply_columns(QtbInt m, QtbInt kp, const T *ap, QtbInt ldap, const Real<T> *b, T *c, QtbInt ldc) {
+[[gnu::noinline, gnu::flatten]] void multiply_columns(QtbInt m, QtbInt kp, const T *ap, QtbInt ldap, const Real<T> *b,
+                                                      T *c, QtbInt ldc) {
   using Block = Tile<T, width>;
   constexpr QtbInt mr = rules_of<T>.mr;
   for (; m > 0; m -= mr, ap += ldap, c += mr) {
