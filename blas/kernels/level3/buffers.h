@@ -19,11 +19,12 @@ constexpr QtbInt page_bytes = 4096, region_boundary = 128, stage_offset = 256;
 constexpr QtbInt largest_depth = 256;
 
 // From the rounded end of A, or from the start where there is none, to where B may begin: the staging region, with room
-// for a micro-panel of B of the largest depth, each element doubled where a family's kernel does that.
+// for a micro-panel of B of the largest depth, each element doubled where a family's kernel does that. More where a
+// kernel asks for more.
 template <class T, Family family>
-constexpr QtbInt stage_room(QtbInt kb) {
+constexpr QtbInt stage_room(QtbInt kb, QtbInt stage_bytes) {
   if constexpr (this_tier == tier_avx && kind_of<T> == 'd') return kb * 128 + 768;
-  return family == Family::sse41 ? 8960 : 17152;
+  return larger(family == Family::sse41 ? 8960 : 17152, round_up(stage_offset + stage_bytes, region_boundary));
 }
 
 // What the boundaries of the regions cost at most, by the regions that are wanted.
@@ -57,13 +58,14 @@ inline std::uintptr_t up_to(std::uintptr_t address, QtbInt boundary) {
   return (address + step - 1) / step * step;
 }
 
-// A zero mb or nb: the region of A or of B is not wanted, and its pointer is of no use.
+// A zero mb or nb: the region of A or of B is not wanted, and its pointer is of no use. stage_bytes: what the kernel
+// wants for the largest depth.
 template <class T, Family family>
-GemmBuffers<T> get_buffers(QtbInt mb, QtbInt nb, QtbInt kb) {
+GemmBuffers<T> get_buffers(QtbInt mb, QtbInt nb, QtbInt kb, QtbInt stage_bytes) {
   const QtbInt a_bytes = mb == 0 ? 0 : a_region_bytes<T, family>(mb, kb);
   const QtbInt b_bytes = nb == 0 ? 0 : b_region_bytes<T, family>(nb, kb);
   const QtbInt slack = mb != 0 ? (nb != 0 ? slack_for_both : slack_for_a) : (nb != 0 ? slack_for_b : slack_for_none);
-  const QtbInt room = stage_room<T, family>(kb);
+  const QtbInt room = stage_room<T, family>(kb, stage_bytes);
   void *allocation = qtb_serv_malloc(static_cast<std::uint64_t>(a_bytes + b_bytes + room + slack), region_boundary);
   const std::uintptr_t start = reinterpret_cast<std::uintptr_t>(allocation), a = up_to(start, page_bytes);
   const std::uintptr_t end_of_a = up_to(mb == 0 ? start : a + static_cast<std::uintptr_t>(a_bytes), region_boundary);
