@@ -34,9 +34,13 @@ inline void prefetch(const double *p, int bytes) {
   return _mm256_insertf128_pd(_mm256_castpd128_pd256(_mm_load_pd(a)), _mm_load_pd(a + half_length), 1);
 }
 
+// The value is computed here: the order of the depth loop is the order in which it is written.
+[[gnu::always_inline]] inline void keep_in_order(__m256d &v) { __asm__ volatile("" : "+x"(v)); }
+
 [[gnu::always_inline]] inline void add_to(__m256d &sum, __m256d product) {
+  keep_in_order(product);
   sum = _mm256_add_pd(sum, product);
-  keep_in_place(sum);
+  keep_in_order(sum);
 }
 
 template <bool aligned>
@@ -53,34 +57,51 @@ struct Tile {
   __m256d upper[width], lower[width];
   __m256d carried_upper, carried_lower;  // products of the last column that are not yet in its sums
 
-  void clear() {
-    repeat<width>([&](auto j) { upper[j.value] = lower[j.value] = _mm256_setzero_pd(); });
+  [[gnu::always_inline]] void clear() {
+    repeat<width>([&](auto j)
+                      __attribute__((always_inline)) { upper[j.value] = lower[j.value] = _mm256_setzero_pd(); });
     carried_upper = carried_lower = _mm256_setzero_pd();
   }
 
-  void add_carried() {
+  [[gnu::always_inline]] void add_carried() {
     add_to(upper[width - 1], carried_upper);
     add_to(lower[width - 1], carried_lower);
   }
 
-  // += one k of A and B, but for the products of the last column.
-  void add_product(const double *a, const double *b) {
-    const __m256d upper_rows = load_rows(a), lower_rows = load_rows(a + vector_length);
-    add_carried();
-    repeat<width - 1>([&](auto j) {
-      const __m256d factor = _mm256_broadcast_sd(b + j.value);
-      add_to(upper[j.value], _mm256_mul_pd(factor, upper_rows));
-      add_to(lower[j.value], _mm256_mul_pd(factor, lower_rows));
+  // += ku steps of k, but for the last products. The rows of a step are loaded during the step before.
+  [[gnu::always_inline]] void add_turn(const double *a, const double *b) {
+    __m256d upper_rows = load_rows(a), lower_rows = load_rows(a + vector_length);
+    repeat<ku>([&](auto k) __attribute__((always_inline)) {
+      __m256d next_upper = upper_rows, next_lower = lower_rows;
+      add_carried();
+      repeat<width>([&](auto j) __attribute__((always_inline)) {
+        __m256d factor = _mm256_broadcast_sd(b + j.value);
+        keep_in_order(factor);
+        if constexpr (j.value + 1 < width) {
+          add_to(upper[j.value], _mm256_mul_pd(factor, upper_rows));
+          add_to(lower[j.value], _mm256_mul_pd(factor, lower_rows));
+        } else {
+          carried_upper = _mm256_mul_pd(factor, upper_rows);
+          carried_lower = _mm256_mul_pd(factor, lower_rows);
+        }
+        if constexpr (j.value == 0 && k.value + 1 < ku) {
+          a += mr;
+          next_upper = load_rows(a);
+          keep_in_order(next_upper);
+          next_lower = load_rows(a + vector_length);
+          keep_in_order(next_lower);
+        }
+      });
+      upper_rows = next_upper;
+      lower_rows = next_lower;
+      b += width;
     });
-    const __m256d factor = _mm256_broadcast_sd(b + width - 1);
-    carried_upper = _mm256_mul_pd(factor, upper_rows);
-    carried_lower = _mm256_mul_pd(factor, lower_rows);
   }
 
   // C += the tile, column by column.
   template <bool aligned>
-  void update(double *c, QtbInt ldc) const {
-    repeat<width>([&](auto j) {
+  [[gnu::always_inline]] void update(double *c, QtbInt ldc) const {
+    repeat<width>([&](auto j) __attribute__((always_inline)) {
       update_half_column<aligned>(c + j.value * ldc, upper[j.value]);
       update_half_column<aligned>(c + j.value * ldc + vector_length, lower[j.value]);
     });
@@ -100,7 +121,7 @@ template <int width, bool aligned>
     for (QtbInt k = 0; k < kp; k += ku, a += ku * mr, b += ku * width) {
       prefetch(a, prefetch_a_first);
       prefetch(a, prefetch_a_second);
-      repeat<ku>([&](auto l) { tile.add_product(a + l.value * mr, b + l.value * width); });
+      tile.add_turn(a, b);
     }
     tile.add_carried();
     tile.template update<aligned>(c, ldc);

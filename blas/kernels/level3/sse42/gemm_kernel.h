@@ -45,66 +45,86 @@ inline __m128d interleaved_low(__m128d a, __m128d b) { return _mm_unpacklo_pd(a,
 inline __m128 interleaved_high(__m128 a, __m128 b) { return _mm_unpackhi_ps(a, b); }
 inline __m128d interleaved_high(__m128d a, __m128d b) { return _mm_unpackhi_pd(a, b); }
 
-// The operand that one product takes from B, by what B is at this place. A vector of two real columns:
-template <class T, int width>
-[[gnu::always_inline]] inline Vec<T> load_pair(const Real<T> *b) {
-  if constexpr (is_complex<T>)
-    return load_aligned(b);
-  else if constexpr (lanes<T> > 2)
-    return load_repeated(reinterpret_cast<const Complex<T> *>(b));
-  else if constexpr (width % 2 == 0)
-    return load_aligned(b);
-  else
-    return load_unaligned(b);
-}
+// direct += rows*b, crossed += exchanged*b, b a vector of B: two columns of real elements, or one staged element of a
+// complex column. The last pair of a step may overwrite the rows, and loads b once.
+//
+// In assembly, because a compiler makes one load and a copy of the two loads, and what costs time in the depth loop are
+// copies, not loads (a quarter more than the multiplications and additions take, against a tenth); and because it lets
+// sums wander from register to register, so that they meet the end of the loop in memory.
+#define QTB_PAIR_OF_PRODUCTS(T, Loaded, load, mul, add)                                                            \
+  [[gnu::always_inline]] inline void add_pair(Vec<T> &direct, Vec<T> &crossed, Vec<T> rows, Vec<T> exchanged_rows, \
+                                              const T *b) {                                                        \
+    Vec<T> product;                                                                                                \
+    __asm__ volatile(load " %[b], %[p]\n\t" mul " %[r], %[p]\n\t" add " %[p], %[d]\n\t" load " %[b], %[p]\n\t" mul \
+                          " %[e], %[p]\n\t" add " %[p], %[c]"                                                      \
+                     : [d] "+x"(direct), [c] "+x"(crossed), [p] "=&x"(product)                                     \
+                     : [r] "x"(rows), [e] "x"(exchanged_rows), [b] "m"(*reinterpret_cast<const Loaded *>(b)));     \
+  }                                                                                                                \
+  [[gnu::always_inline]] inline void add_last_pair(Vec<T> &direct, Vec<T> &crossed, Vec<T> rows,                   \
+                                                   Vec<T> exchanged_rows, const T *b) {                            \
+    Vec<T> product;                                                                                                \
+    __asm__ volatile(load " %[b], %[p]\n\t" mul " %[p], %[r]\n\t" add " %[r], %[d]\n\t" mul " %[e], %[p]\n\t" add  \
+                          " %[p], %[c]"                                                                            \
+                     : [d] "+x"(direct), [c] "+x"(crossed), [r] "+x"(rows), [p] "=&x"(product)                     \
+                     : [e] "x"(exchanged_rows), [b] "m"(*reinterpret_cast<const Loaded *>(b)));                    \
+  }
+QTB_PAIR_OF_PRODUCTS(float, AnyAddress<double>, "movddup", "mulps", "addps")
+QTB_PAIR_OF_PRODUCTS(double, __m128d_u, "movupd", "mulpd", "addpd")
+QTB_PAIR_OF_PRODUCTS(cfloat, __m128_u, "movups", "mulps", "addps")
+QTB_PAIR_OF_PRODUCTS(cdouble, __m128d_u, "movupd", "mulpd", "addpd")
+#undef QTB_PAIR_OF_PRODUCTS
 
 // A tile of C, mr rows and width columns, as sums: of each two real columns or each complex column one of either kind;
 // of a real column without a neighbour the direct one alone, which is the column as it stands.
 template <class T, int width>
 struct Tile {
-  using R = Real<T>;
   using V = Vec<T>;
-  static constexpr int parts = static_cast<int>(lanes<R>);
   static constexpr int columns_per_pair = is_complex<T> ? 1 : 2;
   static constexpr int pairs = width / columns_per_pair, singles = width % columns_per_pair;
-  // Parts that one k takes: of A a vector, of a staged B a vector per column.
-  static constexpr QtbInt a_step = parts, b_step = is_complex<T> ? width * parts : width;
+  // What B holds of a pair, and what one k takes of A and of B, in elements: a staged column fills a vector.
+  static constexpr QtbInt pair_step = is_complex<T> ? lanes<T> : 2;
+  static constexpr QtbInt a_step = rules_of<T>.mr, b_step = pairs * pair_step + singles;
 
   V direct[pairs + singles], crossed[pairs + singles];
 
-  void clear() {
-    repeat<pairs + singles>([&](auto q) { direct[q.value] = crossed[q.value] = zero<T>(); });
+  [[gnu::always_inline]] void clear() {
+    repeat<pairs + singles>([&](auto q)
+                                __attribute__((always_inline)) { direct[q.value] = crossed[q.value] = zero<T>(); });
   }
 
-  // += one k. Each operand of B is loaded once and multiplied twice.
-  void add_product(const R *a, const R *b) {
-    V rows = load_aligned(a);
-    keep_in_place(rows);
-    const V exchanged_rows = exchanged(rows);
-    repeat<pairs>([&](auto q) {
-      V columns = load_pair<T, width>(b + q.value * (is_complex<T> ? parts : 2));
-      keep_in_place(columns);
-      add_to(direct[q.value], mul(columns, rows));
-      add_to(crossed[q.value], mul(columns, exchanged_rows));
-    });
-    if constexpr (singles != 0) add_to(direct[pairs], mul(broadcast(b[width - 1]), rows));
-  }
-
-  static void add_to(V &sum, V product) {
-    sum = add(sum, product);
-    keep_in_place(sum);
-  }
-
+  // += depth steps of k. The rows of a step are loaded and exchanged early in the step before.
   template <int depth>
-  void add_turn(const R *a, const R *b) {
-    repeat<depth>([&](auto k) { add_product(a + k.value * a_step, b + k.value * b_step); });
+  [[gnu::always_inline]] void add_turn(const T *a, const T *b) {
+    V rows = load_aligned(a), exchanged_rows = exchanged(rows);
+    repeat<depth>([&](auto k) __attribute__((always_inline)) {
+      V next_rows = rows, next_exchanged = exchanged_rows;
+      if constexpr (k.value + 1 < depth) {
+        a += a_step;
+        next_rows = load_aligned(a);
+        keep_in_place(next_rows);
+        next_exchanged = exchanged(next_rows);
+      }
+      repeat<pairs>([&](auto q) __attribute__((always_inline)) {
+        if constexpr (q.value + 1 < pairs + singles)
+          add_pair(direct[q.value], crossed[q.value], rows, exchanged_rows, b + q.value * pair_step);
+        else
+          add_last_pair(direct[q.value], crossed[q.value], rows, exchanged_rows, b + q.value * pair_step);
+      });
+      if constexpr (singles != 0) {
+        direct[pairs] = add(direct[pairs], mul(broadcast(b[width - 1]), rows));
+        keep_in_place(direct[pairs]);
+      }
+      rows = next_rows;
+      exchanged_rows = next_exchanged;
+      b += b_step;
+    });
   }
 
   // C += the tile, column by column.
   template <bool aligned>
-  void update(T *c, QtbInt ldc) const {
+  [[gnu::always_inline]] void update(T *c, QtbInt ldc) const {
     if constexpr (is_complex<T>) {
-      repeat<(width + 1) / 2>([&](auto q) {
+      repeat<(width + 1) / 2>([&](auto q) __attribute__((always_inline)) {
         constexpr int left = 2 * q.value, right = left + 1 < width ? left + 1 : left;
         const V re = pairwise_differences(direct[left], direct[right]);
         const V im = pairwise_sums(crossed[left], crossed[right]);
@@ -112,7 +132,7 @@ struct Tile {
         if constexpr (right != left) update_column<aligned>(c + right * ldc, interleaved_high(re, im));
       });
     } else {
-      repeat<pairs>([&](auto q) {
+      repeat<pairs>([&](auto q) __attribute__((always_inline)) {
         const V other = exchanged(crossed[q.value]);
         update_column<aligned>(c + 2 * q.value * ldc, even_odd(direct[q.value], other));
         update_column<aligned>(c + (2 * q.value + 1) * ldc, even_odd(other, direct[q.value]));
@@ -122,7 +142,7 @@ struct Tile {
   }
 
   template <bool aligned>
-  static void update_column(T *c, V sum) {
+  [[gnu::always_inline]] static void update_column(T *c, V sum) {
     if constexpr (!aligned)
       store_unaligned(c, add(sum, load_unaligned(c)));
     else if constexpr (is_complex<T>)
@@ -134,8 +154,8 @@ struct Tile {
 
 // The rows of A against one micro-panel of B.
 template <class T, int width, bool aligned>
-[[gnu::noinline, gnu::flatten]] void multiply_columns(QtbInt m, QtbInt kp, const T *ap, QtbInt ldap, const Real<T> *b,
-                                                      T *c, QtbInt ldc) {
+[[gnu::noinline, gnu::flatten]] void multiply_columns(QtbInt m, QtbInt kp, const T *ap, QtbInt ldap, const T *b, T *c,
+                                                      QtbInt ldc) {
   using Block = Tile<T, width>;
   constexpr QtbInt mr = rules_of<T>.mr;
   for (; m > 0; m -= mr, ap += ldap, c += mr) {
@@ -143,7 +163,7 @@ template <class T, int width, bool aligned>
     for (int j = 0; j < width; j++) _mm_prefetch(reinterpret_cast<const char *>(c + mr + j * ldc), _MM_HINT_T0);
     Block tile;
     tile.clear();
-    const Real<T> *a = parts(ap), *bk = b;
+    const T *a = ap, *bk = b;
     for (QtbInt turns = kp / turn_depth; turns > 0; turns--) {
       tile.template add_turn<turn_depth>(a, bk);
       a += turn_depth * Block::a_step;
@@ -157,14 +177,14 @@ template <class T, int width, bool aligned>
 // Every element of a micro-panel of B in a vector of its own: what fills one already, as it is.
 template <class T>
 void stage_columns(QtbInt elements, const T *bp, T *stage) {
-  for (QtbInt e = 0; e < elements; e++) store_aligned(parts(stage) + e * lanes<Real<T>>, load_repeated(bp + e));
+  for (QtbInt e = 0; e < elements; e++) store_aligned(stage + e * lanes<T>, load_repeated(bp + e));
 }
 
 template <class T, int width, bool aligned>
 void multiply_micro_panel(QtbInt m, QtbInt kp, const T *ap, QtbInt ldap, const T *bp, T *c, QtbInt ldc, T *stage) {
   if constexpr (is_complex<T>) {
     stage_columns(kp * width, bp, stage);
-    multiply_columns<T, width, aligned>(m, kp, ap, ldap, parts(stage), c, ldc);
+    multiply_columns<T, width, aligned>(m, kp, ap, ldap, stage, c, ldc);
   } else {
     multiply_columns<T, width, aligned>(m, kp, ap, ldap, bp, c, ldc);
   }
