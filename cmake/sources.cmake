@@ -41,6 +41,9 @@ set(QTB_KERNEL_SOURCES
 )
 
 # Compiled for some tiers only.
+set(QTB_KERNEL_SOURCES_ssse3
+  blas/kernels/level3/ssse3/gemm_kernel.cpp
+)
 set(QTB_KERNEL_SOURCES_sse42
   blas/kernels/level3/sse42/gemm_kernel.cpp
 )
@@ -48,7 +51,7 @@ set(QTB_KERNEL_SOURCES_avx
   blas/kernels/level3/avx/dgemm_kernel.cpp
   blas/kernels/level3/sse42/gemm_kernel.cpp
 )
-set(qtb_tier_sources ${QTB_KERNEL_SOURCES_sse42} ${QTB_KERNEL_SOURCES_avx})
+set(qtb_tier_sources ${QTB_KERNEL_SOURCES_ssse3} ${QTB_KERNEL_SOURCES_sse42} ${QTB_KERNEL_SOURCES_avx})
 # Of these, the ones in the wider encoding: tests/product/mnemonics/vex_objects.txt has the same list.
 set(QTB_WIDE_KERNEL_SOURCES
   blas/kernels/level3/avx/dgemm_kernel.cpp

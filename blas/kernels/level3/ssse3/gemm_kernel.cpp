@@ -1,8 +1,4 @@
 // The inner kernels of the ssse3 tier by name.
-#include "blas/kernels/kernel.h"
-
-#if QTB_TIER_IS(ssse3)
-
 #include "blas/kernels/level3/ssse3/gemm_kernel.h"
 
 namespace qtb::QTB_TIER {
@@ -55,5 +51,3 @@ SSE41_KERNELS(cgemm, cfloat)
 SSE41_KERNELS(zgemm, cdouble)
 
 }  // namespace qtb::QTB_TIER
-
-#endif

@@ -124,8 +124,8 @@ struct Replicated : StagedOperands<T, columns> {
   static constexpr const auto &orders = Orders<Real<T>>::each_lane;
 
   static void finish(const Grid<T, columns * parts_of<T>, row_vectors> &sums, Grid<T, columns, row_vectors> &c) {
-    repeat<columns>([&](auto j) __attribute__((always_inline)) {
-      repeat<row_vectors>([&](auto i) __attribute__((always_inline)) {
+    repeat<columns>([&](auto j) {
+      repeat<row_vectors>([&](auto i) {
         if constexpr (is_complex<T>)
           c.at[j.value][i.value] =
               add_subtract(sums.at[2 * j.value][i.value], exchanged(sums.at[2 * j.value + 1][i.value]));
@@ -143,15 +143,15 @@ struct StagedPairs : StagedOperands<T, columns> {
 
   static void finish(const Grid<T, columns * parts_of<T>, row_vectors> &sums, Grid<T, columns, row_vectors> &c) {
     if constexpr (is_complex<T>) {
-      repeat<columns>([&](auto j) __attribute__((always_inline)) {
+      repeat<columns>([&](auto j) {
         const V re = neighbour_differences(sums.at[2 * j.value][0], sums.at[2 * j.value][1]);
         const V im = neighbour_sums(sums.at[2 * j.value + 1][0], sums.at[2 * j.value + 1][1]);
         c.at[j.value][0] = interleaved_low(re, im);
         c.at[j.value][1] = interleaved_high(re, im);
       });
     } else {
-      repeat<columns / 2>([&](auto q) __attribute__((always_inline)) {
-        repeat<row_vectors>([&](auto i) __attribute__((always_inline)) {
+      repeat<columns / 2>([&](auto q) {
+        repeat<row_vectors>([&](auto i) {
           const V direct = sums.at[2 * q.value][i.value], crossed = sums.at[2 * q.value + 1][i.value];
           c.at[2 * q.value][i.value] = even_odd(direct, crossed);
           c.at[2 * q.value + 1][i.value] = even_odd(crossed, direct);
@@ -184,8 +184,8 @@ struct ShuffledPairs {
     return {upper, lower, exchanged(upper), exchanged(lower)};
   }
   static void finish(const Grid<double, operands, row_forms> &sums, Grid<double, columns, row_vectors> &c) {
-    repeat<row_vectors>([&](auto i) __attribute__((always_inline)) {
-      repeat<pairs>([&](auto q) __attribute__((always_inline)) {
+    repeat<row_vectors>([&](auto i) {
+      repeat<pairs>([&](auto q) {
         const V direct = sums.at[q.value][i.value], crossed = exchanged(sums.at[q.value][row_vectors + i.value]);
         c.at[2 * q.value][i.value] = even_odd(direct, crossed);
         c.at[2 * q.value + 1][i.value] = even_odd(crossed, direct);
@@ -218,16 +218,14 @@ void stage_panel(QtbInt count, const R *bp, R *stage) {
   constexpr int step = static_cast<int>(lanes<R>), vectors_per_line = static_cast<int>(line_bytes / vector_bytes);
   const auto stage_vector = [&](QtbInt e) {
     const auto v = load_aligned(bp + e);
-    repeat<step>([&](auto s) __attribute__((always_inline)) {
-      store_aligned(stage + (e + s.value) * step, reordered<Scheme::orders[s.value]>(v));
-    });
+    repeat<step>([&](auto s) { store_aligned(stage + (e + s.value) * step, reordered<Scheme::orders[s.value]>(v)); });
   };
   QtbInt e = 0;
   for (; e + vectors_per_line * step <= count; e += vectors_per_line * step) {
     prefetch<_MM_HINT_NTA>(bp + e, panel_ahead_bytes);
     for (int line = 0; line < step; line++)
       prefetch<_MM_HINT_T0>(stage + e * step, stage_ahead_bytes + line * line_bytes);
-    repeat<vectors_per_line>([&](auto v) __attribute__((always_inline)) { stage_vector(e + v.value * step); });
+    repeat<vectors_per_line>([&](auto v) { stage_vector(e + v.value * step); });
   }
   for (; e < count; e += step) stage_vector(e);
 }
@@ -237,9 +235,8 @@ template <int width, class R>
 void stage_in_place(QtbInt depth, QtbInt kp, const R *b, QtbInt row_step, QtbInt column_step, R *stage) {
   constexpr int step = static_cast<int>(lanes<R>);
   for (QtbInt l = 0; l < depth; l++, b += row_step, stage += width * step)
-    repeat<width>([&](auto j) __attribute__((always_inline)) {
-      store_aligned(stage + j.value * step, broadcast(load_single(b + j.value * column_step)));
-    });
+    repeat<width>(
+        [&](auto j) { store_aligned(stage + j.value * step, broadcast(load_single(b + j.value * column_step))); });
   for (QtbInt i = depth * width; i < kp * width; i++, stage += step) store_aligned(stage, zero<R>());
 }
 
@@ -254,12 +251,12 @@ constexpr QtbInt c_ahead_bytes = family == Family::sse41 ? 32 : 40;
 template <class Scheme, class R, class T, int operands, int forms>
 [[gnu::always_inline]] inline void multiply_add_line(const R *a, const R *b, Grid<T, operands, forms> &sums) {
   prefetch<_MM_HINT_T0>(a, rows_ahead_bytes);
-  repeat<2>([&](auto k) __attribute__((always_inline)) {
+  repeat<2>([&](auto k) {
     const RowVectors<T, forms> rows = Scheme::load_rows(a + k.value * row_vectors * static_cast<int>(lanes<R>));
-    repeat<operands>([&](auto j) __attribute__((always_inline)) {
+    repeat<operands>([&](auto j) {
       Vec<T> operand = Scheme::template load_b<j.value>(b + k.value * Scheme::b_step);
       keep_in_place(operand);
-      repeat<Scheme::products(j.value)>([&](auto i) __attribute__((always_inline)) {
+      repeat<Scheme::products(j.value)>([&](auto i) {
         Vec<T> &sum = sums.at[j.value][i.value];
         sum = add(sum, mul(operand, rows.at[i.value]));
         keep_in_place(sum);
@@ -271,30 +268,27 @@ template <class Scheme, class R, class T, int operands, int forms>
 // The rows of A against the operands of one micro-panel. fixed_lines > 0: of that many lines, in straight-line code;
 // otherwise each turn takes the least depth that kp is a multiple of.
 template <class T, Family family, int width, bool aligned, int fixed_lines>
-[[gnu::noinline]] void multiply_rows(QtbInt m, QtbInt kp, const T *ap, QtbInt ldap, const Real<T> *b, T *c,
-                                     QtbInt ldc) {
+[[gnu::noinline, gnu::flatten]] void multiply_rows(QtbInt m, QtbInt kp, const T *ap, QtbInt ldap, const Real<T> *b,
+                                                   T *c, QtbInt ldc) {
   using Scheme = SchemeOf<T, family, width>;
   using R = Real<T>;
   constexpr GemmRules rules = rules_of<T, family>;
   constexpr int lines_per_turn = static_cast<int>(rules.ku) / 2, step = static_cast<int>(lanes<R>);
   constexpr QtbInt line = line_bytes / static_cast<QtbInt>(sizeof(R));
   for (; m > 0; m -= rules.mr, ap += ldap, c += rules.mr) {
-    repeat<width>([&](auto j) __attribute__((always_inline)) {
+    repeat<width>([&](auto j) {
       prefetch<(family == Family::sse41 ? _MM_HINT_NTA : _MM_HINT_T0)>(c + j.value * ldc, c_ahead_bytes<family>);
     });
     Grid<T, Scheme::operands, Scheme::row_forms> sums;
-    repeat<Scheme::operands>([&](auto j) __attribute__((always_inline)) {
-      repeat<Scheme::products(j.value)>([&](auto i)
-                                            __attribute__((always_inline)) { sums.at[j.value][i.value] = zero<T>(); });
-    });
+    repeat<Scheme::operands>(
+        [&](auto j) { repeat<Scheme::products(j.value)>([&](auto i) { sums.at[j.value][i.value] = zero<T>(); }); });
     const R *a = parts(ap), *operand = b;
     if constexpr (fixed_lines > 0) {
-      repeat<fixed_lines>([&](auto l) __attribute__((always_inline)) {
-        multiply_add_line<Scheme>(a + l.value * line, operand + l.value * 2 * Scheme::b_step, sums);
-      });
+      repeat<fixed_lines>(
+          [&](auto l) { multiply_add_line<Scheme>(a + l.value * line, operand + l.value * 2 * Scheme::b_step, sums); });
     } else {
       for (QtbInt left = kp; left > 0; left -= rules.ku) {
-        repeat<lines_per_turn>([&](auto l) __attribute__((always_inline)) {
+        repeat<lines_per_turn>([&](auto l) {
           multiply_add_line<Scheme>(a + l.value * line, operand + l.value * 2 * Scheme::b_step, sums);
         });
         a += lines_per_turn * line;
@@ -303,9 +297,9 @@ template <class T, Family family, int width, bool aligned, int fixed_lines>
     }
     Grid<T, width, row_vectors> columns;
     Scheme::finish(sums, columns);
-    repeat<width>([&](auto j) __attribute__((always_inline)) {
+    repeat<width>([&](auto j) {
       R *column = parts(c + j.value * ldc);
-      repeat<row_vectors>([&](auto i) __attribute__((always_inline)) {
+      repeat<row_vectors>([&](auto i) {
         R *p = column + i.value * step;
         if constexpr (!aligned)
           store_unaligned(p, add(columns.at[j.value][i.value], load_unaligned(p)));
@@ -333,16 +327,15 @@ void multiply_panels(QTB_INNER_KERNEL_PARAMS(T)) {
   constexpr int nr = static_cast<int>(rules_of<T, family>.nr);
   for (QtbInt width; n > 0; n -= width, bp += ldbp, c += width * ldc) {
     width = panel_width(nr, n);
-    with_width<nr>(
-        width, [&](auto w) __attribute__((always_inline)) {
-          using Scheme = SchemeOf<T, family, w.value>;
-          const Real<T> *b = parts(bp);
-          if constexpr (Scheme::staged) {
-            stage_panel<Scheme>(kp * w.value * parts_of<T>, b, parts(stage));
-            b = parts(stage);
-          }
-          multiply_rows<T, family, w.value, aligned, fixed_lines>(m, kp, ap, ldap, b, c, ldc);
-        });
+    with_width<nr>(width, [&](auto w) {
+      using Scheme = SchemeOf<T, family, w.value>;
+      const Real<T> *b = parts(bp);
+      if constexpr (Scheme::staged) {
+        stage_panel<Scheme>(kp * w.value * parts_of<T>, b, parts(stage));
+        b = parts(stage);
+      }
+      multiply_rows<T, family, w.value, aligned, fixed_lines>(m, kp, ap, ldap, b, c, ldc);
+    });
   }
 }
 
@@ -353,11 +346,10 @@ void multiply_in_place(QTB_IN_PLACE_KERNEL_PARAMS(T)) {
   const QtbInt kp = round_up(depth, rules.ku), row_step = transb ? ldb : 1, column_step = transb ? 1 : ldb;
   for (QtbInt width; n > 0; n -= width, b += width * column_step, c += width * ldc) {
     width = panel_width(nr, n);
-    with_width<nr>(
-        width, [&](auto w) __attribute__((always_inline)) {
-          stage_in_place<w.value>(depth, kp, b, row_step, column_step, stage);
-          multiply_rows<T, Family::base, w.value, aligned, 0>(m, kp, ap, ldap, stage, c, ldc);
-        });
+    with_width<nr>(width, [&](auto w) {
+      stage_in_place<w.value>(depth, kp, b, row_step, column_step, stage);
+      multiply_rows<T, Family::base, w.value, aligned, 0>(m, kp, ap, ldap, stage, c, ldc);
+    });
   }
 }
 
