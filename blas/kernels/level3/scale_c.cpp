@@ -22,21 +22,24 @@ template <class T, class F, class G>
 template <class T>
 QTB_FUNCTION(scale_c, T, scale_c) {
   if (is_one(*beta)) return;
+  // Columns without a gap are one long column.
+  const bool gapless = *ldc == *m && *n > 0;
+  const QtbInt rows = gapless ? *m * *n : *m, columns = gapless ? 1 : *n;
   if (is_zero(*beta)) {
     const Vec<T> zeros = zero<T>();
-    for (QtbInt j = 0; j < *n; j++) {
+    for (QtbInt j = 0; j < columns; j++) {
       T *column = c + j * *ldc;
       walk_column(
-          *m, column, [&](QtbInt i) { store_unaligned(column + i, zeros); },
+          rows, column, [&](QtbInt i) { store_unaligned(column + i, zeros); },
           [&](QtbInt i) { store_lowest(column + i, zeros); });
     }
     return;
   }
   const Factor<T> factor(*beta);
-  for (QtbInt j = 0; j < *n; j++) {
+  for (QtbInt j = 0; j < columns; j++) {
     T *column = c + j * *ldc;
     walk_column(
-        *m, column, [&](QtbInt i) { store_unaligned(column + i, factor.times(load_unaligned(column + i))); },
+        rows, column, [&](QtbInt i) { store_unaligned(column + i, factor.times(load_unaligned(column + i))); },
         [&](QtbInt i) {
           if constexpr (is_complex<T>)
             store_lowest(column + i, factor.times(load_repeated(column + i)));

@@ -202,7 +202,7 @@ struct DotSum {
     direct = add(direct, mul(x, y));
     if constexpr (is_complex<T>) crossed = add(crossed, mul(x, y_crossed));
   }
-  T total(bool x_conjugated, bool y_conjugated) const {
+  T total(bool x_conjugated) const {
     if constexpr (!is_complex<T>) {
       return sum_lanes(direct);
     } else {
@@ -217,9 +217,10 @@ struct DotSum {
         re_im += s[i];
         im_re += s[i + 1];
       }
-      if (x_conjugated != y_conjugated) im_im = -im_im;
-      if (y_conjugated) re_im = -re_im;
-      if (x_conjugated) im_re = -im_re;
+      if (x_conjugated) {
+        im_im = -im_im;
+        im_re = -im_re;
+      }
       return {re_re - im_im, re_im + im_re};
     }
   }
@@ -227,8 +228,8 @@ struct DotSum {
 
 // x has rows columns ldx apart, y has columns columns ldy apart, all of them k long.
 template <int rows, int columns, class T>
-void dot_tile(QtbInt k, const T *x, QtbInt ldx, bool x_conjugated, const T *y, QtbInt ldy, bool y_conjugated,
-              const Finish<T> &finish, T *c, QtbInt ldc) {
+void dot_tile(QtbInt k, const T *x, QtbInt ldx, bool x_conjugated, const T *y, QtbInt ldy, const Finish<T> &finish,
+              T *c, QtbInt ldc) {
   DotSum<T> sum[rows][columns];
   const auto step = [&](auto load) {
     Vec<T> a[rows];
@@ -247,20 +248,19 @@ void dot_tile(QtbInt k, const T *x, QtbInt ldx, bool x_conjugated, const T *y, Q
   repeat<columns>([&](auto j) {
     repeat<rows>([&](auto i) {
       T *to = c + i.value + j.value * ldc;
-      *to = finish_one(finish, sum[i.value][j.value].total(x_conjugated, y_conjugated), to);
+      *to = finish_one(finish, sum[i.value][j.value].total(x_conjugated), to);
     });
   });
 }
 
 template <int rows, class T>
-void dot_rows(QtbInt n, QtbInt k, const T *x, QtbInt ldx, bool x_conjugated, const T *y, QtbInt ldy, bool y_conjugated,
+void dot_rows(QtbInt n, QtbInt k, const T *x, QtbInt ldx, bool x_conjugated, const T *y, QtbInt ldy,
               const Finish<T> &finish, T *c, QtbInt ldc) {
   constexpr int at_once = is_complex<T> ? 2 : 4;
   QtbInt j = 0;
   for (; j + at_once <= n; j += at_once)
-    dot_tile<rows, at_once>(k, x, ldx, x_conjugated, y + j * ldy, ldy, y_conjugated, finish, c + j * ldc, ldc);
-  for (; j < n; j++)
-    dot_tile<rows, 1>(k, x, ldx, x_conjugated, y + j * ldy, ldy, y_conjugated, finish, c + j * ldc, ldc);
+    dot_tile<rows, at_once>(k, x, ldx, x_conjugated, y + j * ldy, ldy, finish, c + j * ldc, ldc);
+  for (; j < n; j++) dot_tile<rows, 1>(k, x, ldx, x_conjugated, y + j * ldy, ldy, finish, c + j * ldc, ldc);
 }
 
 template <class T>
@@ -285,8 +285,8 @@ QTB_FUNCTION(gemm, T, small) {
   } else {
     QtbInt i = 0;
     for (; i + 2 <= rows; i += 2)
-      dot_rows<2>(columns, depth, a + i * *lda, *lda, a_conjugated, b, *ldb, false, finish, c + i, *ldc);
-    if (i < rows) dot_rows<1>(columns, depth, a + i * *lda, *lda, a_conjugated, b, *ldb, false, finish, c + i, *ldc);
+      dot_rows<2>(columns, depth, a + i * *lda, *lda, a_conjugated, b, *ldb, finish, c + i, *ldc);
+    if (i < rows) dot_rows<1>(columns, depth, a + i * *lda, *lda, a_conjugated, b, *ldb, finish, c + i, *ldc);
   }
 }
 
