@@ -16,12 +16,6 @@ namespace {
 constexpr double measure_seconds = 0.02;
 constexpr int measure_times = 7;  // the best of so many: a limit is what the core does undisturbed
 
-// Keeps a value in a register and hides from the compiler what is done with it.
-template <class V>
-inline void pin(V &v) {
-  asm volatile("" : "+x"(v));
-}
-
 template <class Run>
 double best_rate(Run &&run, double work_per_call) {
   const long count = calibrate(run, measure_seconds);
@@ -30,70 +24,45 @@ double best_rate(Run &&run, double work_per_call) {
   return work_per_call / best;
 }
 
-constexpr int chains = 7;  // of each kind: fourteen registers, two left for the operands
+// Sixteen registers, each its own chain: products of ones and sums of zeros, in turn, so that both kinds of units are
+// full and no value ever changes.
+#define QTB_PAIR(type, a, b) "mul" type " %%xmm" #a ", %%xmm" #a "\n\tadd" type " %%xmm" #b ", %%xmm" #b "\n\t"
+#define QTB_ARITHMETIC(type)                                                                                   \
+  QTB_PAIR(type, 0, 8)                                                                                         \
+  QTB_PAIR(type, 1, 9) QTB_PAIR(type, 2, 10) QTB_PAIR(type, 3, 11) QTB_PAIR(type, 4, 12) QTB_PAIR(type, 5, 13) \
+      QTB_PAIR(type, 6, 14) QTB_PAIR(type, 7, 15)
+#define QTB_CLOBBERED                                                                                                 \
+  "xmm0", "xmm1", "xmm2", "xmm3", "xmm4", "xmm5", "xmm6", "xmm7", "xmm8", "xmm9", "xmm10", "xmm11", "xmm12", "xmm13", \
+      "xmm14", "xmm15"
+
+constexpr double instructions = 16;  // per pass of each loop
+
+// What the registers hold is of no matter as long as it is neither subnormal nor NaN: all are set to zero first.
+#define QTB_CLEAR(r) "xorps %%xmm" #r ", %%xmm" #r "\n\t"
+#define QTB_CLEAR_ALL                                                                                                  \
+  QTB_CLEAR(0)                                                                                                         \
+  QTB_CLEAR(1) QTB_CLEAR(2) QTB_CLEAR(3) QTB_CLEAR(4) QTB_CLEAR(5) QTB_CLEAR(6) QTB_CLEAR(7) QTB_CLEAR(8) QTB_CLEAR(9) \
+      QTB_CLEAR(10) QTB_CLEAR(11) QTB_CLEAR(12) QTB_CLEAR(13) QTB_CLEAR(14) QTB_CLEAR(15)
+
+#define QTB_LOOP(body) ".p2align 6\n1:\n\t" body "dec %0\n\tjnz 1b"
 
 void double_loop(long count) {
-  __m128d product[chains], sum[chains];
-#pragma GCC unroll 8
-  for (int i = 0; i < chains; ++i) product[i] = sum[i] = _mm_set1_pd(1.0);
-  __m128d factor = _mm_set1_pd(1.0), term = _mm_set1_pd(1e-30);
-  for (long n = 0; n < count; ++n) {
-    pin(factor);
-    pin(term);
-#pragma GCC unroll 8
-    for (int i = 0; i < chains; ++i) {
-      product[i] = _mm_mul_pd(product[i], factor);
-      sum[i] = _mm_add_pd(sum[i], term);
-      pin(product[i]);
-      pin(sum[i]);
-    }
-  }
+  asm volatile(QTB_CLEAR_ALL QTB_LOOP(QTB_ARITHMETIC("pd")) : "+r"(count) : : QTB_CLOBBERED);
 }
-
 void single_loop(long count) {
-  __m128 product[chains], sum[chains];
-#pragma GCC unroll 8
-  for (int i = 0; i < chains; ++i) product[i] = sum[i] = _mm_set1_ps(1.0F);
-  __m128 factor = _mm_set1_ps(1.0F), term = _mm_set1_ps(1e-30F);
-  for (long n = 0; n < count; ++n) {
-    pin(factor);
-    pin(term);
-#pragma GCC unroll 8
-    for (int i = 0; i < chains; ++i) {
-      product[i] = _mm_mul_ps(product[i], factor);
-      sum[i] = _mm_add_ps(sum[i], term);
-      pin(product[i]);
-      pin(sum[i]);
-    }
-  }
+  asm volatile(QTB_CLEAR_ALL QTB_LOOP(QTB_ARITHMETIC("ps")) : "+r"(count) : : QTB_CLOBBERED);
 }
 
-constexpr int block_vectors = 512;  // 8 KiB, well inside any first-level cache
-constexpr int unroll = 16;
+alignas(64) char block[256];
 
-alignas(64) __m128d block[block_vectors];
+#define QTB_LOAD(at, r) "movaps " #at "(%1), %%xmm" #r "\n\t"
+#define QTB_STORE(at, r) "movaps %%xmm" #r ", " #at "(%1)\n\t"
+#define QTB_BLOCK(move)                                                                                        \
+  move(0, 0) move(16, 1) move(32, 2) move(48, 3) move(64, 4) move(80, 5) move(96, 6) move(112, 7) move(128, 8) \
+      move(144, 9) move(160, 10) move(176, 11) move(192, 12) move(208, 13) move(224, 14) move(240, 15)
 
-void load_loop(long count) {
-  for (long n = 0; n < count; ++n) {
-    for (int i = 0; i < block_vectors; i += unroll) {
-#pragma GCC unroll 16
-      for (int j = 0; j < unroll; ++j) {
-        __m128d v;
-        asm volatile("movaps %1, %0" : "=x"(v) : "m"(block[i + j]));
-      }
-    }
-  }
-}
-
-void store_loop(long count) {
-  const __m128d v = _mm_setzero_pd();
-  for (long n = 0; n < count; ++n) {
-    for (int i = 0; i < block_vectors; i += unroll) {
-#pragma GCC unroll 16
-      for (int j = 0; j < unroll; ++j) asm volatile("movaps %1, %0" : "=m"(block[i + j]) : "x"(v));
-    }
-  }
-}
+void load_loop(long count) { asm volatile(QTB_LOOP(QTB_BLOCK(QTB_LOAD)) : "+r"(count) : "r"(block) : QTB_CLOBBERED); }
+void store_loop(long count) { asm volatile(QTB_LOOP(QTB_BLOCK(QTB_STORE)) : "+r"(count) : "r"(block) : "memory"); }
 
 void copy_vectors(const __m128i *from, __m128i *to, std::size_t count) {
   for (std::size_t i = 0; i < count; i += 4) {
@@ -110,10 +79,10 @@ void copy_vectors(const __m128i *from, __m128i *to, std::size_t count) {
 
 CoreLimits measure_core_limits() {
   CoreLimits limits{};
-  limits.double_flops = best_rate(double_loop, chains * 2.0 * 2.0);
-  limits.single_flops = best_rate(single_loop, chains * 2.0 * 4.0);
-  limits.load_rate = best_rate(load_loop, block_vectors);
-  limits.store_rate = best_rate(store_loop, block_vectors);
+  limits.double_flops = best_rate(double_loop, instructions * 2);
+  limits.single_flops = best_rate(single_loop, instructions * 4);
+  limits.load_rate = best_rate(load_loop, instructions);
+  limits.store_rate = best_rate(store_loop, instructions);
   return limits;
 }
 

@@ -52,18 +52,12 @@ struct Layout {
   bool stores(QtbInt i, QtbInt j) const { return i - j <= below && j - i <= above; }
   QtbInt position(QtbInt i, QtbInt j) const {
     switch (form) {
-      case Form::full:
-        return i + j * step;
-      case Form::band:
-        return above + i - j + j * step;
-      case Form::packed_upper:
-        return i + j * (j + 1) / 2;
-      case Form::packed_lower:
-        return i + j * (2 * rows - j - 1) / 2;
-      case Form::strided:
-        return step >= 0 ? i * step : (i - (rows - 1)) * step;
-      case Form::indexed:
-        return index[i] - 1;
+      case Form::full: return i + j * step;
+      case Form::band: return above + i - j + j * step;
+      case Form::packed_upper: return i + j * (j + 1) / 2;
+      case Form::packed_lower: return i + j * (2 * rows - j - 1) / 2;
+      case Form::strided: return step >= 0 ? i * step : (i - (rows - 1)) * step;
+      case Form::indexed: return index[i] - 1;
     }
     return 0;
   }

@@ -19,6 +19,7 @@
 #include <vector>
 
 #include "blas/dispatch/slots.h"
+#include "blas/thread/floating_state.h"
 #include "service/memory.h"
 #include "tests/support/bounds.h"
 #include "tests/support/guarded.h"
@@ -606,6 +607,28 @@ TEST_F(Level1Drivers, SeveralApplicationThreadsCallAtOnce) {
     });
   for (std::thread &caller : callers) caller.join();
   EXPECT_EQ(wrong, 0);
+}
+
+// The threads of the runtime are made by the first call, in the default state.
+TEST_F(Level1Drivers, CallersRoundingAndFlushToZeroHoldOnEveryThread) {
+  constexpr int team = 4;
+  const Problem p = {4099, 1, 1, Flush::back, 0, 0, 11};
+  tier_under_test = one_tier;
+  const unsigned saved = _mm_getcsr();
+  for_each_level1_routine([&]<class T>(const Level1Routine<T> &r) {
+    if (r.is_dot()) return;
+    ASSERT_TRUE(equals_serial(r, one_tier, team, p)) << r.name;
+    for (const unsigned mode : {_MM_ROUND_DOWN, _MM_ROUND_UP, _MM_ROUND_TOWARD_ZERO, _MM_FLUSH_ZERO_ON}) {
+      _mm_setcsr(saved | mode);
+      const bool equal = equals_serial(r, one_tier, team, p);
+      _mm_setcsr(saved);
+      EXPECT_TRUE(equal) << r.name << " with state " << mode;
+    }
+  });
+  int changed = 0;
+#pragma omp parallel num_threads(team) reduction(+ : changed)
+  changed += (_mm_getcsr() & ~qtb::floating_flags) != (saved & ~qtb::floating_flags);
+  EXPECT_EQ(changed, 0) << "a thread did not get its own state back";
 }
 
 TEST_F(Level1Drivers, SameTeamTierAndAlignmentGiveTheSameBitsUnderLoad) {

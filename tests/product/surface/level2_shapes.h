@@ -8,9 +8,7 @@
 namespace qtb::surface {
 
 using reference::is_letter;
-
-template <class T>
-inline constexpr Structure hermitian_or_symmetric = is_complex<T> ? Structure::hermitian : Structure::symmetric;
+using reference::symmetric_or_hermitian;
 
 // y := alpha*op(A)*x + beta*y. call(a, x, y) makes the call, want() gives the expectation.
 template <class T, class Call, class Want>
@@ -57,7 +55,7 @@ template <class T, class R>
 void run(Shape<"symv">, const R &routine, const Problem &p, Session &s) {
   const QtbInt lda = p.leading(0, p.n);
   test_matrix_vector<T>(
-      p, s, reference::triangle(p.uplo, p.n, lda), hermitian_or_symmetric<T>, true,
+      p, s, reference::triangle(p.uplo, p.n, lda), symmetric_or_hermitian<T>, true,
       [&](const T *alpha, const T *a, const T *x, const T *beta, T *y) {
         s.call(routine, &p.uplo, &p.n, alpha, a, &lda, x, &p.incx, beta, y, &p.incy);
       },
@@ -70,7 +68,7 @@ template <class T, class R>
 void run(Shape<"sbmv">, const R &routine, const Problem &p, Session &s) {
   const QtbInt lda = p.leading(0, p.kl + 1);
   test_matrix_vector<T>(
-      p, s, reference::band_triangle(p.uplo, p.n, p.kl, lda), hermitian_or_symmetric<T>, true,
+      p, s, reference::band_triangle(p.uplo, p.n, p.kl, lda), symmetric_or_hermitian<T>, true,
       [&](const T *alpha, const T *a, const T *x, const T *beta, T *y) {
         s.call(routine, &p.uplo, &p.n, &p.kl, alpha, a, &lda, x, &p.incx, beta, y, &p.incy);
       },
@@ -82,7 +80,7 @@ void run(Shape<"sbmv">, const R &routine, const Problem &p, Session &s) {
 template <class T, class R>
 void run(Shape<"spmv">, const R &routine, const Problem &p, Session &s) {
   test_matrix_vector<T>(
-      p, s, reference::packed_triangle(p.uplo, p.n), hermitian_or_symmetric<T>, true,
+      p, s, reference::packed_triangle(p.uplo, p.n), symmetric_or_hermitian<T>, true,
       [&](const T *alpha, const T *a, const T *x, const T *beta, T *y) {
         s.call(routine, &p.uplo, &p.n, alpha, a, x, &p.incx, beta, y, &p.incy);
       },
@@ -98,7 +96,7 @@ void test_rank_one(const Problem &p, Session &s, const Layout &layout, Call call
   Operand<T> x(reference::strided(p.n, p.incx), draw), a(layout, draw);
   const Real<T> alpha = scalar<Real<T>>(p.alpha);
   prepare_input(x, Structure::general, p, draw, !is_zero(alpha));
-  prepare_output(a, hermitian_or_symmetric<T>, p, draw, true);
+  prepare_output(a, symmetric_or_hermitian<T>, p, draw, true);
   call(&alpha, x.data(), a.data());
   s.judge(a, reference::rank_one(layout, alpha, x.before(), p.incx, a.before()));
 }
@@ -157,7 +155,7 @@ template <class T, class R>
 void run(Shape<"syr2">, const R &routine, const Problem &p, Session &s) {
   const QtbInt lda = p.leading(0, p.n);
   test_two_vectors<T>(
-      p, s, reference::triangle(p.uplo, p.n, lda), hermitian_or_symmetric<T>,
+      p, s, reference::triangle(p.uplo, p.n, lda), symmetric_or_hermitian<T>,
       [&](const T *alpha, const T *x, const T *y, T *a) {
         s.call(routine, &p.uplo, &p.n, alpha, x, &p.incx, y, &p.incy, a, &lda);
       },
@@ -169,7 +167,7 @@ void run(Shape<"syr2">, const R &routine, const Problem &p, Session &s) {
 template <class T, class R>
 void run(Shape<"spr2">, const R &routine, const Problem &p, Session &s) {
   test_two_vectors<T>(
-      p, s, reference::packed_triangle(p.uplo, p.n), hermitian_or_symmetric<T>,
+      p, s, reference::packed_triangle(p.uplo, p.n), symmetric_or_hermitian<T>,
       [&](const T *alpha, const T *x, const T *y, T *a) {
         s.call(routine, &p.uplo, &p.n, alpha, x, &p.incx, y, &p.incy, a);
       },

@@ -89,13 +89,10 @@ class Operand {
 
   static std::size_t draw_offset(Draw &draw) {
     switch (draw.integer(0, 7)) {
-      case 0:
-        return static_cast<std::size_t>(draw.integer(1, 63));
+      case 0: return static_cast<std::size_t>(draw.integer(1, 63));
       case 1:
-      case 2:
-        return sizeof(Part) * static_cast<std::size_t>(draw.integer(1, 15));
-      default:
-        return 0;
+      case 2: return sizeof(Part) * static_cast<std::size_t>(draw.integer(1, 15));
+      default: return 0;
     }
   }
   std::size_t lead() const { return flush_ == test::Flush::front ? offset_ : 0; }

@@ -94,8 +94,8 @@ struct Problem {
 
 // Factors: the ones that routines treat apart, in both parts, and others.
 inline Scalar draw_scalar(Draw &draw, Values values) {
-  static constexpr Scalar special[] = {{0, 0}, {1, 0}, {-1, 0}, {0, 1}, {1, 1}, {0, -2}, {2, 0}};
-  static constexpr Scalar powers_of_two[] = {{0, 0}, {1, 0}, {-1, 0}, {0, 1}, {0, -2}, {2, 0}, {-4, 0}};
+  static constexpr Scalar special[] = {{0, 0}, {1, 0}, {0, 0}, {1, 0}, {-1, 0}, {0, 1}, {1, 1}, {0, -2}};
+  static constexpr Scalar powers_of_two[] = {{0, 0}, {1, 0}, {1, 0}, {-1, 0}, {0, 1}, {0, -2}, {2, 0}, {-4, 0}};
   if (values == Values::exact) return draw.one_of(powers_of_two);
   if (draw.one_in(2)) return draw.one_of(special);
   return {draw.real() * 2, draw.real() * 2};
@@ -103,7 +103,8 @@ inline Scalar draw_scalar(Draw &draw, Values values) {
 
 // Sizes of a sweep: mostly tiny, where every edge lies, some around the blocks of the kernels.
 inline QtbInt draw_size(Draw &draw) {
-  const QtbInt kind = draw.integer(0, 15);
+  const QtbInt kind = draw.integer(-1, 15);
+  if (kind < 0) return 0;
   if (kind < 10) return draw.integer(0, 12);
   if (kind < 15) return draw.integer(13, 40);
   return draw.integer(41, 70);

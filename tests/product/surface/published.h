@@ -66,71 +66,35 @@ class Combination {
     switch (axis) {
       case 'm':
       case 'n':
-      case 'k':
-        return static_cast<long>(g.sizes.size());
-      case 'l':
-        return static_cast<long>(g.bands.size() * g.bands.size());
-      case 'b':
-        return static_cast<long>(g.bands.size());
+      case 'k': return static_cast<long>(g.sizes.size());
+      case 'l': return static_cast<long>(g.bands.size() * g.bands.size());
+      case 'b': return static_cast<long>(g.bands.size());
       case 'x':
-      case 'y':
-        return static_cast<long>(g.increments.size());
-      case '+':
-        return static_cast<long>(g.alphas.size());
-      case '*':
-        return static_cast<long>(g.betas.size());
+      case 'y': return static_cast<long>(g.increments.size());
+      case '+': return static_cast<long>(g.alphas.size());
+      case '*': return static_cast<long>(g.betas.size());
       case 'A':
-      case 'B':
-        return 3;
-      default:
-        return 2;
+      case 'B': return 3;
+      default: return 2;
     }
   }
   void set(Problem &p, char axis, std::size_t i) const {
     const Grid &g = axes_.grid;
     switch (axis) {
-      case 'm':
-        p.m = g.sizes[i];
-        break;
-      case 'n':
-        p.n = g.sizes[i];
-        break;
-      case 'k':
-        p.k = g.sizes[i];
-        break;
-      case 'l':
-        p.kl = g.bands[i % g.bands.size()], p.ku = g.bands[i / g.bands.size()];
-        break;
-      case 'b':
-        p.kl = g.bands[i];
-        break;
-      case 'x':
-        p.incx = g.increments[i];
-        break;
-      case 'y':
-        p.incy = g.increments[i];
-        break;
-      case '+':
-        p.alpha = g.alphas[i];
-        break;
-      case '*':
-        p.beta = g.betas[i];
-        break;
-      case 'A':
-        p.transa = "NTC"[i];
-        break;
-      case 'B':
-        p.transb = "NTC"[i];
-        break;
-      case 'S':
-        p.side = "LR"[i];
-        break;
-      case 'U':
-        p.uplo = "UL"[i];
-        break;
-      case 'D':
-        p.diag = "UN"[i];
-        break;
+      case 'm': p.m = g.sizes[i]; break;
+      case 'n': p.n = g.sizes[i]; break;
+      case 'k': p.k = g.sizes[i]; break;
+      case 'l': p.kl = g.bands[i % g.bands.size()], p.ku = g.bands[i / g.bands.size()]; break;
+      case 'b': p.kl = g.bands[i]; break;
+      case 'x': p.incx = g.increments[i]; break;
+      case 'y': p.incy = g.increments[i]; break;
+      case '+': p.alpha = g.alphas[i]; break;
+      case '*': p.beta = g.betas[i]; break;
+      case 'A': p.transa = "NTC"[i]; break;
+      case 'B': p.transb = "NTC"[i]; break;
+      case 'S': p.side = "LR"[i]; break;
+      case 'U': p.uplo = "UL"[i]; break;
+      case 'D': p.diag = "UN"[i]; break;
     }
   }
   const Axes &axes_;

@@ -5,6 +5,8 @@
 #include <immintrin.h>
 #include <pthread.h>
 
+#include <cstdarg>
+#include <cstdio>
 #include <cstdlib>
 #include <map>
 #include <string>
@@ -109,7 +111,7 @@ class Session {
     if (worst > limit())
       fail("error / bound %g at (%lld, %lld)", worst, static_cast<long long>(worst_i), static_cast<long long>(worst_j));
     if (!kept) fail("wrote what it must not");
-    tally().worst = std::fmax(tally().worst, worst);
+    tally().worst = std::fmax(tally().worst, worst / limit());
   }
 
   // A result that is not an array, and a difference of type T that must vanish.
@@ -135,7 +137,7 @@ class Session {
   void judge_one(T got, const Expected &want, double roundings) {
     const double ratio = this->ratio(want, got, Expectation{{}, roundings, 1, {}});
     if (ratio > limit()) fail("error / bound %g of the result", ratio);
-    tally().worst = std::fmax(tally().worst, ratio);
+    tally().worst = std::fmax(tally().worst, ratio / limit());
   }
   template <class T>
   double ratio(const Expected &want, T got, const Expectation &e) const {
@@ -170,10 +172,12 @@ class Session {
       fail("wrote an input");
   }
 
-  template <class... A>
-  void fail(const char *format, A... values) {
+  [[gnu::format(printf, 2, 3)]] void fail(const char *format, ...) {
     char text[200];
-    std::snprintf(text, sizeof text, format, values...);
+    va_list values;
+    va_start(values, format);
+    std::vsnprintf(text, sizeof text, format, values);
+    va_end(values);
     ADD_FAILURE() << current_problem << "\n" << text;
     ++failures_;
   }

@@ -48,8 +48,7 @@ class Sweeps {
   }
 
  private:
-  // Level 3 has more work in a case.
-  static constexpr int count = 150;
+  static constexpr int count = 240;  // of random problems per routine
 
   bool try_one(const Problem &p, Session &session) const {
     if (!session.start(p)) return false;

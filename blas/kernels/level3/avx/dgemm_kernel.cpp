@@ -51,15 +51,18 @@ template <bool aligned>
     _mm256_storeu_pd(c, _mm256_add_pd(sum, _mm256_loadu_pd(c)));
 }
 
-// A tile of C as sums: upper are rows 0 to 3 of its columns, lower rows 4 to 7.
+// A tile of C as sums: upper are rows 0 to 3 of its columns, lower rows 4 to 7. All of it is inlined, the lambdas
+// first, so that compilers see a tile in registers from their earliest passes on.
 template <int width>
 struct Tile {
   __m256d upper[width], lower[width];
   __m256d carried_upper, carried_lower;  // products of the last column that are not yet in its sums
 
   [[gnu::always_inline]] void clear() {
-    repeat<width>([&](auto j)
-                      __attribute__((always_inline)) { upper[j.value] = lower[j.value] = _mm256_setzero_pd(); });
+    repeat<width>([&](auto j) __attribute__((always_inline)) {
+      upper[j.value] = _mm256_setzero_pd();
+      lower[j.value] = _mm256_setzero_pd();
+    });
     carried_upper = carried_lower = _mm256_setzero_pd();
   }
 
@@ -110,8 +113,8 @@ struct Tile {
 
 // The rows of A against one micro-panel of B.
 template <int width, bool aligned>
-[[gnu::noinline, gnu::flatten]] void multiply_micro_panel(QtbInt m, QtbInt kp, const double *ap, QtbInt ldap,
-                                                          const double *bp, double *c, QtbInt ldc, double *stage) {
+[[gnu::noinline]] void multiply_micro_panel(QtbInt m, QtbInt kp, const double *ap, QtbInt ldap, const double *bp,
+                                            double *c, QtbInt ldc, double *stage) {
   for (QtbInt e = 0; e < kp * width; e += vector_length) _mm256_store_pd(stage + e, _mm256_load_pd(bp + e));
   for (; m > 0; m -= mr, ap += ldap, c += mr) {
     for (int j = 0; j < width; j++) prefetch(c + j * ldc, prefetch_c);

@@ -48,16 +48,15 @@ inline __m128d interleaved_high(__m128d a, __m128d b) { return _mm_unpackhi_pd(a
 // direct += rows*b, crossed += exchanged*b, b a vector of B: two columns of real elements, or one staged element of a
 // complex column. The last pair of a step may overwrite the rows, and loads b once.
 //
-// In assembly, because a compiler makes one load and a copy of the two loads, and what costs time in the depth loop are
-// copies, not loads (a quarter more than the multiplications and additions take, against a tenth); and because it lets
-// sums wander from register to register, so that they meet the end of the loop in memory.
+// In assembly, because compilers make one load and a copy of the two loads, and copies of registers are what slows this
+// loop down, not loads; and because they let sums wander from register to register, to meet the loop's end in memory.
 #define QTB_PAIR_OF_PRODUCTS(T, Loaded, load, mul, add)                                                            \
   [[gnu::always_inline]] inline void add_pair(Vec<T> &direct, Vec<T> &crossed, Vec<T> rows, Vec<T> exchanged_rows, \
                                               const T *b) {                                                        \
     Vec<T> product;                                                                                                \
     __asm__ volatile(load " %[b], %[p]\n\t" mul " %[r], %[p]\n\t" add " %[p], %[d]\n\t" load " %[b], %[p]\n\t" mul \
                           " %[e], %[p]\n\t" add " %[p], %[c]"                                                      \
-                     : [d] "+x"(direct), [c] "+x"(crossed), [p] "=&x"(product)                                     \
+                     : [d] "+&x"(direct), [c] "+&x"(crossed), [p] "=&x"(product)                                   \
                      : [r] "x"(rows), [e] "x"(exchanged_rows), [b] "m"(*reinterpret_cast<const Loaded *>(b)));     \
   }                                                                                                                \
   [[gnu::always_inline]] inline void add_last_pair(Vec<T> &direct, Vec<T> &crossed, Vec<T> rows,                   \
@@ -65,7 +64,7 @@ inline __m128d interleaved_high(__m128d a, __m128d b) { return _mm_unpackhi_pd(a
     Vec<T> product;                                                                                                \
     __asm__ volatile(load " %[b], %[p]\n\t" mul " %[p], %[r]\n\t" add " %[r], %[d]\n\t" mul " %[e], %[p]\n\t" add  \
                           " %[p], %[c]"                                                                            \
-                     : [d] "+x"(direct), [c] "+x"(crossed), [r] "+x"(rows), [p] "=&x"(product)                     \
+                     : [d] "+&x"(direct), [c] "+&x"(crossed), [r] "+&x"(rows), [p] "=&x"(product)                  \
                      : [e] "x"(exchanged_rows), [b] "m"(*reinterpret_cast<const Loaded *>(b)));                    \
   }
 QTB_PAIR_OF_PRODUCTS(float, AnyAddress<double>, "movddup", "mulps", "addps")
@@ -75,7 +74,8 @@ QTB_PAIR_OF_PRODUCTS(cdouble, __m128d_u, "movupd", "mulpd", "addpd")
 #undef QTB_PAIR_OF_PRODUCTS
 
 // A tile of C, mr rows and width columns, as sums: of each two real columns or each complex column one of either kind;
-// of a real column without a neighbour the direct one alone, which is the column as it stands.
+// of a real column without a neighbour the direct one alone, which is the column as it stands. All of it is inlined,
+// the lambdas first, so that compilers see a tile in registers from their earliest passes on.
 template <class T, int width>
 struct Tile {
   using V = Vec<T>;
@@ -88,8 +88,10 @@ struct Tile {
   V direct[pairs + singles], crossed[pairs + singles];
 
   [[gnu::always_inline]] void clear() {
-    repeat<pairs + singles>([&](auto q)
-                                __attribute__((always_inline)) { direct[q.value] = crossed[q.value] = zero<T>(); });
+    repeat<pairs + singles>([&](auto q) __attribute__((always_inline)) {
+      direct[q.value] = zero<T>();
+      crossed[q.value] = zero<T>();
+    });
   }
 
   // += depth steps of k. The rows of a step are loaded and exchanged early in the step before.
@@ -154,8 +156,7 @@ struct Tile {
 
 // The rows of A against one micro-panel of B.
 template <class T, int width, bool aligned>
-[[gnu::noinline, gnu::flatten]] void multiply_columns(QtbInt m, QtbInt kp, const T *ap, QtbInt ldap, const T *b, T *c,
-                                                      QtbInt ldc) {
+[[gnu::noinline]] void multiply_columns(QtbInt m, QtbInt kp, const T *ap, QtbInt ldap, const T *b, T *c, QtbInt ldc) {
   using Block = Tile<T, width>;
   constexpr QtbInt mr = rules_of<T>.mr;
   for (; m > 0; m -= mr, ap += ldap, c += mr) {

@@ -11,6 +11,7 @@
 
 #include "blas/dispatch/slots.h"
 #include "blas/thread/32e/level1/xf_l1_share.h"
+#include "blas/thread/floating_state.h"
 #include "service/memory.h"
 
 namespace qtb {
@@ -29,12 +30,15 @@ struct Piece {
 template <class X, class Y, class Body>
 void for_each_piece(QtbInt nthreads, QtbInt n, X *x, QtbInt incx, Y *y, QtbInt incy, Body body) {
   const int requested = static_cast<int>(nthreads);
+  const unsigned callers_choice = floating_choice();
 #pragma omp parallel num_threads(requested)
   {
+    const unsigned own_choice = take_floating_choice(callers_choice);
     const QtbInt team = omp_get_num_threads();
     const QtbInt rank = omp_get_thread_num();
     const Level1Share share = level1_share(n, team, rank);
     body(Piece<X, Y>{team, rank, share.len, x + level1_offset(share, n, incx), y + level1_offset(share, n, incy)});
+    take_floating_choice(own_choice);
   }
 }
 
