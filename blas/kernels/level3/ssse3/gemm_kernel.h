@@ -251,12 +251,12 @@ constexpr QtbInt c_ahead_bytes = family == Family::sse41 ? 32 : 40;
 template <class Scheme, class R, class T, int operands, int forms>
 [[gnu::always_inline]] inline void multiply_add_line(const R *a, const R *b, Grid<T, operands, forms> &sums) {
   prefetch<_MM_HINT_T0>(a, rows_ahead_bytes);
-  repeat<2>([&](auto k) {
+  repeat<2>([&](auto k) __attribute__((always_inline)) {
     const RowVectors<T, forms> rows = Scheme::load_rows(a + k.value * row_vectors * static_cast<int>(lanes<R>));
-    repeat<operands>([&](auto j) {
+    repeat<operands>([&](auto j) __attribute__((always_inline)) {
       Vec<T> operand = Scheme::template load_b<j.value>(b + k.value * Scheme::b_step);
       keep_in_place(operand);
-      repeat<Scheme::products(j.value)>([&](auto i) {
+      repeat<Scheme::products(j.value)>([&](auto i) __attribute__((always_inline)) {
         Vec<T> &sum = sums.at[j.value][i.value];
         sum = add(sum, mul(operand, rows.at[i.value]));
         keep_in_place(sum);
@@ -276,19 +276,24 @@ template <class T, Family family, int width, bool aligned, int fixed_lines>
   constexpr int lines_per_turn = static_cast<int>(rules.ku) / 2, step = static_cast<int>(lanes<R>);
   constexpr QtbInt line = line_bytes / static_cast<QtbInt>(sizeof(R));
   for (; m > 0; m -= rules.mr, ap += ldap, c += rules.mr) {
-    repeat<width>([&](auto j) {
+    repeat<width>([&](auto j) __attribute__((always_inline)) {
       prefetch<(family == Family::sse41 ? _MM_HINT_NTA : _MM_HINT_T0)>(c + j.value * ldc, c_ahead_bytes<family>);
     });
     Grid<T, Scheme::operands, Scheme::row_forms> sums;
-    repeat<Scheme::operands>(
-        [&](auto j) { repeat<Scheme::products(j.value)>([&](auto i) { sums.at[j.value][i.value] = zero<T>(); }); });
+    repeat<Scheme::operands>([&](auto j) __attribute__((always_inline)) {
+      repeat<Scheme::products(j.value)>([&](auto i)
+                                            __attribute__((always_inline)) { sums.at[j.value][i.value] = zero<T>(); });
+    });
     const R *a = parts(ap), *operand = b;
     if constexpr (fixed_lines > 0) {
-      repeat<fixed_lines>(
-          [&](auto l) { multiply_add_line<Scheme>(a + l.value * line, operand + l.value * 2 * Scheme::b_step, sums); });
+      repeat<fixed_lines>([&](auto l) __attribute__((always_inline)) {
+        multiply_add_line<Scheme>(a + l.value * line, operand + l.value * 2 * Scheme::b_step, sums);
+        // An address that waits for a sum keeps the prefetches of straight-line code from gathering at its start.
+        __asm__("" : "+r"(a), "+x"(sums.at[0][0]));
+      });
     } else {
       for (QtbInt left = kp; left > 0; left -= rules.ku) {
-        repeat<lines_per_turn>([&](auto l) {
+        repeat<lines_per_turn>([&](auto l) __attribute__((always_inline)) {
           multiply_add_line<Scheme>(a + l.value * line, operand + l.value * 2 * Scheme::b_step, sums);
         });
         a += lines_per_turn * line;
@@ -297,9 +302,9 @@ template <class T, Family family, int width, bool aligned, int fixed_lines>
     }
     Grid<T, width, row_vectors> columns;
     Scheme::finish(sums, columns);
-    repeat<width>([&](auto j) {
+    repeat<width>([&](auto j) __attribute__((always_inline)) {
       R *column = parts(c + j.value * ldc);
-      repeat<row_vectors>([&](auto i) {
+      repeat<row_vectors>([&](auto i) __attribute__((always_inline)) {
         R *p = column + i.value * step;
         if constexpr (!aligned)
           store_unaligned(p, add(columns.at[j.value][i.value], load_unaligned(p)));
