@@ -20,9 +20,9 @@ set(QTB_KERNEL_SOURCES
   blas/kernels/level1/swap.cpp
   # level3
   blas/kernels/level3/blocks.cpp
+  blas/kernels/level3/pack.cpp
   # plain
   blas/kernels/plain/gemm.cpp
-  blas/kernels/plain/gemm_copy.cpp
   blas/kernels/plain/gemm_packed.cpp
   blas/kernels/plain/gemv.cpp
   blas/kernels/plain/ger.cpp
