@@ -1,0 +1,67 @@
+// The kernel of the tiles of 32 bytes by four columns: 8 x 4 in s, 4 x 4 in c and d, 2 x 4 in z.
+//
+// Before the rows of a group of columns pass, the stage gets its micro-panel of B with each real number in all lanes of
+// a vector, so that a step is loads, products and sums alone: a shuffle in the depth would compete with these. Of a
+// complex micro-panel the stage has two columns and then the other two, a pass of the tile each.
+#pragma once
+
+#include "blas/kernels/level3/low/tile.h"
+#include "blas/kernels/level3/tiles.h"
+
+namespace qtb::QTB_TIER {
+namespace {
+
+constexpr int staged_vectors = 2, staged_columns = 4;  // of real numbers, in one pass
+
+// A kernel's constants: longest is the depth that is written out.
+struct StagedForm {
+  Steps steps;
+  int longest;
+  int ahead_bytes = 0;
+};
+
+// One micro-panel of B, of columns real numbers per step, and all rows of A.
+template <class T, Beta beta, StagedForm form, int columns>
+void run_staged_columns(QtbInt m, QtbInt kp, const T *ap, QtbInt ldap, const T *panel, T *c, QtbInt ldc, Real<T> *stage,
+                        const Real<T> *lanes_of_beta) {
+  using R = Real<T>;
+  using A = PackedA<R, staged_vectors, form.ahead_bytes>;
+  constexpr int whole = columns / staged_columns, left = columns % staged_columns;
+  constexpr QtbInt mr = staged_vectors * lanes<T>;
+  constexpr QtbInt columns_per_pass = staged_columns * lanes<T> / lanes<R>;
+  const QtbInt stage_step = kp * staged_columns * lanes<R>;
+  const R *reals = parts(panel);
+
+  for (int p = 0; p < whole; p++)
+    fill_stage<R, staged_columns>(kp, reals + p * staged_columns, columns, stage + p * stage_step);
+  if constexpr (left > 0) fill_stage<R, left>(kp, reals + whole * staged_columns, columns, stage + whole * stage_step);
+
+  for (QtbInt i0 = 0; i0 < m; i0 += mr, ap += ldap, c += mr) {
+    const R *a = parts(ap);
+    T *to = c;
+    for (int p = 0; p < whole; p++, to += columns_per_pass * ldc)
+      store_tile<T, beta>(sums_over<R, staged_vectors, staged_columns, form.steps, form.longest>(
+                              kp, A(a), StagedB<R, staged_columns>{stage + p * stage_step}),
+                          to, ldc, lanes_of_beta);
+    if constexpr (left > 0)
+      store_tile<T, beta>(
+          sums_over<R, staged_vectors, left, Steps::fours, 0>(kp, A(a), StagedB<R, left>{stage + whole * stage_step}),
+          to, ldc, lanes_of_beta);
+  }
+}
+
+template <class T, Beta beta, StagedForm form>
+void run_staged(QtbInt m, QtbInt n, QtbInt kp, const T *ap, QtbInt ldap, const T *bp, QtbInt ldbp, T *c, QtbInt ldc,
+                T *stage, const Real<T> *lanes_of_beta) {
+  constexpr int nr = 4, reals = is_complex<T> ? 2 : 1;
+  constexpr StagedForm loop{Steps::fours, 0, form.ahead_bytes};
+  Real<T> *const reals_of_stage = reinterpret_cast<Real<T> *>(stage);
+  for (; n >= nr; n -= nr, bp += ldbp, c += nr * ldc)
+    run_staged_columns<T, beta, form, nr * reals>(m, kp, ap, ldap, bp, c, ldc, reals_of_stage, lanes_of_beta);
+  if (n == 3) run_staged_columns<T, beta, loop, 3 * reals>(m, kp, ap, ldap, bp, c, ldc, reals_of_stage, lanes_of_beta);
+  if (n == 2) run_staged_columns<T, beta, loop, 2 * reals>(m, kp, ap, ldap, bp, c, ldc, reals_of_stage, lanes_of_beta);
+  if (n == 1) run_staged_columns<T, beta, loop, reals>(m, kp, ap, ldap, bp, c, ldc, reals_of_stage, lanes_of_beta);
+}
+
+}  // namespace
+}  // namespace qtb::QTB_TIER
