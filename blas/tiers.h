@@ -23,5 +23,6 @@ enum ProcessorTier : std::int32_t { QTB_FOR_EACH_TIER(QTB_TIER_NUMBER) tier_coun
 namespace qtb::tier_set {
 QTB_FOR_EACH_TIER(QTB_TIER_BIT)
 inline constexpr unsigned ALL = (1U << tier_count) - 1;
+inline constexpr unsigned AVX_RUNS_SSE42 = 1U << tier_count;  // added to a set: the avx tier runs the body of sse42
 }  // namespace qtb::tier_set
 #undef QTB_TIER_BIT

@@ -9,8 +9,11 @@ extern "C" void qtb_blas_noop() {}
 namespace qtb {
 
 // Constant data: the conditions are constants, so a target that is not named is not referred to.
-#define QTB_TARGET(tier, TIER, name, tiers) \
-  (tier_set::TIER & (tiers)) != 0 ? reinterpret_cast<CodePointer>(&qtb_blas_##tier##_x##name) : &qtb_blas_noop,
+#define QTB_TARGET(tier, TIER, name, tiers)                    \
+  (tier_set::TIER & (tiers)) == 0 ? &qtb_blas_noop             \
+  : tier_##tier == tier_avx && (AVX_RUNS_SSE42 & (tiers)) != 0 \
+      ? reinterpret_cast<CodePointer>(&qtb_blas_sse42_x##name) \
+      : reinterpret_cast<CodePointer>(&qtb_blas_##tier##_x##name),
 #define QTB_SLOT(name, shape, T, tiers) {#name, tiers, {QTB_FOR_EACH_TIER(QTB_TARGET, name, tiers)}},
 using namespace tier_set;
 const SlotTargets slot_targets[slot_count] = {

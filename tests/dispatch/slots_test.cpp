@@ -65,11 +65,9 @@ const SlotStub stubs[slot_count] = {
 };
 #undef QTB_SLOT
 
-// The tier whose procedure stands in a slot, or -1 for the empty routine.
-int tier_in_slot(int slot, int tier) {
-  if ((slot_targets[slot].tiers >> tier & 1) == 0) return -1;
-  return tier;
-}
+// The tier whose procedure stands in a slot, or -1 for the empty routine. Here every tier has procedures of its own,
+// also where two of the library's share one.
+int tier_in_slot(int slot, int tier) { return (slot_targets[slot].tiers >> tier & 1) != 0 ? tier : -1; }
 
 void expect_call(int slot, int tier) {
   const int expected = tier_in_slot(slot, tier);

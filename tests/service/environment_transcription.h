@@ -90,17 +90,10 @@ inline ThreadSettings transcribed_settings(const Environment &environment) {
   if (length > 0) {
     s.mpi_thread_level = 0;
     if (transcribed_digits(v)) switch (std::atoi(v)) {
-        case 1:
-          s.mpi_thread_level = 1;
-          break;
-        case 2:
-          s.mpi_thread_level = 2;
-          break;
-        case 3:
-          s.mpi_thread_level = 3;
-          break;
-        default:
-          break;
+        case 1: s.mpi_thread_level = 1; break;
+        case 2: s.mpi_thread_level = 2; break;
+        case 3: s.mpi_thread_level = 3; break;
+        default: break;
       }
   }
   return s;

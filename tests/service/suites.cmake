@@ -22,3 +22,8 @@ qtb_add_test(linux_test SOURCES service/linux_test.cpp LIBRARIES qtb_static qtb_
 target_compile_definitions(linux_test PRIVATE QTB_TEST_FACTS="$<TARGET_FILE:service_facts>"
   QTB_TEST_QMALLOC="${CMAKE_CURRENT_BINARY_DIR}/qmalloc")
 add_dependencies(linux_test service_facts qmalloc_complete qmalloc_three_hooks qmalloc_null_hook)
+
+# The shared library, loaded by hand.
+qtb_add_test(library_test SOURCES service/library_test.cpp)
+target_compile_definitions(library_test PRIVATE QTB_TEST_LIBRARY="$<TARGET_FILE:qtb>")
+add_dependencies(library_test qtb)
