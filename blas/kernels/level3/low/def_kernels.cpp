@@ -2,10 +2,7 @@
 //
 // dgemm_kernel: tiles of 2 x 12, 2 x 8 and 2 x 4, one vector of A per step and a stage of B with each element twice. A
 // step of the widest tile is 12 products, 12 sums and 13 loads.
-#include "blas/kernels/level3/low/kernels.h"
 #include "blas/kernels/level3/low/staged.h"
-
-#if QTB_TIER_IS(def)
 
 namespace qtb::QTB_TIER {
 namespace {
@@ -23,7 +20,7 @@ inline void ask_for_rows(const double *a) {
 template <Steps steps, int columns>
 void run_columns(QtbInt m, QtbInt kp, const double *ap, QtbInt ldap, const double *bp, double *c, QtbInt ldc,
                  double *stage) {
-  fill_stage<double, columns>(kp, bp, columns, stage);
+  fill_stage<double, columns>(kp, {bp, kp, columns, 1}, stage);
   for (QtbInt i0 = 0; i0 < m; i0 += tile_rows, ap += ldap, c += tile_rows) {
     ask_for_rows(ap);
     store_tile<double, Beta::one>(sums_over<double, 1, columns, steps, fixed_depth>(kp, PackedA<double, 1, 0>(ap),
@@ -53,11 +50,17 @@ extern "C" void qtb_blas_def_dgemm_kernel(QTB_INNER_KERNEL_PARAMS(double)) {
 extern "C" void qtb_blas_def_dgemm_kernel_128(QTB_INNER_KERNEL_PARAMS(double)) {
   run<Steps::all>(m, n, kp, ap, ldap, bp, ldbp, c, ldc, stage);
 }
+
+constexpr int panel_ahead_bytes = 576;
+constexpr StagedForm family_form{Steps::fours, 0, panel_ahead_bytes};
+
 extern "C" void qtb_blas_def_dgemm_def_kernel(QTB_INNER_KERNEL_PARAMS(double)) {
-  constexpr StagedForm form{Steps::fours, 0, 576};
-  run_staged<double, Beta::one, form>(m, n, kp, ap, ldap, bp, ldbp, c, ldc, stage, nullptr);
+  run_on_panels<double, Beta::one, family_form>(m, n, kp, ap, ldap, bp, ldbp, c, ldc, stage, nullptr);
+}
+extern "C" void qtb_blas_def_dgemm_def_kernel_in_place(QTB_IN_PLACE_KERNEL_PARAMS(double)) {
+  const QtbInt kp = round_up(depth, 4), step = transb ? ldb : 1, column = transb ? 1 : ldb;
+  run_staged<double, Beta::one, family_form, false>(m, n, kp, ap, ldap, {b, depth, step, column}, 4 * column, c, ldc,
+                                                    stage, nullptr);
 }
 
 }  // namespace qtb::QTB_TIER
-
-#endif

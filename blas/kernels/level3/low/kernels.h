@@ -1,18 +1,17 @@
 // The inner kernels of GEMM in def and sse3.
 //
-// Those of s, c and z: C(0:m, 0:n) := beta*C + Ap*Bp, m a multiple of mr, on panels as kernels.h of the folder above
-// has them, of a depth kp of at most the depth of a block (112 in s, 64 in c and z). kernel_112 and kernel_64 take just
-// that depth and a beta of 1, kernel a beta of 1, kernel_0 a beta of 0, and so does not read C, kernel_b any. stage
-// holds kp*64 bytes (s) or kp*128 (c, z) on a 16-byte boundary. beta_lanes points to BetaLanes (tile.h).
+// Those of s, c and z: C(0:m, 0:n) := beta*C + Ap*Bp on the panels of level3/kernels.h. kernel_112 (s) and kernel_64
+// (c, z) take a kp of just that, the depth of a block, and a beta of 1; kernel any kp and a beta of 1; kernel_0 a beta
+// of 0, and so does not read C; kernel_b any beta, by BetaLanes (tile.h). stage holds kp*64 bytes (s) or kp*128 (c, z).
 //
-// Those of d in def: C += Ap*Bp, n a multiple of 4; dgemm_kernel_128 for a kp of 128, dgemm_kernel for any up to that;
-// stage holds kp*192 bytes. dgemm_def_kernel is that of the 4 x 4 family, for any kp and n; stage holds kp*64 bytes.
+// Those of d in def: C += Ap*Bp, n a multiple of 4. dgemm_kernel_128 takes a kp of 128, dgemm_kernel any; stage holds
+// kp*192 bytes. The kernels of the 4 x 4 family, dgemm_def_kernel and _in_place, stand in level3/kernels.def.
 //
-// Those of d in sse3: C(0:m, 0:n) := beta*C + A*op(B), m and n any. a forms read A and B from panels, the last
-// micro-panel of A filled up to 4 rows with zeros; lda and ldb are the steps of the micro-panels. n and t forms read
-// both as they lie in memory, A with its rows side by side, B not transposed (n) or transposed (t), and multiply by
-// alpha, which a forms do not read. 112: that depth, beta 1; k: any depth, up to 112; _b, _0 as above. a112 is for
-// multiples of 4, a112e for all m and n. alpha and beta_lanes point to two equal values on a 16-byte boundary.
+// Those of d in sse3: C(0:m, 0:n) := beta*C + A*op(B), for any m and n. The a forms read A and B from panels, lda and
+// ldb apart, the last micro-panel of A filled up to 4 rows with zeros. The n and t forms read both where they are, A
+// not transposed, B not (n) or so (t), and multiply by alpha, which the a forms do not read. 112: a k of 112 and a beta
+// of 1, in a112 with m and n multiples of 4; k: any k, in panels a multiple of 4; _b and _0 as above. alpha and
+// beta_lanes point to two equal values on a 16-byte boundary.
 #pragma once
 
 #include "blas/kernels/level3/kernels.h"
@@ -42,7 +41,6 @@ QTB_FOLDING_KERNELS(sse3, cdouble, z, 64)
 
 QTB_HIDDEN void qtb_blas_def_dgemm_kernel(QTB_INNER_KERNEL_PARAMS(double));
 QTB_HIDDEN void qtb_blas_def_dgemm_kernel_128(QTB_INNER_KERNEL_PARAMS(double));
-QTB_HIDDEN void qtb_blas_def_dgemm_def_kernel(QTB_INNER_KERNEL_PARAMS(double));
 
 #define QTB_SSE3_KERNEL(name) QTB_HIDDEN void qtb_blas_sse3_dgemm_kernel_##name(QTB_EDGE_KERNEL_PARAMS);
 QTB_SSE3_DGEMM_KERNELS(QTB_SSE3_KERNEL)

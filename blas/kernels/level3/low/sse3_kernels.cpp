@@ -6,8 +6,6 @@
 #include "blas/kernels/level3/low/kernels.h"
 #include "blas/kernels/level3/low/tile.h"
 
-#if QTB_TIER_IS(sse3)
-
 namespace qtb::QTB_TIER {
 namespace {
 
@@ -156,5 +154,3 @@ QTB_SSE3_KERNEL(nk_0, run_in_place<false, Steps::some, Beta::zero>)
 QTB_SSE3_KERNEL(tk_0, run_in_place<true, Steps::some, Beta::zero>)
 
 }  // namespace qtb::QTB_TIER
-
-#endif

@@ -91,20 +91,33 @@ template <class R, int vectors, int columns, Steps steps, int longest, class A, 
       add_step(sums, a, b);
     }
   } else {
+    for (;; depth -= longest) {
 #pragma GCC unroll 128
-    for (int l = 0; l < longest; l++) {
-      add_step(sums, a, b);
-      if (steps == Steps::some && l + 1 == depth) break;
+      for (int l = 0; l < longest; l++) {
+        add_step(sums, a, b);
+        if (steps == Steps::some && l + 1 == depth) return sums;
+      }
+      if constexpr (steps == Steps::all) return sums;
     }
   }
-  return sums;
+  if constexpr (steps == Steps::any || steps == Steps::fours) return sums;
 }
 
-// The stage of so many columns of a micro-panel of B whose steps are width elements apart.
+// Where a micro-panel of B lies: element (l, j) at first[l*step + j*column].
+template <class R>
+struct SourceB {
+  const R *first;
+  QtbInt depth, step, column;
+};
+
+// The stage of so many columns, filled up with zeros from the depth to kp.
 template <class R, int columns>
-void fill_stage(QtbInt depth, const R *panel, QtbInt width, R *stage) {
-  for (QtbInt l = 0; l < depth; l++, panel += width)
-    for (int j = 0; j < columns; j++, stage += lanes<R>) store_aligned(stage, broadcast(panel[j]));
+void fill_stage(QtbInt kp, SourceB<R> b, R *stage) {
+  const R *from = b.first;
+  for (QtbInt l = 0; l < b.depth; l++, from += b.step)
+    for (int j = 0; j < columns; j++, stage += lanes<R>)
+      store_aligned(stage, broadcast(load_single(from + j * b.column)));
+  for (QtbInt i = b.depth * columns; i < kp * columns; i++, stage += lanes<R>) store_aligned(stage, zero<R>());
 }
 
 // ---- C ----
