@@ -25,7 +25,6 @@ set(QTB_KERNEL_SOURCES
   blas/kernels/level3/scale_c.cpp
   blas/kernels/level3/small.cpp
   # plain
-  blas/kernels/plain/gemm.cpp
   blas/kernels/plain/gemv.cpp
   blas/kernels/plain/ger.cpp
   blas/kernels/plain/symm.cpp
@@ -43,6 +42,17 @@ set(QTB_KERNEL_SOURCES
 # Compiled for some tiers only.
 set(QTB_KERNEL_SOURCES_ssse3
   blas/kernels/level3/ssse3/gemm_kernel.cpp
+set(QTB_KERNEL_SOURCES_def
+  blas/kernels/level3/low/def_kernels.cpp
+  blas/kernels/level3/low/dgemm_def.cpp
+  blas/kernels/level3/low/folding_gemm.cpp
+  blas/kernels/level3/low/folding_kernels.cpp
+)
+set(QTB_KERNEL_SOURCES_sse3
+  blas/kernels/level3/low/dgemm_sse3.cpp
+  blas/kernels/level3/low/folding_gemm.cpp
+  blas/kernels/level3/low/folding_kernels.cpp
+  blas/kernels/level3/low/sse3_kernels.cpp
 )
 set(QTB_KERNEL_SOURCES_sse42
   blas/kernels/level3/sse42/gemm_kernel.cpp

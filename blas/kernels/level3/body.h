@@ -51,6 +51,12 @@ constexpr LimitRow limit_rows[] = {
   {'z', tiers_from_sse42, Family::base,  BodyForm::full,       {3, 5, 5}},
   {'z', tier_set::SSSE3,  Family::base,  BodyForm::full,       {3, 3, 3}},
   {'z', tier_set::SSSE3,  Family::sse41, BodyForm::full,       {3, 3, 5}},
+  {'d', tier_set::SSE3,   Family::base,  BodyForm::full,       {3, 3, 3}},
+  {'d', tier_set::DEF,    Family::base,  BodyForm::full,       {2, 2, 2}},
+  {'d', tier_set::DEF,    Family::def_a, BodyForm::full,       {2, 2, 2}},
+  {'s', tiers_to_sse3,    Family::base,  BodyForm::full,       {8, 8, 8}},
+  {'c', tiers_to_sse3,    Family::base,  BodyForm::full,       {4, 8, 8}},
+  {'z', tiers_to_sse3,    Family::base,  BodyForm::full,       {4, 8, 8}},
 };
 // clang-format on
 
@@ -105,14 +111,18 @@ constexpr Complex<R> one_of(Complex<R>) {
   return {1, 0};
 }
 
-// C += alpha*op(A)*op(B) over rows i0 and up, columns j0 to j0 + n and depth l0 to l0 + k, without packing.
+// C := beta*C + alpha*op(A)*op(B) over rows i0 and up, columns j0 to j0 + n and depth l0 to l0 + k, without packing.
 template <class T>
-void add_small(const Product<T> &p, bool a_is_n, bool b_is_n, QtbInt i0, QtbInt j0, QtbInt n, QtbInt l0, QtbInt k) {
+void run_small(const Product<T> &p, bool a_is_n, bool b_is_n, QtbInt i0, QtbInt j0, QtbInt n, QtbInt l0, QtbInt k,
+               T beta) {
   const QtbInt m = p.m - i0;
-  const T one = one_of(p.alpha);
   if (m <= 0) return;
   small_path<T>(p.transa, p.transb, &m, &n, &k, &p.alpha, p.a + (a_is_n ? i0 + l0 * p.lda : l0 + i0 * p.lda), &p.lda,
-                p.b + (b_is_n ? l0 + j0 * p.ldb : j0 + l0 * p.ldb), &p.ldb, &one, p.c + i0 + j0 * p.ldc, &p.ldc);
+                p.b + (b_is_n ? l0 + j0 * p.ldb : j0 + l0 * p.ldb), &p.ldb, &beta, p.c + i0 + j0 * p.ldc, &p.ldc);
+}
+template <class T>
+void add_small(const Product<T> &p, bool a_is_n, bool b_is_n, QtbInt i0, QtbInt j0, QtbInt n, QtbInt l0, QtbInt k) {
+  run_small(p, a_is_n, b_is_n, i0, j0, n, l0, k, one_of(p.alpha));
 }
 
 template <class T, Family family>

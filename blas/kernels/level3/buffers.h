@@ -42,7 +42,7 @@ constexpr QtbInt a_region_bytes(QtbInt mb, QtbInt kb) {
   constexpr GemmRules rules = rules_of<T, family>;
   constexpr QtbInt width = sizeof(T);
   if constexpr (this_tier == tier_avx && kind_of<T> == 'd') return mb * kb * width;
-  if constexpr (rules.mb.rule == Rows::area_of_k) return rules.mb.value * width;
+  if constexpr (rules.mb.rule == Rows::area_of_k || rules.mb.rule == Rows::area_of_kb) return rules.mb.value * width;
   return rules.mb.value * largest_depth * width;
 }
 template <class T, Family family>
