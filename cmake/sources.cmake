@@ -20,10 +20,11 @@ set(QTB_KERNEL_SOURCES
   blas/kernels/level1/swap.cpp
   # level3
   blas/kernels/level3/blocks.cpp
+  blas/kernels/level3/gemm.cpp
+  blas/kernels/level3/pack.cpp
+  blas/kernels/level3/scale_c.cpp
+  blas/kernels/level3/small.cpp
   # plain
-  blas/kernels/plain/gemm.cpp
-  blas/kernels/plain/gemm_copy.cpp
-  blas/kernels/plain/gemm_packed.cpp
   blas/kernels/plain/gemv.cpp
   blas/kernels/plain/ger.cpp
   blas/kernels/plain/symm.cpp
@@ -38,6 +39,40 @@ set(QTB_KERNEL_SOURCES
   blas/kernels/plain/trsv.cpp
 )
 
+# Compiled for some tiers only.
+set(QTB_KERNEL_SOURCES_ssse3
+  blas/kernels/level3/ssse3/gemm_kernel.cpp
+set(QTB_KERNEL_SOURCES_def
+  blas/kernels/level3/low/def_kernels.cpp
+  blas/kernels/level3/low/dgemm_def.cpp
+  blas/kernels/level3/low/folding_gemm.cpp
+  blas/kernels/level3/low/folding_kernels.cpp
+)
+set(QTB_KERNEL_SOURCES_sse3
+  blas/kernels/level3/low/dgemm_sse3.cpp
+  blas/kernels/level3/low/folding_gemm.cpp
+  blas/kernels/level3/low/folding_kernels.cpp
+  blas/kernels/level3/low/sse3_kernels.cpp
+)
+set(QTB_KERNEL_SOURCES_sse42
+  blas/kernels/level3/sse42/gemm_kernel.cpp
+)
+set(QTB_KERNEL_SOURCES_avx
+  blas/kernels/level3/avx/dgemm_kernel.cpp
+  blas/kernels/level3/sse42/gemm_kernel.cpp
+)
+set(qtb_tier_sources ${QTB_KERNEL_SOURCES_ssse3} ${QTB_KERNEL_SOURCES_sse42} ${QTB_KERNEL_SOURCES_avx})
+# Of these, the ones in the wider encoding: tests/product/mnemonics/vex_objects.txt has the same list.
+set(QTB_WIDE_KERNEL_SOURCES
+  blas/kernels/level3/avx/dgemm_kernel.cpp
+)
+
+# Vectorised by hand: what the compiler's own vectorisers add is code that makes short and strided vectors slower, whose
+# spare lanes can raise exceptions that the elements do not, and that moves tiles out of registers.
+set(qtb_hand_vectorised ${QTB_KERNEL_SOURCES} ${qtb_tier_sources})
+list(FILTER qtb_hand_vectorised INCLUDE REGEX "^blas/kernels/level[13]/")
+set_property(SOURCE ${qtb_hand_vectorised} APPEND PROPERTY
+  COMPILE_OPTIONS "-fno-tree-vectorize;-fno-tree-slp-vectorize")
 # Vectorised by hand: what the compiler's own vectoriser adds is code that makes short and strided vectors slower, and
 # whose spare lanes can raise exceptions that the elements do not.
 set(qtb_hand_vectorised ${QTB_KERNEL_SOURCES})
@@ -79,8 +114,8 @@ set(QTB_PLATFORM_SOURCES
 file(GLOB_RECURSE qtb_found RELATIVE ${PROJECT_SOURCE_DIR} CONFIGURE_DEPENDS
   ${PROJECT_SOURCE_DIR}/blas/*.cpp ${PROJECT_SOURCE_DIR}/service/*.cpp)
 foreach(source IN LISTS qtb_found)
-  if(NOT source IN_LIST QTB_KERNEL_SOURCES AND NOT source IN_LIST QTB_CORE_SOURCES
-      AND NOT source IN_LIST QTB_PLATFORM_SOURCES)
+  if(NOT source IN_LIST QTB_KERNEL_SOURCES AND NOT source IN_LIST qtb_tier_sources
+      AND NOT source IN_LIST QTB_CORE_SOURCES AND NOT source IN_LIST QTB_PLATFORM_SOURCES)
     message(FATAL_ERROR "${source} is in no list of cmake/sources.cmake")
   endif()
 endforeach()

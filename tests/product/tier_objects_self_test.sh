@@ -53,6 +53,12 @@ END
 expect def named "global symbol qtb_blas_ssse3_xnamed"
 expect avx named "global symbol qtb_blas_ssse3_xnamed"
 
+compile kernel "" <<'END'
+extern "C" void qtb_blas_sse42_zgemm_kernel_cu(double *x) { x[0] += x[1]; }
+END
+expect sse42 kernel ""
+expect avx kernel "global symbol qtb_blas_sse42_zgemm_kernel_cu"
+
 compile shared "" <<'END'
 extern "C" void qtb_blas_sse42_xshared(double *x) { x[0] += x[1]; }
 extern "C" void qtb_blas_avx_xshared(double *x) __attribute__((alias("qtb_blas_sse42_xshared")));
@@ -114,6 +120,7 @@ expect sse42 popcount "not in the lists of sse42, in qtb_blas_sse42_xpopcount: p
 compile wide "-mavx" <<'END'
 extern "C" void qtb_blas_avx_xwide(double *x) {
   for (int i = 0; i < 64; i++) x[i] += 1;
+  asm volatile("vaddpd %ymm1, %ymm2, %ymm3");
 }
 END
 expect avx wide "wider encoding in qtb_blas_avx_xwide: v"
@@ -147,12 +154,16 @@ expect def absent "read 0 objects of 1"
 mkdir -p "$folder/permissive/mnemonics"
 cp "$check" "$folder/permissive"
 cp "$(dirname "$0")"/mnemonics/*.txt "$folder/permissive/mnemonics"
-echo 'wide fused' > "$folder/permissive/mnemonics/vex_objects.txt"
+echo 'wide fused narrowed' > "$folder/permissive/mnemonics/vex_objects.txt"
 check=$folder/permissive/tier_objects_test.sh
 expect avx wide ""
 compile fused "-mfma -ffp-contract=fast" <<'END'
 extern "C" double qtb_blas_avx_xfused(double x, double y, double z) { return x * y + z; }
 END
 expect avx fused "above the tier in qtb_blas_avx_xfused: vfm"
+compile narrowed "" <<'END'
+extern "C" void qtb_blas_avx_xnarrowed(double *x) { x[0] += x[1]; }
+END
+expect avx narrowed "no instruction of the wider encoding"
 
 [ $failures -eq 0 ]

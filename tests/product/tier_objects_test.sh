@@ -5,8 +5,9 @@
 #   weak or unique symbols   the linker keeps one of several copies, perhaps that of a higher tier
 #   static initialisers      run at load on every processor
 #   instructions             only those of mnemonics/*.txt up to the tier; the wider encoding (VEX, EVEX) only in the
-#                            avx tier's objects that mnemonics/vex_objects.txt names
-#   defined global symbols   only qtb_blas_<tier>_x<name>, and a higher tier's name for the same procedure
+#                            avx tier's objects that mnemonics/vex_objects.txt names, each of which has it
+#   defined global symbols   only qtb_blas_<tier>_x<name> and qtb_blas_<tier>_<type>gemm_kernel<form>, and a higher
+#                            tier's name for the same procedure
 #   undefined symbols        only the library's own, of no other tier, and the memory routines that a compiler calls
 set -eu
 
@@ -51,15 +52,18 @@ xargs "${OBJDUMP:-objdump}" -h -t -d -w -M intel --no-show-raw-insn < "$objects"
     count = split(text, parts, " ")
     for (i = 1; i <= count; i++) set[parts[i]] = 1
   }
-  # The rank of the tier in a name qtb_blas_<tier>_x..., 0 without one.
+  # The rank of the tier in the name of a procedure, 0 without one.
   function rank_of(name,   word) {
     split(name, word, "_")
-    return name ~ /^qtb_blas_[a-z0-9]+_x/ ? rank[word[3]] : 0
+    return name ~ /^qtb_blas_[a-z0-9]+_(x|[sdcz]gemm_kernel)/ ? rank[word[3]] : 0
   }
-  # At the end of an object: a name of a higher tier stands for a procedure that has a name of this one.
+  # At the end of an object: a name of a higher tier stands for a procedure that has a name of this one, and what may be
+  # wide is.
   function settle(   name) {
     for (name in borrowed)
       if (!(borrowed[name] in procedures)) reject("global symbol " name)
+    if (objects && source in may_be_wide && !wider) reject("no instruction of the wider encoding")
+    wider = 0
     split("", borrowed)
     split("", procedures)
   }
@@ -131,8 +135,9 @@ xargs "${OBJDUMP:-objdump}" -h -t -d -w -M intel --no-show-raw-insn < "$objects"
     else if (mnemonic in is_allowed && operands ~ /(^|[ ,])mm[0-7]/) reject("MMX register in " function_name ": " text)
     else if (mnemonic in is_allowed) ;
     else if (mnemonic ~ /^(v|\{)/) {
+      wider++
       if (!(source in may_be_wide)) reject("wider encoding in " function_name ": " text)
-      else if (!(mnemonic in is_wide) || operands ~ /zmm|[xy]mm(1[6-9]|2|3)|\{/)
+      else if (!(mnemonic in is_wide) || operands ~ /zmm|[xy]mm(1[6-9]|2[0-9]|3[01])|\{/)
         reject("above the tier in " function_name ": " text)
     } else
       reject("not in the lists of " tier ", in " function_name ": " text)
