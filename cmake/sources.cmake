@@ -40,8 +40,6 @@ set(QTB_KERNEL_SOURCES
 )
 
 # Compiled for some tiers only.
-set(QTB_KERNEL_SOURCES_ssse3
-  blas/kernels/level3/ssse3/gemm_kernel.cpp
 set(QTB_KERNEL_SOURCES_def
   blas/kernels/level3/low/def_kernels.cpp
   blas/kernels/level3/low/dgemm_def.cpp
@@ -54,6 +52,9 @@ set(QTB_KERNEL_SOURCES_sse3
   blas/kernels/level3/low/folding_kernels.cpp
   blas/kernels/level3/low/sse3_kernels.cpp
 )
+set(QTB_KERNEL_SOURCES_ssse3
+  blas/kernels/level3/ssse3/gemm_kernel.cpp
+)
 set(QTB_KERNEL_SOURCES_sse42
   blas/kernels/level3/sse42/gemm_kernel.cpp
 )
@@ -61,23 +62,19 @@ set(QTB_KERNEL_SOURCES_avx
   blas/kernels/level3/avx/dgemm_kernel.cpp
   blas/kernels/level3/sse42/gemm_kernel.cpp
 )
-set(qtb_tier_sources ${QTB_KERNEL_SOURCES_ssse3} ${QTB_KERNEL_SOURCES_sse42} ${QTB_KERNEL_SOURCES_avx})
+set(qtb_tier_sources ${QTB_KERNEL_SOURCES_def} ${QTB_KERNEL_SOURCES_sse3} ${QTB_KERNEL_SOURCES_ssse3}
+  ${QTB_KERNEL_SOURCES_sse42} ${QTB_KERNEL_SOURCES_avx})
+
 # Of these, the ones in the wider encoding: tests/product/mnemonics/vex_objects.txt has the same list.
 set(QTB_WIDE_KERNEL_SOURCES
   blas/kernels/level3/avx/dgemm_kernel.cpp
 )
 
-# Vectorised by hand: what the compiler's own vectorisers add is code that makes short and strided vectors slower, whose
+# Vectorised by hand: what the compiler's own vectoriser adds is code that makes short and strided vectors slower, whose
 # spare lanes can raise exceptions that the elements do not, and that moves tiles out of registers.
 set(qtb_hand_vectorised ${QTB_KERNEL_SOURCES} ${qtb_tier_sources})
 list(FILTER qtb_hand_vectorised INCLUDE REGEX "^blas/kernels/level[13]/")
 set_property(SOURCE ${qtb_hand_vectorised} APPEND PROPERTY
-  COMPILE_OPTIONS "-fno-tree-vectorize;-fno-tree-slp-vectorize")
-# Vectorised by hand: what the compiler's own vectoriser adds is code that makes short and strided vectors slower, and
-# whose spare lanes can raise exceptions that the elements do not.
-set(qtb_hand_vectorised ${QTB_KERNEL_SOURCES})
-list(FILTER qtb_hand_vectorised INCLUDE REGEX "^blas/kernels/level1/")
-set_source_files_properties(${qtb_hand_vectorised} PROPERTIES
   COMPILE_OPTIONS "-fno-tree-vectorize")
 
 # Compiled once.
