@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include <initializer_list>
 #include <type_traits>
 
 #include "tests/reference/norms.h"
@@ -28,8 +29,12 @@ Real<T> call(Norm<T> routine, QtbInt n, const T *x, QtbInt incx) {
   return routine(&n, x, &incx);
 }
 template <class T, std::size_t count>
-Real<T> call(Norm<T> routine, const std::type_identity_t<T> (&x)[count], QtbInt incx = 1) {
-  return call(routine, static_cast<QtbInt>(count), x, incx);
+Real<T> call(Norm<T> routine, const T (&x)[count]) {
+  return call(routine, static_cast<QtbInt>(count), x, 1);
+}
+template <class T>
+Real<T> call(Norm<T> routine, std::initializer_list<std::type_identity_t<T>> x) {
+  return call(routine, static_cast<QtbInt>(x.size()), x.begin(), 1);
 }
 
 // ---- data ----
