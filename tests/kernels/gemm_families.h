@@ -14,6 +14,7 @@ namespace {
 
 using reference::column_widths;
 using reference::padded_depth;
+using reference::padded_rows;
 
 // The copy routines that have no slot: the bodies of their own tier call them.
 #define DECLARE_COPY(T, name) extern "C" QTB_HIDDEN QTB_FUNCTION(panel_copy, T, name);
@@ -75,7 +76,7 @@ template <>
 const std::vector<Pieces<double>> families<double> = {
     {REAL(def,   dgemm,       2, 12, 4), none, none, none},
     {REAL(def,   dgemm_def,   4, 4, 4), none, none, none},
-    {REAL(sse3,  dgemm,       4, 4, 4), none, none, none},
+    {"dgemm", tier_sse3, {4, 4, 4, true}, COPIES_REAL(qtb_blas_sse3_xdgemm), none, none, none},
     {REAL(ssse3, dgemm,       4, 4, 4), qtb_blas_ssse3_xdgemm_bpacked, none, none},
     {REAL(ssse3, dgemm_sse41, 4, 4, 4), none, none, qtb_blas_ssse3_xdgemm_sse41_packed},
     {REAL(sse42, dgemm,       2, 8, 4), qtb_blas_sse42_xdgemm_bpacked, qtb_blas_sse42_xdgemm_apacked, none},
@@ -119,7 +120,7 @@ struct Panel {
 template <class T>
 Panel<T> a_panel(const Pieces<T> &p, QtbInt m, QtbInt k) {
   const QtbInt kp = padded_depth(p.tile, k);
-  return {static_cast<std::size_t>(m / p.tile.mr), kp * p.tile.mr, p.tile.mr, kp};
+  return {static_cast<std::size_t>(padded_rows(p.tile, m) / p.tile.mr), kp * p.tile.mr, p.tile.mr, kp};
 }
 template <class T>
 Panel<T> b_panel(const Pieces<T> &p, QtbInt n, QtbInt k) {

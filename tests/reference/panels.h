@@ -2,7 +2,8 @@
 //
 // A panel is a sequence of micro-panels of mr rows or nr columns, ldp elements apart, k the slow index: element (i, l)
 // of w rows at i + l*w, (l, j) of w columns at l*w + j. The columns that a full micro-panel leaves over form narrower
-// ones, each at its own step. The depth is filled up with zeros to a multiple of ku.
+// ones, each at its own step. Rows that a micro-panel lacks are left out, or, in a tile that takes all rows, filled up
+// with zeros. The depth is filled up with zeros to a multiple of ku.
 #pragma once
 
 #include <vector>
@@ -13,7 +14,13 @@ namespace qtb::reference {
 
 struct PanelTile {
   QtbInt mr, nr, ku;
+  bool all_rows = false;
 };
+
+// Rows of the panel of m rows of A.
+inline QtbInt padded_rows(const PanelTile &tile, QtbInt m) {
+  return (tile.all_rows ? m + tile.mr - 1 : m) / tile.mr * tile.mr;
+}
 
 inline QtbInt padded_depth(const PanelTile &tile, QtbInt k) { return (k + tile.ku - 1) / tile.ku * tile.ku; }
 
@@ -41,8 +48,7 @@ struct PanelLine {
 template <class T>
 std::vector<PanelLine<T>> unpack_a(const PanelTile &tile, QtbInt m, const T *panels, QtbInt ldp) {
   std::vector<PanelLine<T>> rows;
-  for (QtbInt i = 0; i < m / tile.mr * tile.mr; i++)
-    rows.push_back({panels + i / tile.mr * ldp + i % tile.mr, tile.mr});
+  for (QtbInt i = 0; i < padded_rows(tile, m); i++) rows.push_back({panels + i / tile.mr * ldp + i % tile.mr, tile.mr});
   return rows;
 }
 
