@@ -52,18 +52,11 @@ set(QTB_WIDE_KERNEL_SOURCES
   blas/kernels/level3/avx/dgemm_kernel.cpp
 )
 
-# Vectorised by hand: what the compiler's own vectorisers add is code that makes short and strided vectors slower, whose
-# spare lanes can raise exceptions that the elements do not, and that moves tiles out of registers.
-set(qtb_hand_vectorised ${QTB_KERNEL_SOURCES} ${qtb_tier_sources})
-list(FILTER qtb_hand_vectorised INCLUDE REGEX "^blas/kernels/level[13]/")
-set_property(SOURCE ${qtb_hand_vectorised} APPEND PROPERTY
-  COMPILE_OPTIONS "-fno-tree-vectorize;-fno-tree-slp-vectorize")
 # Vectorised by hand: what the compiler's own vectoriser adds is code that makes short and strided vectors slower, and
 # whose spare lanes can raise exceptions that the elements do not.
-set(qtb_hand_vectorised ${QTB_KERNEL_SOURCES})
-list(FILTER qtb_hand_vectorised INCLUDE REGEX "^blas/kernels/level1/")
-set_source_files_properties(${qtb_hand_vectorised} PROPERTIES
-  COMPILE_OPTIONS "-fno-tree-vectorize")
+set(qtb_hand_vectorised ${QTB_KERNEL_SOURCES} ${qtb_tier_sources})
+list(FILTER qtb_hand_vectorised INCLUDE REGEX "^blas/kernels/level[13]/")
+set_property(SOURCE ${qtb_hand_vectorised} APPEND PROPERTY COMPILE_OPTIONS "-fno-tree-vectorize")
 
 # Compiled once.
 set(QTB_CORE_SOURCES
