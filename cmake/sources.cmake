@@ -20,10 +20,11 @@ set(QTB_KERNEL_SOURCES
   blas/kernels/level1/swap.cpp
   # level3
   blas/kernels/level3/blocks.cpp
+  blas/kernels/level3/gemm.cpp
   blas/kernels/level3/pack.cpp
+  blas/kernels/level3/scale_c.cpp
+  blas/kernels/level3/small.cpp
   # plain
-  blas/kernels/plain/gemm.cpp
-  blas/kernels/plain/gemm_packed.cpp
   blas/kernels/plain/gemv.cpp
   blas/kernels/plain/ger.cpp
   blas/kernels/plain/symm.cpp
@@ -39,6 +40,20 @@ set(QTB_KERNEL_SOURCES
 )
 
 # Compiled for some tiers only.
+set(QTB_KERNEL_SOURCES_ssse3
+  blas/kernels/level3/ssse3/gemm_kernel.cpp
+set(QTB_KERNEL_SOURCES_def
+  blas/kernels/level3/low/def_kernels.cpp
+  blas/kernels/level3/low/dgemm_def.cpp
+  blas/kernels/level3/low/folding_gemm.cpp
+  blas/kernels/level3/low/folding_kernels.cpp
+)
+set(QTB_KERNEL_SOURCES_sse3
+  blas/kernels/level3/low/dgemm_sse3.cpp
+  blas/kernels/level3/low/folding_gemm.cpp
+  blas/kernels/level3/low/folding_kernels.cpp
+  blas/kernels/level3/low/sse3_kernels.cpp
+)
 set(QTB_KERNEL_SOURCES_sse42
   blas/kernels/level3/sse42/gemm_kernel.cpp
 )
@@ -46,7 +61,7 @@ set(QTB_KERNEL_SOURCES_avx
   blas/kernels/level3/avx/dgemm_kernel.cpp
   blas/kernels/level3/sse42/gemm_kernel.cpp
 )
-set(qtb_tier_sources ${QTB_KERNEL_SOURCES_sse42} ${QTB_KERNEL_SOURCES_avx})
+set(qtb_tier_sources ${QTB_KERNEL_SOURCES_ssse3} ${QTB_KERNEL_SOURCES_sse42} ${QTB_KERNEL_SOURCES_avx})
 # Of these, the ones in the wider encoding: tests/product/mnemonics/vex_objects.txt has the same list.
 set(QTB_WIDE_KERNEL_SOURCES
   blas/kernels/level3/avx/dgemm_kernel.cpp

@@ -7,9 +7,33 @@
 #include <vector>
 
 #include "tests/kernels/pieces.h"
+#include "tests/reference/panels.h"
 
 namespace qtb::test {
 namespace {
+
+using reference::column_widths;
+using reference::padded_depth;
+
+// The copy routines that have no slot: the bodies of their own tier call them.
+#define DECLARE_COPY(T, name) extern "C" QTB_HIDDEN QTB_FUNCTION(panel_copy, T, name);
+#define DECLARE_A_NT(tier, T, name)                    \
+  DECLARE_COPY(T, qtb_blas_##tier##_x##name##_acopy_n) \
+  DECLARE_COPY(T, qtb_blas_##tier##_x##name##_acopy_t)
+#define DECLARE_B_NT(tier, T, name)                    \
+  DECLARE_COPY(T, qtb_blas_##tier##_x##name##_bcopy_n) \
+  DECLARE_COPY(T, qtb_blas_##tier##_x##name##_bcopy_t)
+#define DECLARE_REAL(tier, T, name) DECLARE_A_NT(tier, T, name) DECLARE_B_NT(tier, T, name)
+#define DECLARE_COMPLEX_A(tier, T, name) \
+  DECLARE_A_NT(tier, T, name) DECLARE_COPY(T, qtb_blas_##tier##_x##name##_acopy_c)
+#define DECLARE_TIER(tier, TIER)         \
+  DECLARE_REAL(tier, float, sgemm)       \
+  DECLARE_COMPLEX_A(tier, cfloat, cgemm) \
+  DECLARE_COMPLEX_A(tier, cdouble, zgemm)
+QTB_FOR_EACH_TIER(DECLARE_TIER)
+DECLARE_REAL(def, double, dgemm)
+DECLARE_REAL(def, double, dgemm_def)
+DECLARE_REAL(sse3, double, dgemm)
 
 template <class T>
 struct Pieces {
@@ -19,110 +43,63 @@ struct Pieces {
   using Packed = QTB_FUNCTION_TYPE(gemm_packed, T);
   const char *name;
   int tier;
-  QtbInt mr, nr, ku;
+  reference::PanelTile tile;
   Copy *acopy[3], *bcopy[3];  // N, T, C
   BPacked *bpacked;
   APacked *apacked;
   Packed *packed;
 };
 
-#define COPIES_NT(name) \
-  { name##_n, name##_t, name##_t }
-#define COPIES_NTC(name) \
-  { name##_n, name##_t, name##_c }
+#define COPIES_REAL(p) \
+  {p##_acopy_n, p##_acopy_t, p##_acopy_t}, { p##_bcopy_n, p##_bcopy_t, p##_bcopy_t }
+#define COPIES_COMPLEX(p) \
+  {p##_acopy_n, p##_acopy_t, p##_acopy_c}, { p##_bcopy_n, p##_bcopy_t, p##_bcopy_c }
+#define REAL(tier, name, mr, nr, ku) #name, tier_##tier, {mr, nr, ku }, COPIES_REAL(qtb_blas_##tier##_x##name)
+#define COMPLEX(tier, name, mr, nr, ku) #name, tier_##tier, {mr, nr, ku }, COPIES_COMPLEX(qtb_blas_##tier##_x##name)
 constexpr std::nullptr_t none = nullptr;
 
 template <class T>
 const std::vector<Pieces<T>> families;
 
+// clang-format off
 template <>
 const std::vector<Pieces<float>> families<float> = {
-    {"sgemm_sse41", tier_ssse3, 8, 4, 4, COPIES_NT(qtb_blas_ssse3_xsgemm_sse41_acopy),
-     COPIES_NT(qtb_blas_ssse3_xsgemm_sse41_bcopy), none, none, qtb_blas_ssse3_xsgemm_sse41_packed},
+    {REAL(def,   sgemm,       8, 4, 4), none, none, none},
+    {REAL(sse3,  sgemm,       8, 4, 4), none, none, none},
+    {REAL(ssse3, sgemm,       8, 4, 4), none, none, none},
+    {REAL(ssse3, sgemm_sse41, 8, 4, 4), none, none, qtb_blas_ssse3_xsgemm_sse41_packed},
+    {REAL(sse42, sgemm,       4, 8, 4), none, none, none},
+    {REAL(avx,   sgemm,       4, 8, 4), none, none, none},
 };
 template <>
 const std::vector<Pieces<double>> families<double> = {
-    {"dgemm", tier_ssse3, 4, 4, 4, COPIES_NT(qtb_blas_ssse3_xdgemm_acopy), COPIES_NT(qtb_blas_ssse3_xdgemm_bcopy),
-     qtb_blas_ssse3_xdgemm_bpacked, none, none},
-    {"dgemm_sse41", tier_ssse3, 4, 4, 4, COPIES_NT(qtb_blas_ssse3_xdgemm_sse41_acopy),
-     COPIES_NT(qtb_blas_ssse3_xdgemm_sse41_bcopy), none, none, qtb_blas_ssse3_xdgemm_sse41_packed},
-    {"dgemm", tier_sse42, 2, 8, 4, COPIES_NT(qtb_blas_sse42_xdgemm_acopy), COPIES_NT(qtb_blas_sse42_xdgemm_bcopy),
-     qtb_blas_sse42_xdgemm_bpacked, qtb_blas_sse42_xdgemm_apacked, none},
-    {"dgemm", tier_avx, 8, 4, 4, COPIES_NT(qtb_blas_avx_xdgemm_acopy), COPIES_NT(qtb_blas_avx_xdgemm_bcopy),
-     qtb_blas_avx_xdgemm_bpacked, none, none},
+    {REAL(def,   dgemm,       2, 12, 4), none, none, none},
+    {REAL(def,   dgemm_def,   4, 4, 4), none, none, none},
+    {REAL(sse3,  dgemm,       4, 4, 4), none, none, none},
+    {REAL(ssse3, dgemm,       4, 4, 4), qtb_blas_ssse3_xdgemm_bpacked, none, none},
+    {REAL(ssse3, dgemm_sse41, 4, 4, 4), none, none, qtb_blas_ssse3_xdgemm_sse41_packed},
+    {REAL(sse42, dgemm,       2, 8, 4), qtb_blas_sse42_xdgemm_bpacked, qtb_blas_sse42_xdgemm_apacked, none},
+    {REAL(avx,   dgemm,       8, 4, 4), qtb_blas_avx_xdgemm_bpacked, none, none},
 };
 template <>
 const std::vector<Pieces<cfloat>> families<cfloat> = {
-    {"cgemm", tier_def, 4, 4, 4, {}, COPIES_NTC(qtb_blas_def_xcgemm_bcopy), none, none, none},
-    {"cgemm", tier_sse3, 4, 4, 4, {}, COPIES_NTC(qtb_blas_sse3_xcgemm_bcopy), none, none, none},
-    {"cgemm",
-     tier_ssse3,
-     4,
-     2,
-     2,
-     {},
-     COPIES_NTC(qtb_blas_ssse3_xcgemm_bcopy),
-     qtb_blas_ssse3_xcgemm_bpacked,
-     none,
-     none},
-    {"cgemm_sse41", tier_ssse3, 4, 2, 4, COPIES_NTC(qtb_blas_ssse3_xcgemm_sse41_acopy),
-     COPIES_NTC(qtb_blas_ssse3_xcgemm_sse41_bcopy), qtb_blas_ssse3_xcgemm_sse41, none,
-     qtb_blas_ssse3_xcgemm_sse41_packed},
-    {"cgemm",
-     tier_sse42,
-     2,
-     4,
-     4,
-     {},
-     COPIES_NTC(qtb_blas_sse42_xcgemm_bcopy),
-     qtb_blas_sse42_xcgemm_bpacked,
-     none,
-     none},
-    {"cgemm", tier_avx, 2, 4, 4, {}, COPIES_NTC(qtb_blas_avx_xcgemm_bcopy), qtb_blas_avx_xcgemm_bpacked, none, none},
+    {COMPLEX(def,   cgemm,       4, 4, 4), none, none, none},
+    {COMPLEX(sse3,  cgemm,       4, 4, 4), none, none, none},
+    {COMPLEX(ssse3, cgemm,       4, 2, 2), qtb_blas_ssse3_xcgemm_bpacked, none, none},
+    {COMPLEX(ssse3, cgemm_sse41, 4, 2, 4), qtb_blas_ssse3_xcgemm_sse41, none, qtb_blas_ssse3_xcgemm_sse41_packed},
+    {COMPLEX(sse42, cgemm,       2, 4, 4), qtb_blas_sse42_xcgemm_bpacked, none, none},
+    {COMPLEX(avx,   cgemm,       2, 4, 4), qtb_blas_avx_xcgemm_bpacked, none, none},
 };
 template <>
 const std::vector<Pieces<cdouble>> families<cdouble> = {
-    {"zgemm", tier_def, 2, 4, 4, {}, COPIES_NTC(qtb_blas_def_xzgemm_bcopy), none, none, none},
-    {"zgemm", tier_sse3, 2, 4, 4, {}, COPIES_NTC(qtb_blas_sse3_xzgemm_bcopy), none, none, none},
-    {"zgemm",
-     tier_ssse3,
-     2,
-     2,
-     2,
-     {},
-     COPIES_NTC(qtb_blas_ssse3_xzgemm_bcopy),
-     qtb_blas_ssse3_xzgemm_bpacked,
-     none,
-     none},
-    {"zgemm_sse41", tier_ssse3, 2, 2, 4, COPIES_NTC(qtb_blas_ssse3_xzgemm_sse41_acopy),
-     COPIES_NTC(qtb_blas_ssse3_xzgemm_sse41_bcopy), qtb_blas_ssse3_xzgemm_sse41, none,
-     qtb_blas_ssse3_xzgemm_sse41_packed},
-    {"zgemm",
-     tier_sse42,
-     1,
-     4,
-     4,
-     {},
-     COPIES_NTC(qtb_blas_sse42_xzgemm_bcopy),
-     qtb_blas_sse42_xzgemm_bpacked,
-     none,
-     none},
-    {"zgemm", tier_avx, 1, 4, 4, {}, COPIES_NTC(qtb_blas_avx_xzgemm_bcopy), qtb_blas_avx_xzgemm_bpacked, none, none},
+    {COMPLEX(def,   zgemm,       2, 4, 4), none, none, none},
+    {COMPLEX(sse3,  zgemm,       2, 4, 4), none, none, none},
+    {COMPLEX(ssse3, zgemm,       2, 2, 2), qtb_blas_ssse3_xzgemm_bpacked, none, none},
+    {COMPLEX(ssse3, zgemm_sse41, 2, 2, 4), qtb_blas_ssse3_xzgemm_sse41, none, qtb_blas_ssse3_xzgemm_sse41_packed},
+    {COMPLEX(sse42, zgemm,       1, 4, 4), qtb_blas_sse42_xzgemm_bpacked, none, none},
+    {COMPLEX(avx,   zgemm,       1, 4, 4), qtb_blas_avx_xzgemm_bpacked, none, none},
 };
-
-inline QtbInt round_up(QtbInt v, QtbInt multiple) { return (v + multiple - 1) / multiple * multiple; }
-
-// The widths of the micro-panels of n columns of B.
-inline std::vector<QtbInt> widths(QtbInt nr, QtbInt n) {
-  std::vector<QtbInt> w(static_cast<std::size_t>(n / nr), nr);
-  QtbInt rest = n % nr;
-  if (nr == 8 && rest >= 4) {
-    w.push_back(4);
-    rest -= 4;
-  }
-  if (rest > 0) w.push_back(rest);
-  return w;
-}
+// clang-format on
 
 // Elements of a panel whose micro-panels are ldp apart, the last of width w and depth kp.
 inline std::size_t panel_size(std::size_t micro_panels, QtbInt ldp, QtbInt w, QtbInt kp) {
@@ -141,26 +118,28 @@ struct Panel {
 
 template <class T>
 Panel<T> a_panel(const Pieces<T> &p, QtbInt m, QtbInt k) {
-  const QtbInt kp = round_up(k, p.ku);
-  return {static_cast<std::size_t>(m / p.mr), kp * p.mr, p.mr, kp};
+  const QtbInt kp = padded_depth(p.tile, k);
+  return {static_cast<std::size_t>(m / p.tile.mr), kp * p.tile.mr, p.tile.mr, kp};
 }
 template <class T>
 Panel<T> b_panel(const Pieces<T> &p, QtbInt n, QtbInt k) {
-  const QtbInt kp = round_up(k, p.ku);
-  const std::vector<QtbInt> w = widths(p.nr, n);
-  return {w.size(), kp * p.nr, w.empty() ? 0 : w.back(), kp};
+  const QtbInt kp = padded_depth(p.tile, k);
+  const std::vector<QtbInt> w = column_widths(p.tile, n);
+  return {w.size(), kp * p.tile.nr, w.empty() ? 0 : w.back(), kp};
 }
 
 // Sizes around the tile.
 template <class T>
 std::set<QtbInt> row_counts(const Pieces<T> &p) {
-  return {1, p.mr - 1, p.mr, p.mr + 1, 2 * p.mr + 3};
+  const QtbInt mr = p.tile.mr;
+  return {1, mr - 1, mr, mr + 1, 2 * mr + 3, 8 * mr + 1};
 }
 template <class T>
 std::set<QtbInt> column_counts(const Pieces<T> &p) {
-  return {1, 2, 3, p.nr - 1, p.nr, p.nr + 1, p.nr + 4, p.nr + 7, 2 * p.nr + 5};
+  const QtbInt nr = p.tile.nr;
+  return {1, 2, 3, nr - 1, nr, nr + 1, nr + 4, nr + 7, 2 * nr + 5, 2 * nr + 10};
 }
-constexpr QtbInt depths[] = {1, 3, 4, 5, 9};
+constexpr QtbInt depths[] = {1, 3, 4, 5, 9, 16, 21};
 
 }  // namespace
 }  // namespace qtb::test

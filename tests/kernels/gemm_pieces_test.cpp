@@ -1,5 +1,4 @@
-// The products that parallel drivers call on panels packed outside, the bodies of GEMM that a tier has for some sizes,
-// and the scaling of C.
+// The products that parallel drivers call on panels packed outside, and the scaling of C.
 #include "tests/kernels/gemm_families.h"
 
 namespace qtb::test {
@@ -14,54 +13,73 @@ class GemmPieces : public Seeded {
 using Types = testing::Types<float, double, cfloat, cdouble>;
 TYPED_TEST_SUITE(GemmPieces, Types);
 
-TYPED_TEST(GemmPieces, ProductsFromPanelsPackedOutsideAgreeWithTheOracle) {
-  using T = TypeParam;
+template <class T>
+bool takes_panels(const Pieces<T> &p) {
+  return processor_runs(p.tier) && (p.bpacked != nullptr || p.apacked != nullptr || p.packed != nullptr);
+}
+
+// Every product of a family that takes panels, at one size.
+template <class T>
+void expect_products(const Pieces<T> &p, int op_a, int op_b, QtbInt m, QtbInt n, QtbInt k) {
   const T scalars[][2] = {
       {value<T>(1, 0), value<T>(1, 0)}, {value<T>(-0.75, 0.5), value<T>(0.5, 0.25)}, {value<T>(2, -1), value<T>(0, 0)}};
-  for (const Pieces<T> &p : families<T>) {
-    if (!processor_runs(p.tier)) continue;
+  const T alpha = scalars[(m + n + k) % 3][0], beta = scalars[(m + n + k) % 3][1];
+  const char *ta = &letters[op_a], *tb = &letters[op_b];
+  Operand<T> a(op_a, m, k), b(op_b, k, n);
+  Panel<T> ap = a_panel(p, m, k), bp = b_panel(p, n, k);
+  const T *a0 = a.stored.array.data(), *b0 = b.stored.array.data();
+  const QtbInt lda = a.stored.ld, ldb = b.stored.ld;
+  p.acopy[op_a](&m, &k, a0, &lda, ap.array.data(), &ap.ldp, &alpha);
+  p.bcopy[op_b](&k, &n, b0, &ldb, bp.array.data(), &bp.ldp, &alpha);
+  ap.array.read_only();
+  bp.array.read_only();
+  Stored<T> before(m, n), c(m, n);
+  const auto reset = [&] {
+    c.take(before);
+    if (magnitude(widen(beta)) == 0) c.poison();
+  };
+  const QtbInt ldc = c.ld;
+  if (p.bpacked != nullptr) {
+    reset();
+    p.bpacked(ta, tb, &m, &n, &k, &alpha, a0, &lda, b0, &ldb, bp.array.data(), &bp.ldp, &beta, c.array.data(), &ldc);
+    expect_product(std::string(p.name) + "_bpacked", p.tier, k, alpha, a, b, beta, before, c);
+  }
+  if (p.apacked != nullptr) {
+    reset();
+    p.apacked(ta, tb, &m, &n, &k, &alpha, a0, &lda, ap.array.data(), &ap.ldp, b0, &ldb, &beta, c.array.data(), &ldc);
+    expect_product(std::string(p.name) + "_apacked", p.tier, k, alpha, a, b, beta, before, c);
+  }
+  if (p.packed != nullptr) {
+    reset();
+    p.packed(ta, tb, &m, &n, &k, &alpha, a0, &lda, ap.array.data(), &ap.ldp, b0, &ldb, bp.array.data(), &bp.ldp, &beta,
+             c.array.data(), &ldc);
+    expect_product(std::string(p.name) + "_packed", p.tier, k, alpha, a, b, beta, before, c);
+  }
+}
+
+TYPED_TEST(GemmPieces, ProductsFromPanelsPackedOutsideAgreeWithTheOracle) {
+  for (const auto &p : families<TypeParam>) {
+    if (!takes_panels(p)) continue;
     for (int op_a = 0; op_a < this->ops(); op_a++)
       for (int op_b = 0; op_b < this->ops(); op_b++)
         for (QtbInt m : row_counts(p))
           for (QtbInt n : column_counts(p))
             for (QtbInt k : depths) {
-              if (m == 0 || n == 0) continue;
-              const T alpha = scalars[(m + n + k) % 3][0], beta = scalars[(m + n + k) % 3][1];
-              const char *ta = &letters[op_a], *tb = &letters[op_b];
-              Operand<T> a(op_a, m, k), b(op_b, k, n);
-              Panel<T> ap = a_panel(p, m, k), bp = b_panel(p, n, k);
-              const T *a0 = a.stored.array.data(), *b0 = b.stored.array.data();
-              const QtbInt lda = a.stored.ld, ldb = b.stored.ld;
-              if (p.acopy[0] != nullptr) p.acopy[op_a](&m, &k, a0, &lda, ap.array.data(), &ap.ldp, &alpha);
-              p.bcopy[op_b](&k, &n, b0, &ldb, bp.array.data(), &bp.ldp, &alpha);
-              ap.array.read_only();
-              bp.array.read_only();
-              Stored<T> before(m, n), c(m, n);
-              const auto reset = [&] {
-                c.take(before);
-                if (magnitude(widen(beta)) == 0) c.poison();
-              };
-              const QtbInt ldc = c.ld;
-              if (p.bpacked != nullptr) {
-                reset();
-                p.bpacked(ta, tb, &m, &n, &k, &alpha, a0, &lda, b0, &ldb, bp.array.data(), &bp.ldp, &beta,
-                          c.array.data(), &ldc);
-                expect_product(std::string(p.name) + "_bpacked", p.tier, k, alpha, a, b, beta, before, c);
-              }
-              if (p.apacked != nullptr) {
-                reset();
-                p.apacked(ta, tb, &m, &n, &k, &alpha, a0, &lda, ap.array.data(), &ap.ldp, b0, &ldb, &beta,
-                          c.array.data(), &ldc);
-                expect_product(std::string(p.name) + "_apacked", p.tier, k, alpha, a, b, beta, before, c);
-              }
-              if (p.packed != nullptr) {
-                reset();
-                p.packed(ta, tb, &m, &n, &k, &alpha, a0, &lda, ap.array.data(), &ap.ldp, b0, &ldb, bp.array.data(),
-                         &bp.ldp, &beta, c.array.data(), &ldc);
-                expect_product(std::string(p.name) + "_packed", p.tier, k, alpha, a, b, beta, before, c);
-              }
+              if (m == 0 || n == 0 || (m + n + k) % 2 != (op_a + op_b) % 2) continue;
+              expect_products(p, op_a, op_b, m, n, k);
               if (this->HasFatalFailure()) return;
             }
+  }
+}
+
+TYPED_TEST(GemmPieces, PanelsDeeperThanTheDepthOfABlockAreTakenInSlices) {
+  for (const auto &p : families<TypeParam>) {
+    if (!takes_panels(p)) continue;
+    for (QtbInt k : {256, 257, 300, 515})
+      for (QtbInt n : {p.tile.nr, 2 * p.tile.nr + 3, p.tile.nr + 7}) {
+        expect_products(p, 0, 0, 2 * p.tile.mr + 1, n, k);
+        if (this->HasFatalFailure()) return;
+      }
   }
 }
 
@@ -79,56 +97,6 @@ TYPED_TEST(GemmPieces, ProductsOfNoRowsOrNoColumnsTouchNothing) {
       if (p.apacked != nullptr) p.apacked("N", "N", m, n, &k, &one, p0, &ld, p0, &ldp, p0, &ld, &zero, p0, &ld);
       if (p.packed != nullptr) p.packed("N", "N", m, n, &k, &one, p0, &ld, p0, &ldp, p0, &ld, p0, &ldp, &zero, p0, &ld);
     }
-  }
-}
-
-// The bodies that a tier has for some sizes.
-template <class T>
-struct Body {
-  using Gemm = QTB_FUNCTION_TYPE(gemm, T);
-  const char *name;
-  int tier;
-  Gemm *gemm;
-};
-template <class T>
-const std::vector<Body<T>> bodies;
-template <>
-const std::vector<Body<float>> bodies<float> = {
-    {"sgemm_nobcopy", tier_ssse3, qtb_blas_ssse3_xsgemm_nobcopy},
-    {"sgemm_nobcopy", tier_sse42, qtb_blas_sse42_xsgemm_nobcopy},
-    {"sgemm_nobcopy", tier_avx, qtb_blas_avx_xsgemm_nobcopy},
-    {"sgemm_sse41", tier_ssse3, qtb_blas_ssse3_xsgemm_sse41},
-};
-template <>
-const std::vector<Body<double>> bodies<double> = {
-    {"dgemm_nobcopy", tier_ssse3, qtb_blas_ssse3_xdgemm_nobcopy},
-    {"dgemm_nobcopy", tier_sse42, qtb_blas_sse42_xdgemm_nobcopy},
-    {"dgemm_sse41", tier_ssse3, qtb_blas_ssse3_xdgemm_sse41},
-    {"dgemm_def_run_a", tier_def, qtb_blas_def_xdgemm_def_run_a},
-    {"dgemm_def_run_b", tier_def, qtb_blas_def_xdgemm_def_run_b},
-};
-
-TYPED_TEST(GemmPieces, BodiesForSomeSizesComputeTheProduct) {
-  using T = TypeParam;
-  const T scalars[][2] = {
-      {value<T>(1, 0), value<T>(1, 0)}, {value<T>(-0.75, 0.5), value<T>(0.5, 0.25)}, {value<T>(2, -1), value<T>(0, 0)}};
-  for (const Body<T> &body : bodies<T>) {
-    if (!processor_runs(body.tier)) continue;
-    for (int op_a = 0; op_a < this->ops(); op_a++)
-      for (int op_b = 0; op_b < this->ops(); op_b++)
-        for (QtbInt m : {1, 3, 8, 13, 33})
-          for (QtbInt n : {1, 4, 9, 19})
-            for (QtbInt k : {0, 1, 5, 9, 130}) {
-              const T alpha = scalars[(m + n + k) % 3][0], beta = scalars[(m + n + k) % 3][1];
-              Operand<T> a(op_a, m, k), b(op_b, k, n);
-              Stored<T> before(m, n), c(m, n);
-              c.take(before);
-              if (magnitude(widen(beta)) == 0) c.poison();
-              body.gemm(&letters[op_a], &letters[op_b], &m, &n, &k, &alpha, a.stored.array.data(), &a.stored.ld,
-                        b.stored.array.data(), &b.stored.ld, &beta, c.array.data(), &c.ld);
-              expect_product(body.name, body.tier, k, alpha, a, b, beta, before, c);
-              if (this->HasFatalFailure()) return;
-            }
   }
 }
 

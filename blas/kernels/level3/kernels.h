@@ -6,7 +6,7 @@
 // multiple of 16 bytes. stage holds stage_bytes(kp) bytes on a 64-byte boundary, for the kernel's own use.
 //
 // InPlaceKernel<T, family>::run: C(0:m, 0:n) += Ap*op(B), where b is the first element of the depth x n block of op(B)
-// as it lies in memory. The panel of A is filled up with zeros as ever. stage also holds a micro-panel of B.
+// as it lies in memory. The panel of A is filled up with zeros as ever.
 //
 // A type and family without a tuned procedure in kernels.def has the plain loops below.
 #pragma once
@@ -81,9 +81,13 @@ struct KernelOf : PlainKernel<T, family> {};
 template <class T, Family family>
 struct InnerKernel : KernelOf<this_tier, T, family> {};
 
-// Without a kernel of its own for B in place, a family stages one micro-panel at a time.
+// Without a kernel of its own for B in place, a family packs one micro-panel at a time into the stage, ahead of what
+// the inner kernel has there. One of its own has the stage of the inner kernel.
 template <class T, Family family>
 struct StagedKernel {
+  static constexpr QtbInt stage_bytes(QtbInt kp) {
+    return kp * rules_of<T, family>.nr * static_cast<QtbInt>(sizeof(T)) + InnerKernel<T, family>::stage_bytes(kp);
+  }
   template <bool aligned>
   static void run_staged(QTB_IN_PLACE_KERNEL_PARAMS(T)) {
     constexpr GemmRules rules = rules_of<T, family>;
@@ -107,8 +111,9 @@ struct StagedKernel {
   }
 };
 
-template <class T, InPlaceProcedure<T> &any, InPlaceProcedure<T> &aligned>
+template <class T, Family family, InPlaceProcedure<T> &any, InPlaceProcedure<T> &aligned>
 struct TunedInPlaceKernel {
+  static constexpr QtbInt stage_bytes(QtbInt kp) { return InnerKernel<T, family>::stage_bytes(kp); }
   static void run(QTB_IN_PLACE_KERNEL_PARAMS(T)) { any(transb, m, n, depth, ap, ldap, b, ldb, c, ldc, stage); }
   static void run_aligned(QTB_IN_PLACE_KERNEL_PARAMS(T)) {
     aligned(transb, m, n, depth, ap, ldap, b, ldb, c, ldc, stage);
@@ -120,7 +125,7 @@ struct InPlaceKernelOf : StagedKernel<T, family> {};
 #define QTB_IN_PLACE_KERNEL(tier, T, family, any, aligned) \
   template <>                                              \
   struct InPlaceKernelOf<tier_##tier, T, Family::family>   \
-      : TunedInPlaceKernel<T, qtb_blas_##tier##_##any, qtb_blas_##tier##_##aligned> {};
+      : TunedInPlaceKernel<T, Family::family, qtb_blas_##tier##_##any, qtb_blas_##tier##_##aligned> {};
 #include "blas/kernels/level3/kernels.def"
 
 template <class T, Family family>

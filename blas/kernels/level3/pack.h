@@ -190,8 +190,22 @@ void pack_panels(QtbInt count, QtbInt depth, QtbInt padded, const T *src, QtbInt
   }
 }
 
+// Whether a panel of A takes the rows beyond a multiple of mr, in a last micro-panel filled up with zeros: its kernels
+// then store the rows that there are.
+template <class T>
+constexpr bool takes_all_rows = this_tier == tier_sse3 &&kind_of<T> == 'd';
+
+// So many rows, fewer than mr; element (i, l) at src[i*row + l*step].
+template <class T>
+void pack_last_rows(QtbInt rows, QtbInt mr, QtbInt depth, QtbInt padded, const T *src, QtbInt row, QtbInt step, T *dst,
+                    T alpha) {
+  fill_with_zeros(padded * mr, dst);
+  for (QtbInt l = 0; l < depth; l++)
+    for (QtbInt i = 0; i < rows; i++) dst[l * mr + i] = alpha * load_single(src + i * row + l * step);
+}
+
 // The A panel of a family from a rows x depth block of op(A): alpha folded in; rows beyond a multiple of mr are left
-// out.
+// out, where the panel does not take all.
 template <class T, Op op, Family family>
 void pack_a(QtbInt rows, QtbInt depth, const T *src, QtbInt ld, T *dst, QtbInt ldp, T alpha) {
   constexpr GemmRules rules = rules_of<T, family>;
@@ -202,6 +216,12 @@ void pack_a(QtbInt rows, QtbInt depth, const T *src, QtbInt ld, T *dst, QtbInt l
     pack_panels<T, mr, mr, false>(whole, depth, padded, src, ld, dst, ldp, ScaledConjugate<T>(alpha));
   else
     pack_panels<T, mr, mr, op == Op::none>(whole, depth, padded, src, ld, dst, ldp, Scaled<T>(alpha));
+  if constexpr (takes_all_rows<T>) {
+    const QtbInt row = op == Op::none ? 1 : ld, step = op == Op::none ? ld : 1;
+    if (whole < rows)
+      pack_last_rows(rows - whole, rules.mr, depth, padded, src + whole * row, row, step, dst + whole / rules.mr * ldp,
+                     alpha);
+  }
 }
 
 // The B panel of a family from a depth x columns block of op(B). A tile of 12 columns leaves out fewer than 4.

@@ -156,7 +156,7 @@ inline bool level_is_small(const std::uint32_t *caches, int level, std::uint32_t
   return caches[0] != 0 && caches[level] <= bytes;
 }
 
-inline bool reads_caches(const GemmRules &rules) {
+constexpr bool reads_caches(const GemmRules &rules) {
   return rules.mb.rule == Rows::small_l2 || rules.mb.rule == Rows::small_l3;
 }
 

@@ -91,6 +91,8 @@ inline void store_halves(double *p, __m128d v) {
 // The parts of elements: of a real element, itself.
 inline const float *parts(const float *p) { return p; }
 inline const double *parts(const double *p) { return p; }
+inline float *parts(float *p) { return p; }
+inline double *parts(double *p) { return p; }
 template <class R>
 const R *parts(const Complex<R> *p) {
   return reinterpret_cast<const R *>(p);
