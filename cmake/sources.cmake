@@ -40,8 +40,6 @@ set(QTB_KERNEL_SOURCES
 )
 
 # Compiled for some tiers only.
-set(QTB_KERNEL_SOURCES_ssse3
-  blas/kernels/level3/ssse3/gemm_kernel.cpp
 set(QTB_KERNEL_SOURCES_def
   blas/kernels/level3/low/def_kernels.cpp
   blas/kernels/level3/low/dgemm_def.cpp
@@ -54,6 +52,9 @@ set(QTB_KERNEL_SOURCES_sse3
   blas/kernels/level3/low/folding_kernels.cpp
   blas/kernels/level3/low/sse3_kernels.cpp
 )
+set(QTB_KERNEL_SOURCES_ssse3
+  blas/kernels/level3/ssse3/gemm_kernel.cpp
+)
 set(QTB_KERNEL_SOURCES_sse42
   blas/kernels/level3/sse42/gemm_kernel.cpp
 )
@@ -61,7 +62,8 @@ set(QTB_KERNEL_SOURCES_avx
   blas/kernels/level3/avx/dgemm_kernel.cpp
   blas/kernels/level3/sse42/gemm_kernel.cpp
 )
-set(qtb_tier_sources ${QTB_KERNEL_SOURCES_ssse3} ${QTB_KERNEL_SOURCES_sse42} ${QTB_KERNEL_SOURCES_avx})
+set(qtb_tier_sources ${QTB_KERNEL_SOURCES_def} ${QTB_KERNEL_SOURCES_sse3} ${QTB_KERNEL_SOURCES_ssse3}
+  ${QTB_KERNEL_SOURCES_sse42} ${QTB_KERNEL_SOURCES_avx})
 # Of these, the ones in the wider encoding: tests/product/mnemonics/vex_objects.txt has the same list.
 set(QTB_WIDE_KERNEL_SOURCES
   blas/kernels/level3/avx/dgemm_kernel.cpp
