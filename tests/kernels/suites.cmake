@@ -5,11 +5,9 @@ qtb_add_test(vector_memory_test SOURCES kernels/vector_memory_test.cpp LIBRARIES
 qtb_add_test(vector_sweep_test SOURCES kernels/vector_sweep_test.cpp LIBRARIES qtb_static SHARDS 2)
 qtb_add_test(gemm_blocks_test SOURCES kernels/gemm_blocks_test.cpp LIBRARIES qtb_static)
 qtb_add_test(gemm_body_test SOURCES kernels/gemm_body_test.cpp LIBRARIES qtb_static qtb_platform_fake SHARDS 4)
+qtb_add_test(gemm_kernels_test SOURCES kernels/gemm_kernels_test.cpp LIBRARIES qtb_static)
 qtb_add_test(gemm_pack_test SOURCES kernels/gemm_pack_test.cpp LIBRARIES qtb_static qtb_platform_fake)
 qtb_add_test(gemm_pieces_test SOURCES kernels/gemm_pieces_test.cpp LIBRARIES qtb_static qtb_platform_fake)
-qtb_add_test(gemm_pack_test SOURCES kernels/gemm_pack_test.cpp LIBRARIES qtb_static)
-qtb_add_test(gemm_kernels_test SOURCES kernels/gemm_kernels_test.cpp LIBRARIES qtb_static)
-qtb_add_test(gemm_pieces_test SOURCES kernels/gemm_pieces_test.cpp LIBRARIES qtb_static)
 qtb_add_test(triangle_pieces_test SOURCES kernels/triangle_pieces_test.cpp LIBRARIES qtb_static SHARDS 2)
 # level1
 qtb_add_test(extended_dot_test SOURCES kernels/extended_dot_test.cpp LIBRARIES qtb_static)
