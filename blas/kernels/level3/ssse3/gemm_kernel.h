@@ -293,6 +293,13 @@ template <class Scheme, class R, class T, int operands, int forms>
   });
 }
 
+// The address waits for a sum of the line before, so that compilers keep lines of depth in their order. Left alone they
+// gather the prefetches of straight-line code at its start, and mix two lines into a worse order than either has.
+template <class R, class V>
+[[gnu::always_inline]] inline void keep_apart(const R *&a, V &sum) {
+  __asm__("" : "+r"(a), "+x"(sum));
+}
+
 // The rows of A against the operands of one micro-panel. fixed_lines > 0: of that many lines, in straight-line code;
 // otherwise each turn takes the least depth that kp is a multiple of.
 template <class T, Family family, int width, bool aligned, int fixed_lines>
@@ -316,13 +323,13 @@ template <class T, Family family, int width, bool aligned, int fixed_lines>
     if constexpr (fixed_lines > 0) {
       repeat<fixed_lines>([&](auto l) __attribute__((always_inline)) {
         multiply_add_line<Scheme>(a + l.value * line, operand + l.value * 2 * Scheme::b_step, sums);
-        // An address that waits for a sum keeps the prefetches of straight-line code from gathering at its start.
-        __asm__("" : "+r"(a), "+x"(sums.at[0][0]));
+        keep_apart(a, sums.at[0][0]);
       });
     } else {
       for (QtbInt left = kp; left > 0; left -= rules.ku) {
         repeat<lines_per_turn>([&](auto l) __attribute__((always_inline)) {
           multiply_add_line<Scheme>(a + l.value * line, operand + l.value * 2 * Scheme::b_step, sums);
+          keep_apart(a, sums.at[0][0]);
         });
         a += lines_per_turn * line;
         operand += lines_per_turn * 2 * Scheme::b_step;
