@@ -9,6 +9,7 @@ qtb_add_test(gemm_copy_test SOURCES kernels/gemm_copy_test.cpp LIBRARIES qtb_sta
 qtb_add_test(gemm_pieces_test SOURCES kernels/gemm_pieces_test.cpp LIBRARIES qtb_static qtb_platform_fake)
 qtb_add_test(gemm_copy_test SOURCES kernels/gemm_copy_test.cpp LIBRARIES qtb_static)
 qtb_add_test(gemm_kernels_test SOURCES kernels/gemm_kernels_test.cpp LIBRARIES qtb_static)
+qtb_add_test(gemm_low_kernels_test SOURCES kernels/gemm_low_kernels_test.cpp LIBRARIES qtb_static)
 qtb_add_test(gemm_pieces_test SOURCES kernels/gemm_pieces_test.cpp LIBRARIES qtb_static)
 qtb_add_test(triangle_pieces_test SOURCES kernels/triangle_pieces_test.cpp LIBRARIES qtb_static SHARDS 2)
 # level1
