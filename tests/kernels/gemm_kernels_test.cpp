@@ -59,13 +59,8 @@ constexpr TileOf tiles[] = {
     {'s', tier_set::SSSE3, "sse41", 8, 4, 4}, {'c', from_sse42, "base", 2, 4, 4},
     {'c', tier_set::SSSE3, "base", 4, 2, 2},  {'c', tier_set::SSSE3, "sse41", 4, 2, 4},
     {'z', from_sse42, "base", 1, 4, 4},       {'z', tier_set::SSSE3, "base", 2, 2, 2},
-<<<<<<< HEAD
     {'z', tier_set::SSSE3, "sse41", 2, 2, 4}, {'d', tier_set::DEF, "def_a", 4, 4, 4},
     {'s', to_sse3, "base", 8, 4, 4},          {'c', to_sse3, "base", 4, 4, 4},
-=======
-    {'z', tier_set::SSSE3, "sse41", 2, 2, 4}, {'s', to_sse3, "base", 8, 4, 4},
-    {'d', tier_set::DEF, "def_a", 4, 4, 4},   {'c', to_sse3, "base", 4, 4, 4},
->>>>>>> gemm_low
     {'z', to_sse3, "base", 2, 4, 4},
 };
 
