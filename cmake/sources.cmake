@@ -64,18 +64,16 @@ set(QTB_KERNEL_SOURCES_avx
 )
 set(qtb_tier_sources ${QTB_KERNEL_SOURCES_def} ${QTB_KERNEL_SOURCES_sse3} ${QTB_KERNEL_SOURCES_ssse3}
   ${QTB_KERNEL_SOURCES_sse42} ${QTB_KERNEL_SOURCES_avx})
-
 # Of these, the ones in the wider encoding: tests/product/mnemonics/vex_objects.txt has the same list.
 set(QTB_WIDE_KERNEL_SOURCES
   blas/kernels/level3/avx/dgemm_kernel.cpp
 )
 
-# Vectorised by hand: what the compiler's own vectoriser adds is code that makes short and strided vectors slower, whose
-# spare lanes can raise exceptions that the elements do not, and that moves tiles out of registers.
+# Vectorised by hand: what the compiler's own vectoriser adds is code that makes short and strided vectors slower, and
+# whose spare lanes can raise exceptions that the elements do not.
 set(qtb_hand_vectorised ${QTB_KERNEL_SOURCES} ${qtb_tier_sources})
 list(FILTER qtb_hand_vectorised INCLUDE REGEX "^blas/kernels/level[13]/")
-set_property(SOURCE ${qtb_hand_vectorised} APPEND PROPERTY
-  COMPILE_OPTIONS "-fno-tree-vectorize")
+set_property(SOURCE ${qtb_hand_vectorised} APPEND PROPERTY COMPILE_OPTIONS "-fno-tree-vectorize")
 
 # Compiled once.
 set(QTB_CORE_SOURCES

@@ -51,7 +51,7 @@ struct TileOf {
   std::string_view family;
   QtbInt mr, nr, ku;
 };
-constexpr unsigned from_sse42 = tier_set::SSE42 | tier_set::AVX;
+constexpr unsigned from_sse42 = tier_set::SSE42 | tier_set::AVX, to_sse3 = tier_set::DEF | tier_set::SSE3;
 constexpr TileOf tiles[] = {
     {'d', tier_set::AVX, "base", 8, 4, 4},    {'d', tier_set::SSE42, "base", 2, 8, 4},
     {'d', tier_set::SSSE3, "base", 4, 4, 4},  {'d', tier_set::SSSE3, "sse41", 4, 4, 4},
@@ -59,7 +59,9 @@ constexpr TileOf tiles[] = {
     {'s', tier_set::SSSE3, "sse41", 8, 4, 4}, {'c', from_sse42, "base", 2, 4, 4},
     {'c', tier_set::SSSE3, "base", 4, 2, 2},  {'c', tier_set::SSSE3, "sse41", 4, 2, 4},
     {'z', from_sse42, "base", 1, 4, 4},       {'z', tier_set::SSSE3, "base", 2, 2, 2},
-    {'z', tier_set::SSSE3, "sse41", 2, 2, 4},
+    {'z', tier_set::SSSE3, "sse41", 2, 2, 4}, {'d', tier_set::DEF, "def_a", 4, 4, 4},
+    {'s', to_sse3, "base", 8, 4, 4},          {'c', to_sse3, "base", 4, 4, 4},
+    {'z', to_sse3, "base", 2, 4, 4},
 };
 
 template <class T>

@@ -55,6 +55,7 @@ expect avx named "global symbol qtb_blas_ssse3_xnamed"
 
 compile kernel "" <<'END'
 extern "C" void qtb_blas_sse42_zgemm_kernel_cu(double *x) { x[0] += x[1]; }
+extern "C" void qtb_blas_sse42_sgemm_nobcopy_kernel(float *x) { x[0] += x[1]; }
 END
 expect sse42 kernel ""
 expect avx kernel "global symbol qtb_blas_sse42_zgemm_kernel_cu"
