@@ -72,14 +72,16 @@ inline __m128d interleaved_low(__m128d a, __m128d b) { return _mm_unpacklo_pd(a,
 inline __m128 interleaved_high(__m128 a, __m128 b) { return _mm_unpackhi_ps(a, b); }
 inline __m128d interleaved_high(__m128d a, __m128d b) { return _mm_unpackhi_pd(a, b); }
 
-// v *= the vector at p, a multiple of 16 bytes. Told in the instruction's own words because compilers load a vector
-// that is used twice into a register of its own.
+// v *= the vector at p, a multiple of 16 bytes, and sum += v. Told in the instructions' own words: compilers load a
+// vector that is used twice into a register of its own, and add to whichever operand they like and copy the sum back.
 [[gnu::always_inline]] inline void multiply_by_memory(__m128 &v, const float *p) {
   __asm__("mulps %1, %0" : "+x"(v) : "m"(*reinterpret_cast<const __m128 *>(p)));
 }
 [[gnu::always_inline]] inline void multiply_by_memory(__m128d &v, const double *p) {
   __asm__("mulpd %1, %0" : "+x"(v) : "m"(*reinterpret_cast<const __m128d *>(p)));
 }
+[[gnu::always_inline]] inline void add_to(__m128 &sum, __m128 v) { __asm__("addps %1, %0" : "+x"(sum) : "x"(v)); }
+[[gnu::always_inline]] inline void add_to(__m128d &sum, __m128d v) { __asm__("addpd %1, %0" : "+x"(sum) : "x"(v)); }
 
 // ---- Schemes ----
 //
@@ -280,17 +282,22 @@ template <class Scheme, class R, class T, int operands, int forms>
         keep_in_place(operand);
       }
       repeat<Scheme::products(j.value)>([&](auto i) __attribute__((always_inline)) {
-        Vec<T> &sum = sums.at[j.value][i.value];
         Vec<T> product = rows.at[i.value];
         if constexpr (in_memory)
           multiply_by_memory(product, operands_of_k + j.value * step);
         else
           product = mul(operand, product);
-        sum = add(sum, product);
-        keep_in_place(sum);
+        add_to(sums.at[j.value][i.value], product);
       });
     });
   });
+}
+
+// The address waits for a sum of the line before, so that compilers keep lines of depth in their order. Left alone they
+// gather the prefetches of straight-line code at its start, and mix two lines into a worse order than either has.
+template <class R, class V>
+[[gnu::always_inline]] inline void keep_apart(const R *&a, V &sum) {
+  __asm__("" : "+r"(a), "+x"(sum));
 }
 
 // The rows of A against the operands of one micro-panel. fixed_lines > 0: of that many lines, in straight-line code;
@@ -316,13 +323,13 @@ template <class T, Family family, int width, bool aligned, int fixed_lines>
     if constexpr (fixed_lines > 0) {
       repeat<fixed_lines>([&](auto l) __attribute__((always_inline)) {
         multiply_add_line<Scheme>(a + l.value * line, operand + l.value * 2 * Scheme::b_step, sums);
-        // An address that waits for a sum keeps the prefetches of straight-line code from gathering at its start.
-        __asm__("" : "+r"(a), "+x"(sums.at[0][0]));
+        keep_apart(a, sums.at[0][0]);
       });
     } else {
       for (QtbInt left = kp; left > 0; left -= rules.ku) {
         repeat<lines_per_turn>([&](auto l) __attribute__((always_inline)) {
           multiply_add_line<Scheme>(a + l.value * line, operand + l.value * 2 * Scheme::b_step, sums);
+          keep_apart(a, sums.at[0][0]);
         });
         a += lines_per_turn * line;
         operand += lines_per_turn * 2 * Scheme::b_step;
