@@ -296,8 +296,8 @@ template <class Scheme, class R, class T, int operands, int forms>
 // The address waits for a sum of the line before, so that compilers keep lines of depth in their order. Left alone they
 // gather the prefetches of straight-line code at its start, and mix two lines into a worse order than either has.
 template <class R, class V>
-[[gnu::always_inline]] inline void keep_apart(const R *&a, V &sum) {
-  __asm__("" : "+r"(a), "+x"(sum));
+[[gnu::always_inline]] inline void keep_apart(const R *&address, V &sum) {
+  __asm__("" : "+r"(address), "+x"(sum));
 }
 
 // The rows of A against the operands of one micro-panel. fixed_lines > 0: of that many lines, in straight-line code;
@@ -321,9 +321,13 @@ template <class T, Family family, int width, bool aligned, int fixed_lines>
     });
     const R *a = parts(ap), *operand = b;
     if constexpr (fixed_lines > 0) {
-      repeat<fixed_lines>([&](auto l) __attribute__((always_inline)) {
-        multiply_add_line<Scheme>(a + l.value * line, operand + l.value * 2 * Scheme::b_step, sums);
+      repeat<fixed_lines>([&](auto) __attribute__((always_inline)) {
+        multiply_add_line<Scheme>(a, operand, sums);
+        // Offsets of one byte: the speed of straight-line code is that at which it can be fetched.
+        a += line;
+        operand += 2 * Scheme::b_step;
         keep_apart(a, sums.at[0][0]);
+        keep_apart(operand, sums.at[0][0]);
       });
     } else {
       for (QtbInt left = kp; left > 0; left -= rules.ku) {
