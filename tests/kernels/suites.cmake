@@ -5,6 +5,7 @@ qtb_add_test(vector_memory_test SOURCES kernels/vector_memory_test.cpp LIBRARIES
 qtb_add_test(vector_sweep_test SOURCES kernels/vector_sweep_test.cpp LIBRARIES qtb_static SHARDS 2)
 qtb_add_test(gemm_blocks_test SOURCES kernels/gemm_blocks_test.cpp LIBRARIES qtb_static)
 qtb_add_test(gemm_copy_test SOURCES kernels/gemm_copy_test.cpp LIBRARIES qtb_static)
+qtb_add_test(gemm_in_place_test SOURCES kernels/gemm_in_place_test.cpp LIBRARIES qtb_static)
 qtb_add_test(gemm_kernels_test SOURCES kernels/gemm_kernels_test.cpp LIBRARIES qtb_static)
 qtb_add_test(gemm_pieces_test SOURCES kernels/gemm_pieces_test.cpp LIBRARIES qtb_static)
 qtb_add_test(triangle_pieces_test SOURCES kernels/triangle_pieces_test.cpp LIBRARIES qtb_static SHARDS 2)
