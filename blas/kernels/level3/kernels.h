@@ -8,7 +8,7 @@
 // InPlaceKernel<T, family>::run: C(0:m, 0:n) += Ap*op(B), where b is the first element of the depth x n block of op(B)
 // as it lies in memory. The panel of A is filled up with zeros as ever.
 //
-// A type and family without a tuned procedure in kernels.def has the plain loops below.
+// Both take the procedures of kernels.def.
 #pragma once
 
 #include "blas/kernels/level3/copies.h"
@@ -34,29 +34,6 @@ extern "C" {
 namespace qtb::QTB_TIER {
 namespace {
 
-// The kernel of a family that has no tuned one.
-template <class T, Family family>
-struct PlainKernel {
-  static void run(QTB_INNER_KERNEL_PARAMS(T)) {
-    constexpr QtbInt mr = rules_of<T, family>.mr, nr = rules_of<T, family>.nr;
-    static_cast<void>(stage);
-    for (QtbInt j0 = 0, w; j0 < n; j0 += w, bp += ldbp) {
-      w = panel_width(nr, n - j0);
-      for (QtbInt i0 = 0; i0 < m; i0 += mr) {
-        const T *a = ap + i0 / mr * ldap;
-        for (QtbInt j = 0; j < w; j++)
-          for (QtbInt i = 0; i < mr; i++) {
-            T sum{};
-            for (QtbInt l = 0; l < kp; l++) sum += a[l * mr + i] * bp[l * w + j];
-            c[i0 + i + (j0 + j) * ldc] += sum;
-          }
-      }
-    }
-  }
-  static void run_aligned(QTB_INNER_KERNEL_PARAMS(T)) { run(m, n, kp, ap, ldap, bp, ldbp, c, ldc, stage); }
-  static constexpr QtbInt stage_bytes(QtbInt) { return 0; }
-};
-
 template <class T>
 using InnerProcedure = void(QTB_INNER_KERNEL_PARAMS(T));
 template <class T>
@@ -71,7 +48,7 @@ struct TunedKernel {
 
 // The kernels by tier: every tier's build sees the whole list and takes its own.
 template <ProcessorTier tier, class T, Family family>
-struct KernelOf : PlainKernel<T, family> {};
+struct KernelOf;
 #define QTB_INNER_KERNEL(tier, T, family, any, aligned, stage) \
   template <>                                                  \
   struct KernelOf<tier_##tier, T, Family::family>              \

@@ -17,7 +17,7 @@ constexpr QtbInt fixed_depth = 128;
     else                                                                                    \
       multiply_panels<T, Family::base, false>(m, n, kp, ap, ldap, bp, ldbp, c, ldc, stage); \
   }                                                                                         \
-  extern "C" void QTB_TIER_NAME(name##_nobcopy_kernel)(QTB_IN_PLACE_KERNEL_PARAMS(T)) {     \
+  extern "C" void QTB_TIER_NAME(name##_kernel_nobcopy)(QTB_IN_PLACE_KERNEL_PARAMS(T)) {     \
     if (is_aligned(c, ldc))                                                                 \
       multiply_in_place<T, true>(transb, m, n, depth, ap, ldap, b, ldb, c, ldc, stage);     \
     else                                                                                    \
@@ -39,10 +39,10 @@ COMPLEX_KERNELS(zgemm, cdouble)
 
 // The SSE4.1 family: no instruction of it is above the tier's set; its design is that of the processors that have more.
 #define SSE41_KERNELS(name, T)                                                             \
-  extern "C" void QTB_TIER_NAME(name##_sse41_kernel_cu)(QTB_INNER_KERNEL_PARAMS(T)) {      \
+  extern "C" void QTB_TIER_NAME(name##_kernel_sse41_cu)(QTB_INNER_KERNEL_PARAMS(T)) {      \
     multiply_panels<T, Family::sse41, false>(m, n, kp, ap, ldap, bp, ldbp, c, ldc, stage); \
   }                                                                                        \
-  extern "C" void QTB_TIER_NAME(name##_sse41_kernel_ca)(QTB_INNER_KERNEL_PARAMS(T)) {      \
+  extern "C" void QTB_TIER_NAME(name##_kernel_sse41_ca)(QTB_INNER_KERNEL_PARAMS(T)) {      \
     multiply_panels<T, Family::sse41, true>(m, n, kp, ap, ldap, bp, ldbp, c, ldc, stage);  \
   }
 SSE41_KERNELS(sgemm, float)

@@ -26,16 +26,16 @@
 namespace qtb::QTB_TIER {
 namespace {
 
-// Real parts in a vector, and vectors of A in one step of depth.
+// Real parts in a vector, as the offset of one vector from the next, and vectors of A in one step of depth.
 template <class T>
-constexpr int parts_per_lane_group = static_cast<int>(lanes<Real<T>>);
+constexpr int vector_step = static_cast<int>(parts_per_vector<T>);
 constexpr int row_vectors = 2;
 template <class T>
 constexpr int parts_of = is_complex<T> ? 2 : 1;
 
 constexpr QtbInt line_bytes = 64;
 
-template <_mm_hint hint, class T>
+template <auto hint, class T>
 [[gnu::always_inline]] inline void prefetch(const T *p, QtbInt bytes_ahead) {
   _mm_prefetch(
       reinterpret_cast<const char *>(reinterpret_cast<std::uintptr_t>(p) + static_cast<std::uintptr_t>(bytes_ahead)),
@@ -118,16 +118,16 @@ struct StagedOperands {
   using V = Vec<T>;
   static constexpr int width = columns, operands = columns * parts_of<T>, row_forms = row_vectors;
   static constexpr bool staged = true;
-  static constexpr QtbInt b_step = operands * parts_per_lane_group<T>;
+  static constexpr QtbInt b_step = operands * vector_step<T>;
   static constexpr int products(int) { return row_vectors; }
   static constexpr bool in_memory(int j) { return j % 2 != 0; }
 
   template <int j>
   static V load_b(const Real<T> *b) {
-    return load_aligned(b + j * parts_per_lane_group<T>);
+    return load_aligned(b + j * vector_step<T>);
   }
   static RowVectors<T, row_forms> load_rows(const Real<T> *a) {
-    return {load_aligned(a), load_aligned(a + parts_per_lane_group<T>)};
+    return {load_aligned(a), load_aligned(a + vector_step<T>)};
   }
 };
 
@@ -226,13 +226,13 @@ struct SchemeOf<Complex<R>, Family::sse41, columns> : StagedPairs<Complex<R>, co
 // What a pass over a micro-panel of B asks for ahead of itself: the panel, which is not needed again, and the stage.
 constexpr QtbInt panel_ahead_bytes = 512, stage_ahead_bytes = 1024;
 
-// A whole micro-panel, each vector of it in all orders of the scheme; count real parts.
-template <class Scheme, class R>
+// A whole micro-panel, each vector of it in all orders; count real parts.
+template <const auto &orders, class R>
 void stage_panel(QtbInt count, const R *bp, R *stage) {
   constexpr int step = static_cast<int>(lanes<R>), vectors_per_line = static_cast<int>(line_bytes / vector_bytes);
   const auto stage_vector = [&](QtbInt e) {
     const auto v = load_aligned(bp + e);
-    repeat<step>([&](auto s) { store_aligned(stage + (e + s.value) * step, reordered<Scheme::orders[s.value]>(v)); });
+    repeat<step>([&](auto s) { store_aligned(stage + (e + s.value) * step, reordered<orders[s.value]>(v)); });
   };
   QtbInt e = 0;
   for (; e + vectors_per_line * step <= count; e += vectors_per_line * step) {
@@ -296,8 +296,8 @@ template <class Scheme, class R, class T, int operands, int forms>
 // The address waits for a sum of the line before, so that compilers keep lines of depth in their order. Left alone they
 // gather the prefetches of straight-line code at its start, and mix two lines into a worse order than either has.
 template <class R, class V>
-[[gnu::always_inline]] inline void keep_apart(const R *&a, V &sum) {
-  __asm__("" : "+r"(a), "+x"(sum));
+[[gnu::always_inline]] inline void keep_apart(const R *&address, V &sum) {
+  __asm__("" : "+r"(address), "+x"(sum));
 }
 
 // The rows of A against the operands of one micro-panel. fixed_lines > 0: of that many lines, in straight-line code;
@@ -321,9 +321,13 @@ template <class T, Family family, int width, bool aligned, int fixed_lines>
     });
     const R *a = parts(ap), *operand = b;
     if constexpr (fixed_lines > 0) {
-      repeat<fixed_lines>([&](auto l) __attribute__((always_inline)) {
-        multiply_add_line<Scheme>(a + l.value * line, operand + l.value * 2 * Scheme::b_step, sums);
+      repeat<fixed_lines>([&](auto) __attribute__((always_inline)) {
+        multiply_add_line<Scheme>(a, operand, sums);
+        // Offsets of one byte: the speed of straight-line code is that at which it can be fetched.
+        a += line;
+        operand += 2 * Scheme::b_step;
         keep_apart(a, sums.at[0][0]);
+        keep_apart(operand, sums.at[0][0]);
       });
     } else {
       for (QtbInt left = kp; left > 0; left -= rules.ku) {
@@ -371,7 +375,7 @@ void multiply_panels(QTB_INNER_KERNEL_PARAMS(T)) {
       using Scheme = SchemeOf<T, family, w.value>;
       const Real<T> *b = parts(bp);
       if constexpr (Scheme::staged) {
-        stage_panel<Scheme>(kp * w.value * parts_of<T>, b, parts(stage));
+        stage_panel<Scheme::orders>(kp * w.value * parts_of<T>, b, parts(stage));
         b = parts(stage);
       }
       multiply_rows<T, family, w.value, aligned, fixed_lines>(m, kp, ap, ldap, b, c, ldc);
