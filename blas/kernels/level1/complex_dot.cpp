@@ -21,25 +21,37 @@ struct LaneProducts {
   Vec<T> second[4] = {zero<T>(), zero<T>(), zero<T>(), zero<T>()};
 
   template <int k>
-  void add_products(Vec<T> x, Vec<T> y) {
-#if defined(__SSE3__)
-    if constexpr (duplicates_parts) {
-      first[k] = add(first[k], mul(real_parts(x), y));
-      second[k] = add(second[k], mul(imaginary_parts(x), y));
-    } else
-#endif
-    {
-      first[k] = add(first[k], mul(x, y));
-      second[k] = add(second[k], mul(swap_parts(x), y));
-    }
+  void add_products(Vec<T> for_first, Vec<T> for_second, Vec<T> y) {
+    first[k] = add(first[k], mul(for_first, y));
+    second[k] = add(second[k], mul(for_second, y));
     keep_in_place(first[k]);
     keep_in_place(second[k]);
   }
+  // The operand of the second set is made first, as a copy: the products may then overwrite both.
+  template <int k>
+  void add_products(Vec<T> x, Vec<T> y) {
+#if defined(__SSE3__)
+    if constexpr (duplicates_parts) return add_products<k>(real_parts(x), imaginary_parts(x), y);
+#endif
+    Vec<T> swapped = swap_parts(x);
+    keep_in_place(swapped);
+    add_products<k>(x, swapped, y);
+  }
+  // Duplicating costs two shuffles, and a shuffle takes the place of an addition or a multiplication. A part loaded
+  // from memory costs a load instead, or at least no copy: every other vector is loaded by parts, so that neither loads
+  // nor arithmetic alone set the pace.
   template <int k, class X, class Y>
   void vector(X &x, Y &y) {
+    constexpr bool by_parts = duplicates_parts && k % 2 == 0;
     Vec<T> from_y = y.load(k);
-    keep_in_place(from_y);  // or each of its two products would load it
-    add_products<k % 4>(x.load(k), from_y);
+    keep_in_place(from_y);  // or each of the two products would load it
+#if defined(__SSE3__)
+    if constexpr (by_parts && requires { load_real_parts(x.at(k)); })
+      return add_products<k % 4>(load_real_parts(x.at(k)), load_imaginary_parts(x.at(k)), from_y);
+#endif
+    Vec<T> from_x = x.load(k);
+    if constexpr (!by_parts) keep_in_place(from_x);
+    add_products<k % 4>(from_x, from_y);
   }
   void single(const T *x, const T *y) { add_products<0>(load_lowest(x), load_lowest(y)); }
 };

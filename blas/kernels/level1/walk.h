@@ -22,14 +22,16 @@ namespace {
 // ---- Cursors ----
 //
 // An operand of a pass, and how its vectors are reached; T is const for an operand that is only read. beyond is the
-// number of elements that a load takes from behind its own vector.
+// number of elements that a load takes from behind its own vector. Where a vector's elements lie side by side, at(k) is
+// the first.
 
 template <class T>
 struct Aligned {
   static constexpr QtbInt beyond = 0;
   T *p;
-  auto load(int k) const { return load_aligned(p + k * lanes<T>); }
-  void store(int k, Vec<T> v) const { store_aligned(p + k * lanes<T>, v); }
+  T *at(int k) const { return p + k * lanes<T>; }
+  auto load(int k) const { return load_aligned(at(k)); }
+  void store(int k, Vec<T> v) const { store_aligned(at(k), v); }
   void advance(QtbInt elements) { p += elements; }
 };
 
@@ -37,8 +39,9 @@ template <class T>
 struct Unaligned {
   static constexpr QtbInt beyond = 0;
   T *p;
-  auto load(int k) const { return load_unaligned(p + k * lanes<T>); }
-  void store(int k, Vec<T> v) const { store_unaligned(p + k * lanes<T>, v); }
+  T *at(int k) const { return p + k * lanes<T>; }
+  auto load(int k) const { return load_unaligned(at(k)); }
+  void store(int k, Vec<T> v) const { store_unaligned(at(k), v); }
   void advance(QtbInt elements) { p += elements; }
 };
 
@@ -98,11 +101,14 @@ struct Walk {
 template <int vectors, class X, class Y, class CursorX, class CursorY, class Body>
 [[gnu::always_inline]] inline void passes_of(Walk<X, Y> &walk, CursorX &x, CursorY &y, Body &body) {
   constexpr QtbInt count = vectors * lanes<Y>;
-  for (; walk.n >= count + CursorX::beyond; walk.n -= count) {
+  constexpr QtbInt reach = count + CursorX::beyond;
+  // Counted from where the last pass fits: one subtraction then is the test as well.
+  for (walk.n -= reach; walk.n >= 0; walk.n -= count) {
     repeat<vectors>([&](auto k) __attribute__((always_inline)) { body.template vector<k.value>(x, y); });
     x.advance(count);
     y.advance(count);
   }
+  walk.n += reach;
 }
 
 // Passes of count elements, then at most half as many and no more than four vectors, then single vectors.

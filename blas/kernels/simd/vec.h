@@ -193,9 +193,10 @@ inline float sum_lanes(__m128 v) {
 }
 inline double sum_lanes(__m128d v) { return _mm_cvtsd_f64(_mm_add_sd(v, _mm_unpackhi_pd(v, v))); }
 
-// Vectors of complex elements: the parts of each element exchanged.
-inline __m128 swap_parts(__m128 v) { return _mm_shuffle_ps(v, v, 0xB1); }
-inline __m128d swap_parts(__m128d v) { return _mm_shuffle_pd(v, v, 1); }
+// Vectors of complex elements: the parts of each element exchanged. The integer shuffle leaves v as it is, so that v
+// needs no copy first.
+inline __m128 swap_parts(__m128 v) { return _mm_castsi128_ps(_mm_shuffle_epi32(_mm_castps_si128(v), 0xB1)); }
+inline __m128d swap_parts(__m128d v) { return _mm_castsi128_pd(_mm_shuffle_epi32(_mm_castpd_si128(v), 0x4E)); }
 
 // (even, odd) in the lanes of the real and of the imaginary parts.
 inline __m128 alternate(float even, float odd) { return _mm_set_ps(odd, even, odd, even); }
@@ -207,6 +208,8 @@ inline __m128 real_parts(__m128 v) { return _mm_moveldup_ps(v); }
 inline __m128d real_parts(__m128d v) { return _mm_movedup_pd(v); }
 inline __m128 imaginary_parts(__m128 v) { return _mm_movehdup_ps(v); }
 inline __m128d imaginary_parts(__m128d v) { return _mm_unpackhi_pd(v, v); }
+inline __m128d load_real_parts(const cdouble *p) { return _mm_loaddup_pd(parts(p)); }
+inline __m128d load_imaginary_parts(const cdouble *p) { return _mm_loaddup_pd(parts(p) + 1); }
 // Even lanes subtracted, odd lanes added.
 inline __m128 add_subtract(__m128 a, __m128 b) { return _mm_addsub_ps(a, b); }
 inline __m128d add_subtract(__m128d a, __m128d b) { return _mm_addsub_pd(a, b); }
