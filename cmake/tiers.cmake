@@ -13,22 +13,19 @@ set(QTB_TIER_FLAGS_avx   -march=x86-64 -msse4.2 -mno-popcnt -mno-crc32)
 # On top of the tier's, for the sources in QTB_WIDE_KERNEL_SOURCES.
 set(QTB_WIDE_FLAGS -mavx)
 
-<<<<<<< HEAD
-# qtb_add_tiers(source...): one object library qtb_<tier> per tier, each of all the sources and of those that
-# QTB_KERNEL_SOURCES_<tier> lists for this tier.
-=======
 # Loops and procedures start on a cache line: short loops lose up to half of their speed where their last jump straddles
 # two lines.
 set(QTB_KERNEL_ALIGNMENT -falign-functions=64 -falign-loops=64)
 
-# qtb_add_tiers(source...): one object library qtb_<tier> per tier, each of all the sources.
->>>>>>> tune
+# qtb_add_tiers(source...): one object library qtb_<tier> per tier, each of all the sources and of those that
+# QTB_KERNEL_SOURCES_<tier> lists for this tier.
 function(qtb_add_tiers)
   set_property(SOURCE ${QTB_WIDE_KERNEL_SOURCES} APPEND PROPERTY COMPILE_OPTIONS ${QTB_WIDE_FLAGS})
   foreach(tier IN LISTS QTB_TIERS)
     add_library(qtb_${tier} OBJECT ${ARGN} ${QTB_KERNEL_SOURCES_${tier}})
     target_link_libraries(qtb_${tier} PRIVATE qtb_options)
     target_compile_definitions(qtb_${tier} PRIVATE QTB_TIER=${tier})
-    target_compile_options(qtb_${tier} PRIVATE ${QTB_TIER_FLAGS_${tier}} ${QTB_KERNEL_ALIGNMENT} -fno-exceptions -fno-rtti)
+    target_compile_options(qtb_${tier} PRIVATE
+      ${QTB_TIER_FLAGS_${tier}} ${QTB_KERNEL_ALIGNMENT} -fno-exceptions -fno-rtti)
   endforeach()
 endfunction()

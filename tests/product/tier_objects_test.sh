@@ -6,8 +6,8 @@
 #   static initialisers      run at load on every processor
 #   instructions             only those of mnemonics/*.txt up to the tier; the wider encoding (VEX, EVEX) only in the
 #                            avx tier's objects that mnemonics/vex_objects.txt names, each of which has it
-#   defined global symbols   only qtb_blas_<tier>_x<name> and the inner kernels of GEMM, and a higher tier's name for the
-#                            same procedure
+#   defined global symbols   only qtb_blas_<tier>_x<name> and the inner kernels of GEMM, and a higher tier's name for
+#                            the same procedure
 #   undefined symbols        only the library's own, of no other tier, and the memory routines that a compiler calls
 set -eu
 
