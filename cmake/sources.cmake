@@ -76,14 +76,16 @@ list(REMOVE_DUPLICATES qtb_hand_vectorised)
 list(FILTER qtb_hand_vectorised INCLUDE REGEX "^blas/kernels/level[13]/")
 set_property(SOURCE ${qtb_hand_vectorised} APPEND PROPERTY COMPILE_OPTIONS -fno-tree-vectorize)
 
-# The order of a vector kernel's pass is that of its source: moved together, its loads and its counters make these loops
-# slower. Where a pass has many accumulators, registers that are not reused at once do the same good.
+# The order of a pass that computes is that of its source: moved together, its loads and its counters make these loops
+# slower, while copy and swap gain by it. Where a pass has many accumulators, registers that are not reused at once do
+# the same good.
 if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
-  set(qtb_vector_kernels ${qtb_hand_vectorised})
-  list(FILTER qtb_vector_kernels INCLUDE REGEX "^blas/kernels/level1/")
-  set_property(SOURCE ${qtb_vector_kernels} APPEND PROPERTY COMPILE_OPTIONS -fno-schedule-insns2)
-  set_property(SOURCE blas/kernels/level1/asum.cpp blas/kernels/level1/complex_dot.cpp APPEND PROPERTY
-    COMPILE_OPTIONS -frename-registers)
+  foreach(routine asum axpy complex_dot scal)
+    set_property(SOURCE blas/kernels/level1/${routine}.cpp APPEND PROPERTY COMPILE_OPTIONS -fno-schedule-insns2)
+  endforeach()
+  foreach(routine asum complex_dot)
+    set_property(SOURCE blas/kernels/level1/${routine}.cpp APPEND PROPERTY COMPILE_OPTIONS -frename-registers)
+  endforeach()
 endif()
 
 # Compiled once.

@@ -21,6 +21,7 @@ using BetaKernel = void(INNER_PARAMS(T), const Real<T> *beta);
 using EdgeKernel = void(EDGE_PARAMS);
 
 extern "C" {
+// clang-format off
 #define FOLDING(tier, T, t, fixed)                                       \
   QTB_HIDDEN AddingKernel<T> qtb_blas_##tier##_##t##gemm_kernel;         \
   QTB_HIDDEN AddingKernel<T> qtb_blas_##tier##_##t##gemm_kernel_##fixed; \
@@ -46,6 +47,7 @@ EDGE_KERNELS(DECLARE)
 }
 
 enum class Beta { one, zero, other };
+// clang-format on
 
 template <class T>
 T beta_value(Beta beta) {
@@ -77,7 +79,8 @@ struct Form {
        Beta::one,                                                                                                      \
        qtb_blas_##tier##_##t##gemm_kernel_##depth,                                                                     \
        nullptr},                                                                                                       \
-      {#t "gemm_kernel_0", tier_##tier, mr, 4, 1, 0, stage, Beta::zero, qtb_blas_##tier##_##t##gemm_kernel_0, nullptr}, \
+      {#t "gemm_kernel_0", tier_##tier, mr, 4, 1, 0, stage, Beta::zero,                                                \
+       qtb_blas_##tier##_##t##gemm_kernel_0, nullptr},                                                                 \
   {                                                                                                                    \
 #t "gemm_kernel_b", tier_##tier, mr, 4, 1, 0, stage, Beta::other, nullptr, qtb_blas_##tier##_##t##gemm_kernel_b     \
   }

@@ -102,12 +102,15 @@ template <int vectors, class X, class Y, class CursorX, class CursorY, class Bod
 [[gnu::always_inline]] inline void passes_of(Walk<X, Y> &walk, CursorX &x, CursorY &y, Body &body) {
   constexpr QtbInt count = vectors * lanes<Y>;
   constexpr QtbInt reach = count + CursorX::beyond;
+  if (walk.n < reach) return;
   // Counted from where the last pass fits: one subtraction then is the test as well.
-  for (walk.n -= reach; walk.n >= 0; walk.n -= count) {
+  walk.n -= reach;
+  do {
     repeat<vectors>([&](auto k) __attribute__((always_inline)) { body.template vector<k.value>(x, y); });
     x.advance(count);
     y.advance(count);
-  }
+    walk.n -= count;
+  } while (walk.n >= 0);
   walk.n += reach;
 }
 
