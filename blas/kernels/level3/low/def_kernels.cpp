@@ -23,9 +23,9 @@ void run_columns(QtbInt m, QtbInt kp, const double *ap, QtbInt ldap, const doubl
   fill_stage<double, columns>(kp, {bp, kp, columns, 1}, stage);
   for (QtbInt i0 = 0; i0 < m; i0 += tile_rows, ap += ldap, c += tile_rows) {
     ask_for_rows(ap);
-    store_tile<double, Beta::one>(sums_over<double, 1, columns, steps, fixed_depth>(kp, PackedA<double, 1, 0>(ap),
-                                                                                    StagedB<double, columns>{stage}),
-                                  c, ldc, nullptr);
+    store_tile<double, Beta::one>(
+        sums_over<double, 1, columns, steps, fixed_depth>(kp, PackedA<double, 1, 0>(ap), OperandB<columns>{stage}), c,
+        ldc, nullptr);
   }
 }
 

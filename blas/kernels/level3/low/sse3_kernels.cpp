@@ -29,7 +29,7 @@ struct InPlaceA {
 
 template <int columns>
 struct PackedB {
-  static constexpr bool paced = false;
+  static constexpr bool paced = false, is_operand = false;
   const double *at;
   [[gnu::always_inline]] __m128d load(int j) const { return broadcast(load_single(at + j)); }
   [[gnu::always_inline]] void next() { at += columns; }
@@ -37,7 +37,7 @@ struct PackedB {
 
 template <bool transposed>
 struct InPlaceB {
-  static constexpr bool paced = true;
+  static constexpr bool paced = true, is_operand = false;
   const double *at;
   QtbInt ld;
   [[gnu::always_inline]] __m128d load(int j) const { return broadcast(load_single(transposed ? at + j : at + j * ld)); }

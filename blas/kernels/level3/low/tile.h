@@ -20,10 +20,10 @@ struct Sums {
   Vec<R> v[columns][vectors];
 };
 
-// Where the steps of A and B come from: load(i) is vector i of A, or column i of B in all lanes, at the present step;
-// next() goes on to the next one. paced: the address of a step is not known to the compiler before the sums of the step
-// before. Left alone, it computes the addresses of all steps ahead of the first and spills them, or asks for all lines
-// of a panel at once.
+// Where the steps of A and B come from: load(i) is vector i of A, or column i of B in all lanes, at the present step,
+// or times(a, i) its product with a; next() goes on to the next step. paced: the address of a step is not known to the
+// compiler before the sums of the step before. Left alone, it computes the addresses of all steps ahead of the first
+// and spills them, or asks for all lines of a panel at once.
 
 // Micro-panels of A: aligned vectors, in the order of the steps. ahead_bytes: how far ahead of its loads the panel is
 // asked for, a cache line per step and with the least claim on the caches; 0: it is not.
@@ -46,10 +46,25 @@ struct PackedA {
 // The stage of B: a vector per column and step.
 template <class R, int columns>
 struct StagedB {
-  static constexpr bool paced = false;
+  static constexpr bool paced = false, is_operand = false;
   const R *at;
   [[gnu::always_inline]] Vec<R> load(int j) const { return load_aligned(at + j * lanes<R>); }
   [[gnu::always_inline]] void next() { at += columns * lanes<R>; }
+};
+
+// The same where a column serves a single product: its vector stays a memory operand of the multiplication. Compilers
+// load it into a register first, and such loads compete with the products and sums; operands do not.
+[[gnu::always_inline]] inline __m128d times_at(__m128d a, const double *at) {
+  __asm__("mulpd %1, %0" : "+x"(a) : "m"(*reinterpret_cast<const __m128d *>(at)));
+  return a;
+}
+template <int columns>
+struct OperandB {
+  static constexpr bool paced = true, is_operand = true;
+  const double *at;
+  [[gnu::always_inline]] __m128d times(__m128d a, int j) const { return times_at(a, at + j * lanes<double>); }
+  [[gnu::always_inline]] void next() { at += columns * lanes<double>; }
+  [[gnu::always_inline]] const double *&pace() { return at; }
 };
 
 template <class R, int vectors, int columns, class A, class B>
@@ -57,11 +72,18 @@ template <class R, int vectors, int columns, class A, class B>
   Vec<R> a[vectors];
   for (int v = 0; v < vectors; v++) a[v] = from_a.load(v);
   for (int j = 0; j < columns; j++) {
-    Vec<R> b = from_b.load(j);
-    if constexpr (vectors > 1) keep_in_place(b);
-    for (int v = 0; v < vectors; v++) {
-      sums.v[j][v] = add(sums.v[j][v], mul(b, a[v]));
-      keep_in_place(sums.v[j][v]);
+    const auto add_products = [&](auto product) __attribute__((always_inline)) {
+      for (int v = 0; v < vectors; v++) {
+        sums.v[j][v] = add(sums.v[j][v], product(a[v]));
+        keep_in_place(sums.v[j][v]);
+      }
+    };
+    if constexpr (B::is_operand) {
+      add_products([&](Vec<R> x) __attribute__((always_inline)) { return from_b.times(x, j); });
+    } else {
+      Vec<R> b = from_b.load(j);
+      keep_in_place(b);
+      add_products([&](Vec<R> x) __attribute__((always_inline)) { return mul(b, x); });
     }
   }
   from_a.next();
