@@ -58,19 +58,27 @@ inline std::uintptr_t up_to(std::uintptr_t address, QtbInt boundary) {
   return (address + step - 1) / step * step;
 }
 
-// A zero mb or nb: the region of A or of B is not wanted, and its pointer is of no use. stage_bytes: what the kernel
-// wants for the largest depth.
+// Bytes of the allocation. A zero mb or nb: the region of A or of B is not wanted. stage_bytes: what the kernel wants
+// for the largest depth.
 template <class T, Family family>
-GemmBuffers<T> get_buffers(QtbInt mb, QtbInt nb, QtbInt kb, QtbInt stage_bytes) {
+constexpr QtbInt buffer_bytes(QtbInt mb, QtbInt nb, QtbInt kb, QtbInt stage_bytes) {
   const QtbInt a_bytes = mb == 0 ? 0 : a_region_bytes<T, family>(mb, kb);
   const QtbInt b_bytes = nb == 0 ? 0 : b_region_bytes<T, family>(nb, kb);
   const QtbInt slack = mb != 0 ? (nb != 0 ? slack_for_both : slack_for_a) : (nb != 0 ? slack_for_b : slack_for_none);
-  const QtbInt room = stage_room<T, family>(kb, stage_bytes);
-  void *allocation = qtb_serv_malloc(static_cast<std::uint64_t>(a_bytes + b_bytes + room + slack), region_boundary);
+  return a_bytes + b_bytes + stage_room<T, family>(kb, stage_bytes) + slack;
+}
+
+// The pointer to a region that is not wanted is of no use.
+template <class T, Family family>
+GemmBuffers<T> get_buffers(QtbInt mb, QtbInt nb, QtbInt kb, QtbInt stage_bytes) {
+  void *allocation =
+      qtb_serv_malloc(static_cast<std::uint64_t>(buffer_bytes<T, family>(mb, nb, kb, stage_bytes)), region_boundary);
   const std::uintptr_t start = reinterpret_cast<std::uintptr_t>(allocation), a = up_to(start, page_bytes);
-  const std::uintptr_t end_of_a = up_to(mb == 0 ? start : a + static_cast<std::uintptr_t>(a_bytes), region_boundary);
+  const std::uintptr_t after_a = mb == 0 ? start : a + static_cast<std::uintptr_t>(a_region_bytes<T, family>(mb, kb));
+  const std::uintptr_t end_of_a = up_to(after_a, region_boundary);
   const std::uintptr_t stage = end_of_a + static_cast<std::uintptr_t>(stage_offset);
-  const std::uintptr_t b = up_to(end_of_a + static_cast<std::uintptr_t>(room), page_bytes);
+  const std::uintptr_t b =
+      up_to(end_of_a + static_cast<std::uintptr_t>(stage_room<T, family>(kb, stage_bytes)), page_bytes);
   return {allocation, reinterpret_cast<T *>(a), reinterpret_cast<T *>(b), reinterpret_cast<T *>(stage)};
 }
 

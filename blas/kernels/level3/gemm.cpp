@@ -13,6 +13,21 @@
 namespace qtb::QTB_TIER {
 namespace {
 
+// What a double-precision family asks of the memory service, with both panels, B alone, A alone and neither.
+template <Family family>
+consteval bool asks_for(QtbInt both, QtbInt b, QtbInt a, QtbInt neither) {
+  constexpr QtbInt stage = InnerKernel<double, family>::stage_bytes(largest_depth);
+  constexpr QtbInt kb = largest_depth;
+  return buffer_bytes<double, family>(1, 1, kb, stage) == both && buffer_bytes<double, family>(0, 1, kb, stage) == b &&
+         buffer_bytes<double, family>(1, 0, kb, stage) == a && buffer_bytes<double, family>(0, 0, kb, stage) == neither;
+}
+#if QTB_TIER_IS(sse42)
+static_assert(asks_for<Family::base>(11588864, 10269952, 1340160, 21248));
+#elif QTB_TIER_IS(ssse3)
+static_assert(asks_for<Family::base>(21566720, 20509952, 1078016, 21248));
+static_assert(asks_for<Family::sse41>(22557952, 20501760, 2069248, 13056));
+#endif
+
 // The arguments of the shape gemm as a Product.
 template <class T>
 Product<T> product(const char *transa, const char *transb, const QtbInt *m, const QtbInt *n, const QtbInt *k,

@@ -183,15 +183,17 @@ void update_strips(QtbInt elements, QtbInt columns, QtbInt k, SideBySide<T> x, B
 
 // ---- Dot products ----
 
-template <class T>
-T finish_one(const Finish<T> &finish, T sum, const T *c) {
-  T result;
-  if constexpr (is_complex<T>)
-    store_lowest(&result, finish(load_repeated(&sum), [&] { return load_repeated(c); }));
-  else
-    store_lowest(&result, finish(broadcast(sum), [&] { return broadcast(load_single(c)); }));
-  return result;
+// (a0, b0) and (a1, b1) of vectors whose complex elements are added up first, each filling a vector.
+inline __m128 even_parts(__m128 a, __m128 b) {
+  const __m128 low = _mm_unpacklo_ps(a, b), high = _mm_unpackhi_ps(a, b), sum = _mm_add_ps(low, high);
+  return _mm_movelh_ps(sum, sum);
 }
+inline __m128 odd_parts(__m128 a, __m128 b) {
+  const __m128 low = _mm_unpacklo_ps(a, b), high = _mm_unpackhi_ps(a, b), sum = _mm_add_ps(low, high);
+  return _mm_movehl_ps(sum, sum);
+}
+inline __m128d even_parts(__m128d a, __m128d b) { return _mm_unpacklo_pd(a, b); }
+inline __m128d odd_parts(__m128d a, __m128d b) { return _mm_unpackhi_pd(a, b); }
 
 // Two sums of products along the depth: of x and y part by part, and for a complex type of x and y with its parts
 // exchanged.
@@ -202,26 +204,14 @@ struct DotSum {
     direct = add(direct, mul(x, y));
     if constexpr (is_complex<T>) crossed = add(crossed, mul(x, y_crossed));
   }
-  T total(bool x_conjugated) const {
+  // The dot product, filling a vector.
+  Vec<T> total(bool x_conjugated) const {
     if constexpr (!is_complex<T>) {
-      return sum_lanes(direct);
+      return broadcast(sum_lanes(direct));
     } else {
-      using R = Real<T>;
-      R d[parts_per_vector<T>], s[parts_per_vector<T>];
-      store_unaligned(d, direct);
-      store_unaligned(s, crossed);
-      R re_re = d[0], im_im = d[1], re_im = s[0], im_re = s[1];
-      for (int i = 2; i < parts_per_vector<T>; i += 2) {
-        re_re += d[i];
-        im_im += d[i + 1];
-        re_im += s[i];
-        im_re += s[i + 1];
-      }
-      if (x_conjugated) {
-        im_im = -im_im;
-        im_re = -im_re;
-      }
-      return {re_re - im_im, re_im + im_re};
+      const Real<T> negative = -Real<T>{0}, none = 0;
+      const Vec<T> sign = x_conjugated ? alternate(none, negative) : alternate(negative, none);
+      return add(even_parts(direct, crossed), bit_xor(sign, odd_parts(direct, crossed)));
     }
   }
 };
@@ -248,7 +238,12 @@ void dot_tile(QtbInt k, const T *x, QtbInt ldx, bool x_conjugated, const T *y, Q
   repeat<columns>([&](auto j) {
     repeat<rows>([&](auto i) {
       T *to = c + i.value + j.value * ldc;
-      *to = finish_one(finish, sum[i.value][j.value].total(x_conjugated), to);
+      store_lowest(to, finish(sum[i.value][j.value].total(x_conjugated), [&] {
+                     if constexpr (is_complex<T>)
+                       return load_repeated(to);
+                     else
+                       return broadcast(load_single(to));
+                   }));
     });
   });
 }
