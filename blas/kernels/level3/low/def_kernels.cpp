@@ -45,7 +45,7 @@ void run(QTB_INNER_KERNEL_PARAMS(double)) {
 }  // namespace
 
 extern "C" void qtb_blas_def_dgemm_kernel(QTB_INNER_KERNEL_PARAMS(double)) {
-  run<Steps::some>(m, n, kp, ap, ldap, bp, ldbp, c, ldc, stage);
+  run<Steps::fours>(m, n, kp, ap, ldap, bp, ldbp, c, ldc, stage);
 }
 extern "C" void qtb_blas_def_dgemm_kernel_128(QTB_INNER_KERNEL_PARAMS(double)) {
   run<Steps::all>(m, n, kp, ap, ldap, bp, ldbp, c, ldc, stage);
