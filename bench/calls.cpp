@@ -46,12 +46,9 @@ const std::vector<Routine> routines = {
 
 std::size_t type_bytes(char type) {
   switch (type) {
-    case 's':
-      return 4;
-    case 'z':
-      return 16;
-    default:
-      return 8;
+    case 's': return 4;
+    case 'z': return 16;
+    default: return 8;
   }
 }
 

@@ -11,6 +11,8 @@
 // highest; above 1 this library is faster), and, for the vector routines in cache, the share of what the core's own
 // load, store and arithmetic rates allow.
 
+#include <immintrin.h>
+
 #include <algorithm>
 #include <cstdio>
 #include <cstdlib>
@@ -34,12 +36,20 @@ struct Options {
   int pairs = 21;
 };
 
+// A peer with wider vectors may leave their upper halves in use, which slows every 16-byte instruction behind it.
+[[gnu::target("avx")]] void clear_upper_halves() { _mm256_zeroupper(); }
+void settle() {
+  static const bool wide = __builtin_cpu_supports("avx") != 0;
+  if (wide) clear_upper_halves();
+}
+
 void compare(const Options &options, const Library &ours, const Library &peer, const CoreLimits &limits,
              const Routine &routine, long size, std::FILE *csv) {
   Operands operands = make_operands(routine, size, options.increment);
   const Calls a = bind(ours, routine, size, options.increment, operands);
   const Calls b = peer.handle != nullptr ? bind(peer, routine, size, options.increment, operands) : Calls{};
   if (!a) return;
+  settle();
   a(1);
   const long count_a = calibrate(a, pair_seconds);
   long count_b = 0;
@@ -49,6 +59,7 @@ void compare(const Options &options, const Library &ours, const Library &peer, c
   }
   std::vector<double> time_a, time_b, ratio;
   for (int pair = 0; pair < options.pairs; ++pair) {
+    settle();
     time_a.push_back(seconds_per_call(a, count_a));
     if (!b) continue;
     time_b.push_back(seconds_per_call(b, count_b));

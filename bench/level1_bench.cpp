@@ -73,8 +73,8 @@ int main(int argc, char **argv) {
   benchmark::AddCustomContext("single arithmetic", rate_text(limits.single_flops, "GFLOP/s"));
   benchmark::AddCustomContext("16-byte loads", rate_text(limits.load_rate, "G/s"));
   benchmark::AddCustomContext("16-byte stores", rate_text(limits.store_rate, "G/s"));
-  benchmark::AddCustomContext("copy bandwidth", rate_text(measure_copy_bandwidth(copy_bytes, 1), "GB/s, one thread"));
-  benchmark::AddCustomContext("copy bandwidth", rate_text(measure_copy_bandwidth(copy_bytes, 2), "GB/s, two threads"));
+  benchmark::AddCustomContext("copy bandwidth, one thread", rate_text(measure_copy_bandwidth(copy_bytes, 1), "GB/s"));
+  benchmark::AddCustomContext("copy bandwidth, two threads", rate_text(measure_copy_bandwidth(copy_bytes, 2), "GB/s"));
   benchmark::RunSpecifiedBenchmarks();
   return 0;
 }

@@ -1,7 +1,8 @@
 // dgemm_kernel and dgemm_def_kernel of def: C += Ap*Bp (kernels.h beside this file).
 //
 // dgemm_kernel: tiles of 2 x 12, 2 x 8 and 2 x 4, one vector of A per step and a stage of B with each element twice. A
-// step of the widest tile is 12 products, 12 sums and 13 loads.
+// step of the widest tile is 12 products, 12 sums and 13 loads. Depths other than the fixed one, all multiples of four,
+// run in a loop: written out with a test after each step, the many ways out make the compiler move the sums about.
 #include "blas/kernels/level3/low/staged.h"
 
 namespace qtb::QTB_TIER {
