@@ -29,7 +29,7 @@ namespace {
 constexpr double pair_seconds = 0.0005;  // one side of a pair: long against the clock, short against a disturbance
 
 struct Options {
-  std::string library, peer, csv;
+  std::string path, peer, csv;
   std::vector<std::string> routines;
   std::vector<long> sizes;
   long increment = 1;
@@ -124,7 +124,7 @@ Options parse(int argc, char **argv) {
     if (i + 1 >= argc) fail("no value for " + key);
     const std::string value = argv[i + 1];
     if (key == "--library")
-      options.library = value;
+      options.path = value;
     else if (key == "--peer")
       options.peer = value;
     else if (key == "--peer-setting")
@@ -147,14 +147,14 @@ Options parse(int argc, char **argv) {
     else
       fail("unknown option " + key);
   }
-  if (options.library.empty()) fail("--library is needed");
+  if (options.path.empty()) fail("--library is needed");
   if (options.sizes.empty()) options.sizes = {4000};
   return options;
 }
 
 int run(int argc, char **argv) {
   const Options options = parse(argc, argv);
-  const Library ours = load_library(options.library, true);
+  const Library ours = load_library(options.path, true);
   Library peer;
   if (!options.peer.empty()) peer = load_library(options.peer, false);
   const CoreLimits limits = measure_core_limits();
