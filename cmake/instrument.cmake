@@ -10,8 +10,9 @@ set_property(CACHE QTB_INSTRUMENT PROPERTY STRINGS "" asan tsan fuzz coverage)
 # The environment that every test gets.
 set(QTB_TEST_ENVIRONMENT "")
 
-# The library is built without the type information that the check of polymorphic types reads.
-set(qtb_asan -fsanitize=address,undefined -fno-sanitize=vptr -fno-sanitize-recover=all
+# The library is built without the type information that the check of polymorphic types reads, and takes operands at any
+# address, also between elements, as the processor does.
+set(qtb_asan -fsanitize=address,undefined -fno-sanitize=vptr,alignment -fno-sanitize-recover=all
   -fno-omit-frame-pointer)
 
 if(QTB_INSTRUMENT STREQUAL "asan")
