@@ -93,11 +93,11 @@ template <class R, int vectors, int columns, class A, class B>
   if constexpr (B::paced) __asm__("" : "+r"(from_b.pace()), "+x"(last));
 }
 
-// How the steps of a depth are written: all of longest steps, up to longest with a test after each, a loop of four
-// steps per turn, or of one.
-enum class Steps { all, some, fours, any };
+// How the steps of a depth are written: all of longest steps, up to longest with a test after each, all of longest in a
+// loop of four steps per turn, any depth in such a loop, or in one of a step per turn.
+enum class Steps { all, some, all_by_fours, fours, any };
 
-// The sums over a depth of at least one step. Steps::all takes longest for the depth.
+// The sums over a depth of at least one step. Steps::all and Steps::all_by_fours take longest for the depth.
 template <class R, int vectors, int columns, Steps steps, int longest, class A, class B>
 [[gnu::always_inline]] inline Sums<R, vectors, columns> sums_over(QtbInt depth, A a, B b) {
   Sums<R, vectors, columns> sums;
@@ -105,8 +105,9 @@ template <class R, int vectors, int columns, Steps steps, int longest, class A, 
     for (int v = 0; v < vectors; v++) sums.v[j][v] = zero<R>();
   if constexpr (steps == Steps::any) {
     for (QtbInt l = 0; l < depth; l++) add_step(sums, a, b);
-  } else if constexpr (steps == Steps::fours) {
-    for (QtbInt l = 0; l < depth; l += 4) {
+  } else if constexpr (steps == Steps::fours || steps == Steps::all_by_fours) {
+    const QtbInt end = steps == Steps::all_by_fours ? longest : depth;
+    for (QtbInt l = 0; l < end; l += 4) {
       add_step(sums, a, b);
       add_step(sums, a, b);
       add_step(sums, a, b);
@@ -122,7 +123,7 @@ template <class R, int vectors, int columns, Steps steps, int longest, class A, 
       if constexpr (steps == Steps::all) return sums;
     }
   }
-  if constexpr (steps == Steps::any || steps == Steps::fours) return sums;
+  if constexpr (steps != Steps::all && steps != Steps::some) return sums;
 }
 
 // Where a micro-panel of B lies: element (l, j) at first[l*step + j*column].
