@@ -6,6 +6,7 @@
 #include <limits>
 
 #include "tests/kernels/vector_routines.h"
+#include "tests/support/address.h"
 
 namespace qtb::test {
 namespace {
@@ -266,8 +267,8 @@ TEST(VectorCases, zscal_in_ssse3_computes_unless_alpha_is_exactly_one) {
 }
 
 TEST(VectorCases, the_two_upper_tiers_share_one_sscal) {
-  EXPECT_EQ(sscal_tiers[tier_avx], sscal_tiers[tier_sse42]);
-  EXPECT_NE(dscal_tiers[tier_avx], dscal_tiers[tier_sse42]);
+  EXPECT_EQ(address_of(sscal_tiers[tier_avx]), address_of(sscal_tiers[tier_sse42]));
+  EXPECT_NE(address_of(dscal_tiers[tier_avx]), address_of(dscal_tiers[tier_sse42]));
 }
 
 TEST(VectorCases, overflow_and_infinity_come_out_as_in_plain_arithmetic) {

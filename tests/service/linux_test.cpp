@@ -302,7 +302,14 @@ TEST(Fork, AfterAParallelRegionTheChildRunsOnOneThread) {
   });
 }
 
+#if defined(__has_feature)
+#define QTB_HAS_FEATURE(name) __has_feature(name)
+#else
+#define QTB_HAS_FEATURE(name) 0
+#endif
+
 TEST(Fork, OfAProcessWithOneThreadLeavesTheChildItsThreads) {
+  if (QTB_HAS_FEATURE(thread_sanitizer)) GTEST_SKIP() << "the sanitizer has a thread of its own";
   in_child([] {
     qtb_serv_prepare_fork();
     setenv("QTB_DYNAMIC", "FALSE", 1);
