@@ -93,6 +93,14 @@ template <class R, int vectors, int columns, class A, class B>
   if constexpr (B::paced) __asm__("" : "+r"(from_b.pace()), "+x"(last));
 }
 
+// In front of a loop that is written out in full; not where every load is watched, since the compiler would need
+// minutes for so long a line of checks.
+#if defined(__SANITIZE_ADDRESS__)
+#define QTB_WRITTEN_OUT _Pragma("GCC unroll 1")
+#else
+#define QTB_WRITTEN_OUT _Pragma("GCC unroll 128")
+#endif
+
 // How the steps of a depth are written: all of longest steps, up to longest with a test after each, all of longest in a
 // loop of four steps per turn, any depth in such a loop, or in one of a step per turn.
 enum class Steps { all, some, all_by_fours, fours, any };
@@ -115,7 +123,7 @@ template <class R, int vectors, int columns, Steps steps, int longest, class A, 
     }
   } else {
     for (;; depth -= longest) {
-#pragma GCC unroll 128
+      QTB_WRITTEN_OUT
       for (int l = 0; l < longest; l++) {
         add_step(sums, a, b);
         if (steps == Steps::some && l + 1 == depth) return sums;
