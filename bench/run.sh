@@ -10,6 +10,8 @@
 set -eu
 build=$1
 results=$build/bench-results
+cases=${BENCH_FILTER:-.}
+long_cases='^([sdcz](axpy|copy|swap)|[sd](dot|rot)|cdotc)/[0-9]{4,}/1/'
 mkdir -p "$results"
 
 # The tiers in the order of their numbers, each with the processor's name for its instruction set.
@@ -25,11 +27,11 @@ for tier in def:sse2 sse3:pni ssse3:ssse3 sse42:sse4_2 avx:avx; do
   echo "== tier $name: a slot"
   "$build/bench/slot_cost" | tee "$results/slot-$name.txt"
   echo "== tier $name: Level 1, one thread"
-  QTB_NUM_THREADS=1 "$build/bench/level1_bench" --benchmark_filter="${BENCH_FILTER:-.}" \
+  QTB_NUM_THREADS=1 "$build/bench/level1_bench" --benchmark_filter="$cases" \
     --benchmark_min_time="${BENCH_MIN_TIME:-0.02}" --benchmark_counters_tabular=true | tee "$results/level1-$name.txt"
   echo "== tier $name: Level 1, the routines with a parallel path, all threads"
   "$build/bench/level1_bench" \
-    --benchmark_filter="${BENCH_FILTER:-^([sdcz](axpy|copy|swap)|[sd](dot|rot)|cdotc)/[0-9]{4,}/1}" \
+    --benchmark_filter="${BENCH_FILTER:-$long_cases}" \
     --benchmark_min_time="${BENCH_MIN_TIME:-0.02}" --benchmark_counters_tabular=true |
     tee "$results/level1-threads-$name.txt"
   if [ -n "${PEER:-}" ]; then
