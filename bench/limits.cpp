@@ -26,12 +26,11 @@ double best_rate(Run &&run, double work_per_call) {
 
 // Sixteen registers, each its own chain: products of ones and sums of zeros, in turn, so that both kinds of units are
 // full and no value ever changes.
+// clang-format off
 #define QTB_PAIR(type, a, b) "mul" type " %%xmm" #a ", %%xmm" #a "\n\tadd" type " %%xmm" #b ", %%xmm" #b "\n\t"
-#define QTB_ARITHMETIC(type)                                                                                    \
-  QTB_PAIR(type, 0, 8)                                                                                          \
-  QTB_PAIR(type, 1, 9)                                                                                          \
-  QTB_PAIR(type, 2, 10) QTB_PAIR(type, 3, 11) QTB_PAIR(type, 4, 12) QTB_PAIR(type, 5, 13) QTB_PAIR(type, 6, 14) \
-      QTB_PAIR(type, 7, 15)
+#define QTB_ARITHMETIC(type) \
+  QTB_PAIR(type, 0, 8) QTB_PAIR(type, 1, 9) QTB_PAIR(type, 2, 10) QTB_PAIR(type, 3, 11) \
+  QTB_PAIR(type, 4, 12) QTB_PAIR(type, 5, 13) QTB_PAIR(type, 6, 14) QTB_PAIR(type, 7, 15)
 #define QTB_CLOBBERED                                                                                                 \
   "xmm0", "xmm1", "xmm2", "xmm3", "xmm4", "xmm5", "xmm6", "xmm7", "xmm8", "xmm9", "xmm10", "xmm11", "xmm12", "xmm13", \
       "xmm14", "xmm15"
@@ -40,11 +39,10 @@ constexpr double instructions = 16;  // per pass of each loop
 
 // What the registers hold is of no matter as long as it is neither subnormal nor NaN: all are set to zero first.
 #define QTB_CLEAR(r) "xorps %%xmm" #r ", %%xmm" #r "\n\t"
-#define QTB_CLEAR_ALL                                                                                     \
-  QTB_CLEAR(0)                                                                                            \
-  QTB_CLEAR(1)                                                                                            \
-  QTB_CLEAR(2) QTB_CLEAR(3) QTB_CLEAR(4) QTB_CLEAR(5) QTB_CLEAR(6) QTB_CLEAR(7) QTB_CLEAR(8) QTB_CLEAR(9) \
-      QTB_CLEAR(10) QTB_CLEAR(11) QTB_CLEAR(12) QTB_CLEAR(13) QTB_CLEAR(14) QTB_CLEAR(15)
+#define QTB_CLEAR_ALL \
+  QTB_CLEAR(0) QTB_CLEAR(1) QTB_CLEAR(2) QTB_CLEAR(3) QTB_CLEAR(4) QTB_CLEAR(5) QTB_CLEAR(6) QTB_CLEAR(7) \
+  QTB_CLEAR(8) QTB_CLEAR(9) QTB_CLEAR(10) QTB_CLEAR(11) QTB_CLEAR(12) QTB_CLEAR(13) QTB_CLEAR(14) QTB_CLEAR(15)
+// clang-format on
 
 #define QTB_LOOP(body) ".p2align 6\n1:\n\t" body "dec %0\n\tjnz 1b"
 

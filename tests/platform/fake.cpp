@@ -52,8 +52,7 @@ CpuidRegisters platform_cpuid(std::uint32_t leaf, std::uint32_t subleaf) {
         r = processor.caches.back();
       r.eax |= (processor.cores_per_package - 1) << 26;
       break;
-    default:
-      break;
+    default: break;
   }
   return r;
 }

@@ -201,21 +201,11 @@ std::string random_text(std::mt19937 &random) {
       text = text + any(random, keys) + any(random, signs) + any(random, numbers) + any(random, separators);
     else
       switch (random() % 5) {
-        case 0:
-          text += any(random, keys);
-          break;
-        case 1:
-          text += any(random, signs);
-          break;
-        case 2:
-          text += any(random, numbers);
-          break;
-        case 3:
-          text += any(random, separators);
-          break;
-        default:
-          text += any(random, words);
-          break;
+        case 0: text += any(random, keys); break;
+        case 1: text += any(random, signs); break;
+        case 2: text += any(random, numbers); break;
+        case 3: text += any(random, separators); break;
+        default: text += any(random, words); break;
       }
   }
   if (!text.empty() && random() % 4 == 0) text[random() % text.size()] = static_cast<char>(1 + random() % 255);
