@@ -67,20 +67,21 @@ struct Form {
   BetaKernel<T> *with_beta;
 };
 
-#define FOLDING(tier, T, t, mr, depth, stage)                                                                           \
-  {#t "gemm_kernel", tier_##tier, mr, 4, 1, 0, stage, Beta::one, qtb_blas_##tier##_##t##gemm_kernel, nullptr},          \
-      {#t "gemm_kernel_" #depth,                                                                                        \
-       tier_##tier,                                                                                                     \
-       mr,                                                                                                              \
-       4,                                                                                                               \
-       1,                                                                                                               \
-       depth,                                                                                                           \
-       stage,                                                                                                           \
-       Beta::one,                                                                                                       \
-       qtb_blas_##tier##_##t##gemm_kernel_##depth,                                                                      \
-       nullptr},                                                                                                        \
-      {#t "gemm_kernel_0", tier_##tier, mr, 4, 1, 0, stage, Beta::zero, qtb_blas_##tier##_##t##gemm_kernel_0, nullptr}, \
-  {                                                                                                                     \
+#define FOLDING(tier, T, t, mr, depth, stage)                                                                          \
+  {#t "gemm_kernel", tier_##tier, mr, 4, 1, 0, stage, Beta::one, qtb_blas_##tier##_##t##gemm_kernel, nullptr},         \
+      {#t "gemm_kernel_" #depth,                                                                                       \
+       tier_##tier,                                                                                                    \
+       mr,                                                                                                             \
+       4,                                                                                                              \
+       1,                                                                                                              \
+       depth,                                                                                                          \
+       stage,                                                                                                          \
+       Beta::one,                                                                                                      \
+       qtb_blas_##tier##_##t##gemm_kernel_##depth,                                                                     \
+       nullptr},                                                                                                       \
+      {#t "gemm_kernel_0", tier_##tier, mr, 4, 1, 0, stage, Beta::zero,                                                \
+       qtb_blas_##tier##_##t##gemm_kernel_0, nullptr},                                                                 \
+  {                                                                                                                    \
 #t "gemm_kernel_b", tier_##tier, mr, 4, 1, 0, stage, Beta::other, nullptr, qtb_blas_##tier##_##t##gemm_kernel_b     \
   }
 template <class T>
