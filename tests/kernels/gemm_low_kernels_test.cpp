@@ -22,6 +22,7 @@ using EdgeKernel = void(EDGE_PARAMS);
 
 extern "C" {
 // clang-format off
+// clang-format off
 #define FOLDING(tier, T, t, fixed)                                       \
   QTB_HIDDEN AddingKernel<T> qtb_blas_##tier##_##t##gemm_kernel;         \
   QTB_HIDDEN AddingKernel<T> qtb_blas_##tier##_##t##gemm_kernel_##fixed; \
@@ -48,7 +49,7 @@ EDGE_KERNELS(DECLARE)
 
 enum class Beta { one, zero, other };
 // clang-format on
-
+// clang-format on
 template <class T>
 T beta_value(Beta beta) {
   return beta == Beta::one ? value<T>(1, 0) : beta == Beta::zero ? value<T>(0, 0) : value<T>(-0.75, 0.5);
