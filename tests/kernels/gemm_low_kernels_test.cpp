@@ -22,7 +22,6 @@ using EdgeKernel = void(EDGE_PARAMS);
 
 extern "C" {
 // clang-format off
-// clang-format off
 #define FOLDING(tier, T, t, fixed)                                       \
   QTB_HIDDEN AddingKernel<T> qtb_blas_##tier##_##t##gemm_kernel;         \
   QTB_HIDDEN AddingKernel<T> qtb_blas_##tier##_##t##gemm_kernel_##fixed; \
@@ -39,7 +38,7 @@ QTB_HIDDEN AddingKernel<double> qtb_blas_def_dgemm_kernel;
 QTB_HIDDEN AddingKernel<double> qtb_blas_def_dgemm_kernel_128;
 QTB_HIDDEN void qtb_blas_def_dgemm_def_kernel_in_place(bool transb, QtbInt m, QtbInt n, QtbInt depth, const double *ap,
                                                        QtbInt ldap, const double *b, QtbInt ldb, double *c, QtbInt ldc,
-                                                       double *stage);
+                                                       double *room);
 #define EDGE_KERNELS(X) \
   X(a112) X(a112e) X(ak) X(ak_b) X(ak_0) X(n112) X(t112) X(nk) X(tk) X(nk_b) X(tk_b) X(nk_0) X(tk_0)
 #define DECLARE(name) QTB_HIDDEN EdgeKernel qtb_blas_sse3_dgemm_kernel_##name;
@@ -48,8 +47,6 @@ EDGE_KERNELS(DECLARE)
 }
 
 enum class Beta { one, zero, other };
-// clang-format on
-// clang-format on
 template <class T>
 T beta_value(Beta beta) {
   return beta == Beta::one ? value<T>(1, 0) : beta == Beta::zero ? value<T>(0, 0) : value<T>(-0.75, 0.5);
