@@ -2,6 +2,8 @@
 //
 // A pass over accumulators is written this way, and not as a loop: indices that are constants from the start let the
 // compiler keep an array of accumulators in registers.
+//
+// What is long and needs no such constant is a loop under QTB_WRITTEN_OUT, which writes out up to 128 turns.
 #pragma once
 
 #include "blas/kernels/kernel.h"
@@ -24,3 +26,11 @@ template <int count, int k = 0, class F>
 
 }  // namespace
 }  // namespace qtb::QTB_TIER
+
+// In front of a loop that is written out in full; not where every load is watched, since the compiler would need
+// minutes for so long a line of checks.
+#if defined(__SANITIZE_ADDRESS__)
+#define QTB_WRITTEN_OUT _Pragma("GCC unroll 1")
+#else
+#define QTB_WRITTEN_OUT _Pragma("GCC unroll 128")
+#endif

@@ -11,6 +11,7 @@
 #pragma once
 
 #include "blas/kernels/plain/plain.h"
+#include "blas/kernels/simd/repeat.h"
 
 namespace qtb::QTB_TIER {
 namespace {
@@ -92,14 +93,6 @@ template <class R, int vectors, int columns, class A, class B>
   if constexpr (A::paced) __asm__("" : "+r"(from_a.pace()), "+x"(last));
   if constexpr (B::paced) __asm__("" : "+r"(from_b.pace()), "+x"(last));
 }
-
-// In front of a loop that is written out in full; not where every load is watched, since the compiler would need
-// minutes for so long a line of checks.
-#if defined(__SANITIZE_ADDRESS__)
-#define QTB_WRITTEN_OUT _Pragma("GCC unroll 1")
-#else
-#define QTB_WRITTEN_OUT _Pragma("GCC unroll 128")
-#endif
 
 // How the steps of a depth are written: all of longest steps, up to longest with a test after each, all of longest in a
 // loop of four steps per turn, any depth in such a loop, or in one of a step per turn.

@@ -321,14 +321,15 @@ template <class T, Family family, int width, bool aligned, int fixed_lines>
     });
     const R *a = parts(ap), *operand = b;
     if constexpr (fixed_lines > 0) {
-      repeat<fixed_lines>([&](auto) __attribute__((always_inline)) {
+      QTB_WRITTEN_OUT
+      for (int l = 0; l < fixed_lines; l++) {
         multiply_add_line<Scheme>(a, operand, sums);
         // Offsets of one byte: the speed of straight-line code is that at which it can be fetched.
         a += line;
         operand += 2 * Scheme::b_step;
         keep_apart(a, sums.at[0][0]);
         keep_apart(operand, sums.at[0][0]);
-      });
+      }
     } else {
       for (QtbInt left = kp; left > 0; left -= rules.ku) {
         repeat<lines_per_turn>([&](auto l) __attribute__((always_inline)) {
