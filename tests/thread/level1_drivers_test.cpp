@@ -368,12 +368,13 @@ TEST_F(Level1Drivers, LengthsAroundTheChunksAtEveryIncrement) {
   });
 }
 
-TEST_F(Level1Drivers, NothingIsDoneForLengthsBelowOne) {
+TEST_F(Level1Drivers, NothingIsDoneForLengthsBelowOneAndNoVectors) {
   for_each_level1_routine([&]<class T>(const Level1Routine<T> &r) {
     for (const QtbInt n : {0, -1, -5, -1000})
       for (const QtbInt inc : {1, -2}) {
         Operands<T> o({0, inc, inc});
         o.call.n = n;
+        o.call.x = o.call.y = nullptr;
         r.driver(4, o.call);
         if (r.is_dot()) {
           EXPECT_TRUE(same_bits(o.call.result, T{})) << r.name;

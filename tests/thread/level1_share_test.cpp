@@ -74,10 +74,14 @@ TEST(Level1Share, VectorShorterThanEightPerThreadGoesToTheLast) {
   for (QtbInt rank = 0; rank < 4; ++rank) EXPECT_EQ(level1_share(31, 4, rank).len, rank == 3 ? 31 : 0);
 }
 
-TEST(Level1Share, LengthsBelowOneGiveNothingToDo) {
+TEST(Level1Share, LengthsBelowOneGiveNothingToDoAtTheCallersPointer) {
   for (const QtbInt n : {0, -1, -5, -8, -100, -100000})
     for (QtbInt team = 1; team <= 40; ++team)
-      for (QtbInt rank = 0; rank < team; ++rank) ASSERT_LE(level1_share(n, team, rank).len, 0);
+      for (QtbInt rank = 0; rank < team; ++rank) {
+        const Level1Share share = level1_share(n, team, rank);
+        ASSERT_LE(share.len, 0);
+        for (const QtbInt inc : {-3, -1, 0, 1, 2}) ASSERT_EQ(level1_offset(share, n, inc), 0);
+      }
 }
 
 TEST(Level1Share, EmptyShareStartsInsideTheVector) {

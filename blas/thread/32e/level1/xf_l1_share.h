@@ -20,8 +20,10 @@ struct Level1Share {
 
 // The share of thread rank, 0 to team - 1. The shares are disjoint and cover the n elements. All are equal but the
 // last, which takes the remainder; where the equal part is nothing, the last is the whole vector. Empty shares too
-// start inside the vector; below n of 1 no share has a positive length.
+// start inside the vector. Below n of 1 every share is the vector as the caller gave it, whose pointer may be null and
+// is not to be moved.
 inline Level1Share level1_share(QtbInt n, QtbInt team, QtbInt rank) {
+  if (n < 1) return {0, n};
   const QtbInt chunk = n / team / level1_grain * level1_grain;
   const QtbInt start = chunk * rank;
   return {start, rank == team - 1 ? n - start : chunk};
