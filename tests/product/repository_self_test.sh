@@ -41,6 +41,13 @@ expect() {
 
 clean_tree
 expect clean ""
+if command -v git >/dev/null; then
+  git init -q "$folder"
+  echo tree > "$folder/.gitignore"
+  printf 'int\tn;\n' >> blas/types.h
+  expect "inside another tree that ignores it" "blas/types.h:3: tab"
+  rm -rf "$folder/.git"
+fi
 printf 'int\tn;\n' >> blas/types.h
 expect tab "blas/types.h:3: tab"
 printf 'int n; \n' >> blas/types.h

@@ -15,8 +15,9 @@ cd "$1"
 findings=$(mktemp)
 trap 'rm -f "$findings"' EXIT
 
-# Without version control (a release archive, say) everything but the build folder is the tree.
-if git rev-parse --is-inside-work-tree >/dev/null 2>&1; then
+# Without version control of its own (a release archive, say, perhaps unpacked inside another tree), or for a user whom
+# git does not trust with the owner's tree, everything but the build folder is the tree.
+if [ "$(git rev-parse --show-toplevel 2>/dev/null)" = "$(pwd -P)" ]; then
   files=$(git ls-files --cached --others --exclude-standard)
 else
   files=$(find . -name build -prune -o -name .git -prune -o -type f -print | sed 's,^\./,,')
