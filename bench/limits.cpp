@@ -24,20 +24,21 @@ double best_rate(Run &&run, double work_per_call) {
   return work_per_call / best;
 }
 
-// Sixteen registers, each its own chain: products of ones and sums of zeros, in turn, so that both kinds of units are
-// full and no value ever changes.
+// Sixteen registers, each its own chain: products and sums in turn, so that both kinds of units are full. All registers
+// are zero and stay so, since what they hold is of no matter as long as it is neither subnormal nor NaN.
 // clang-format off
 #define QTB_PAIR(type, a, b) "mul" type " %%xmm" #a ", %%xmm" #a "\n\tadd" type " %%xmm" #b ", %%xmm" #b "\n\t"
-#define QTB_ARITHMETIC(type) \
-  QTB_PAIR(type, 0, 8) QTB_PAIR(type, 1, 9) QTB_PAIR(type, 2, 10) QTB_PAIR(type, 3, 11) \
-  QTB_PAIR(type, 4, 12) QTB_PAIR(type, 5, 13) QTB_PAIR(type, 6, 14) QTB_PAIR(type, 7, 15)
+#define QTB_WIDE_PAIR(type, a, b) \
+  "vmul" type " %%ymm" #a ", %%ymm" #a ", %%ymm" #a "\n\tvadd" type " %%ymm" #b ", %%ymm" #b ", %%ymm" #b "\n\t"
+#define QTB_ARITHMETIC(pair, type) \
+  pair(type, 0, 8) pair(type, 1, 9) pair(type, 2, 10) pair(type, 3, 11) \
+  pair(type, 4, 12) pair(type, 5, 13) pair(type, 6, 14) pair(type, 7, 15)
 #define QTB_CLOBBERED                                                                                                 \
   "xmm0", "xmm1", "xmm2", "xmm3", "xmm4", "xmm5", "xmm6", "xmm7", "xmm8", "xmm9", "xmm10", "xmm11", "xmm12", "xmm13", \
       "xmm14", "xmm15"
 
 constexpr double instructions = 16;  // per pass of each loop
 
-// What the registers hold is of no matter as long as it is neither subnormal nor NaN: all are set to zero first.
 #define QTB_CLEAR(r) "xorps %%xmm" #r ", %%xmm" #r "\n\t"
 #define QTB_CLEAR_ALL \
   QTB_CLEAR(0) QTB_CLEAR(1) QTB_CLEAR(2) QTB_CLEAR(3) QTB_CLEAR(4) QTB_CLEAR(5) QTB_CLEAR(6) QTB_CLEAR(7) \
@@ -47,10 +48,23 @@ constexpr double instructions = 16;  // per pass of each loop
 #define QTB_LOOP(body) ".p2align 6\n1:\n\t" body "dec %0\n\tjnz 1b"
 
 void double_loop(long count) {
-  asm volatile(QTB_CLEAR_ALL QTB_LOOP(QTB_ARITHMETIC("pd")) : "+r"(count) : : QTB_CLOBBERED);
+  asm volatile(QTB_CLEAR_ALL QTB_LOOP(QTB_ARITHMETIC(QTB_PAIR, "pd")) : "+r"(count) : : QTB_CLOBBERED);
 }
 void single_loop(long count) {
-  asm volatile(QTB_CLEAR_ALL QTB_LOOP(QTB_ARITHMETIC("ps")) : "+r"(count) : : QTB_CLOBBERED);
+  asm volatile(QTB_CLEAR_ALL QTB_LOOP(QTB_ARITHMETIC(QTB_PAIR, "ps")) : "+r"(count) : : QTB_CLOBBERED);
+}
+// Upper halves that stay in use would slow the 16-byte instructions behind them.
+[[gnu::target("avx")]] void wide_double_loop(long count) {
+  asm volatile("vzeroall\n\t" QTB_LOOP(QTB_ARITHMETIC(QTB_WIDE_PAIR, "pd")) "\n\tvzeroupper"
+               : "+r"(count)
+               :
+               : QTB_CLOBBERED);
+}
+[[gnu::target("avx")]] void wide_single_loop(long count) {
+  asm volatile("vzeroall\n\t" QTB_LOOP(QTB_ARITHMETIC(QTB_WIDE_PAIR, "ps")) "\n\tvzeroupper"
+               : "+r"(count)
+               :
+               : QTB_CLOBBERED);
 }
 
 alignas(64) char block[256];
@@ -81,6 +95,10 @@ CoreLimits measure_core_limits() {
   CoreLimits limits{};
   limits.double_flops = best_rate(double_loop, instructions * 2);
   limits.single_flops = best_rate(single_loop, instructions * 4);
+  if (__builtin_cpu_supports("avx") != 0) {
+    limits.wide_double_flops = best_rate(wide_double_loop, instructions * 4);
+    limits.wide_single_flops = best_rate(wide_single_loop, instructions * 8);
+  }
   limits.load_rate = best_rate(load_loop, instructions);
   limits.store_rate = best_rate(store_loop, instructions);
   return limits;
