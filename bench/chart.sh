@@ -5,7 +5,8 @@
 #   square-<tier>   this library and the peer on one tier, a panel per type
 #   square-tiers    this library on every tier, a panel per type
 #
-# The grey lines are the arithmetic peak of a core with the vectors of the kernel, as compare measured it in the run.
+# The grey lines are the arithmetic peak of a core in GFLOP/s, with vectors of the size that the tier's kernel has, as
+# compare measured it in the run. A peer may have wider vectors.
 set -eu
 results=$1
 order='def sse3 ssse3 sse42 avx'
@@ -39,6 +40,9 @@ range=$(cat "$scratch"/* | sort -n | awk 'NR == 1 { first = $1 } END { print "["
 # The level of a file's limit lines: the median, since each run measures it anew.
 limit() { sort -n -k 4 "$1" | awk '{ limit[NR] = $4 } END { if (NR) print limit[int((NR + 1) / 2)]; else print 0 }'; }
 
+# The top of a panel: some room above all lines of these files.
+top() { awk '{ for (i = 2; i <= 4; i++) if ($i > top) top = $i } END { print top * 1.12 }' "$@"; }
+
 # draw name title panel: both files of one picture; panel routine prints its plot command.
 draw() {
   for form in svg png; do
@@ -56,21 +60,22 @@ set xtics (4, 8, 16, 32, 64, 125, 250, 500, 1000, 2000, 4000) nomirror out
 set ytics nomirror out
 set border 3 lc rgb '#555555'
 set grid y lc rgb '#dddddd' lt 1
-set xlabel 'order n'
+set xlabel 'order n' offset 0, 0.3
 set ylabel 'GFLOP/s'
-set key bottom right samplen 2 spacing 1.1
+set key below horizontal center samplen 2 reverse Left width 1
 set lmargin 9
+set bmargin 5.5
 END
       for routine in sgemm dgemm cgemm zgemm; do "$3" $routine; done
     } | gnuplot
   done
 }
 
-# The horizontal line of a peak, with its value above its left end.
+# The horizontal line of a peak, named above its left end.
 peak() { # number height label
   cat << END
 set arrow $1 from graph 0, first $2 to graph 1, first $2 nohead lc rgb '#888888' lw 1.5 dt (8, 4)
-set label $1 sprintf('$3 %.0f GFLOP/s', $2) at graph 0.02, first $2 offset 0, 0.6 tc rgb '#666666'
+set label $1 sprintf('peak %.0f$3', $2) at graph 0.02, first $2 offset 0, 0.6 font ',11' tc rgb '#666666'
 END
 }
 
@@ -88,9 +93,9 @@ pair_panel() {
   file=$scratch/$tier-$1
   [ -s "$file" ] || return 0
   height=$(limit "$file")
-  peak 1 "$height" peak
+  peak 1 "$height" ''
   echo "set title '$1'"
-  echo "set yrange [0:$height * 1.15]"
+  echo "set yrange [0:$(top "$file")]"
   printf "plot '%s' using 1:2 with linespoints lw 2 pt 7 ps 0.6 lc rgb '#0072b2' title 'this library'" "$file"
   if awk '$3 > 0 { found = 1 } END { exit !found }' "$file"; then
     printf ", '%s' using 1:3 with linespoints lw 2 pt 5 ps 0.5 dt 2 lc rgb '#d55e00' title 'peer'" "$file"
@@ -99,19 +104,19 @@ pair_panel() {
 }
 
 tiers_panel() {
-  heights=$(for tier in $tiers; do limit "$scratch/$tier-$1"; done | sort -n)
+  files=
+  for tier in $tiers; do files="$files $scratch/$tier-$1"; done
+  # shellcheck disable=SC2086 # a list of names without blanks
+  heights=$(for file in $files; do limit "$file"; done | sort -n)
   lowest=$(echo "$heights" | head -n 1)
   highest=$(echo "$heights" | tail -n 1)
   echo "unset arrow; unset label"
-  peak 1 "$lowest" 'peak, 16-byte vectors,'
+  peak 1 "$lowest" ' (16-byte vectors)'
   # What differs by less than that is the same peak, measured twice.
-  if awk "BEGIN { exit !($highest > 1.5 * $lowest) }"; then
-    peak 2 "$highest" 'peak, 32-byte vectors,'
-  else
-    highest=$lowest
-  fi
+  if awk "BEGIN { exit !($highest > 1.5 * $lowest) }"; then peak 2 "$highest" ' (32-byte vectors)'; fi
   echo "set title '$1'"
-  echo "set yrange [0:$highest * 1.15]"
+  # shellcheck disable=SC2086
+  echo "set yrange [0:$(cut -d ' ' -f 1,2,4 $files | top)]"
   separator=plot
   for tier in $tiers; do
     printf "%s '%s' using 1:2 with linespoints lw 2 pt 7 ps 0.6 lc rgb '%s' title '%s'" \

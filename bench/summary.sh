@@ -1,5 +1,6 @@
 #!/bin/sh
-# summary.sh RESULTS: the comparisons in RESULTS/*.csv as Markdown tables, a row per routine and case, a column per tier.
+# summary.sh RESULTS: the comparisons in RESULTS/*.csv as Markdown tables: a row per routine and case, a column per
+# tier.
 set -eu
 cd "$1"
 
@@ -77,5 +78,5 @@ section 'Matrix products, all threads' \
   'Ratio to this library on one thread / ratio to the peer on all threads' \
   ratio threads-serial threads-peer
 section 'Level 1, one thread' \
-  'GFLOP/s, or GB/s where nothing is computed / share of what loads, stores and arithmetic allow in cache / ratio to the peer' \
+  'GFLOP/s, or GB/s where nothing is computed / share of what a core allows in cache / ratio to the peer' \
   rate vectors
