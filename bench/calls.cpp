@@ -127,7 +127,7 @@ Calls make_calls(const Routine &routine, void *function, long size, long increme
     auto *f = reinterpret_cast<void (*)(R *, R *, R *, R *)>(function);
     return [=](long count) {
       for (long i = 0; i < count; ++i) {
-        R a[2] = {R(3), R(1)}, b[2] = {R(4), R(2)}, c[2], s[2];
+        R a[2] = {R(3), R(1)}, b[2] = {R(4), R(2)}, c[2] = {}, s[2] = {};
         f(a, b, c, s);
         sink = static_cast<double>(c[0]);
       }
@@ -161,7 +161,7 @@ Calls make_calls(const Routine &routine, void *function, long size, long increme
   if (kind == "cdoti") {
     auto *f = reinterpret_cast<R *(*)(R *, const I *, const R *, const I *, const R *)>(function);
     return [=](long count) {
-      R result[2];
+      R result[2] = {};
       for (long i = 0; i < count; ++i) f(result, &n, x, index, y);
       sink = static_cast<double>(result[0]);
     };
@@ -197,7 +197,7 @@ Calls make_complex_dot(const Library &library, void *function, long size, long i
     auto *f = reinterpret_cast<void *(*)(R *, const std::int64_t *, const R *, const std::int64_t *, const R *,
                                          const std::int64_t *)>(function);
     return [=, n = std::int64_t{size}, inc = std::int64_t{increment}](long count) {
-      R result[2];
+      R result[2] = {};
       for (long i = 0; i < count; ++i) f(result, &n, x, &inc, y, &inc);
       sink = static_cast<double>(result[0]);
     };

@@ -81,14 +81,15 @@ bool compare(const Options &options, const Case &item, std::FILE *csv) {
   std::vector<Side> sides = {options.ours};
   if (has_peer) sides.push_back(options.peer);
   const std::vector<Measurement> measured = measure_in_turn(sides, item.prepare, options.turns, options.seconds);
-  const Measurement &ours = measured[0], &peer = measured.back();
+  const Measurement no_peer{Outcome::absent, {}, 0};
+  const Measurement &ours = measured[0], &peer = has_peer ? measured[1] : no_peer;
   if (ours.outcome == Outcome::absent) return true;
 
   const auto time_of = [](const Measurement &side) { return side.seconds.empty() ? 0 : spread(side.seconds).median; };
-  const double ours_time = time_of(ours), peer_time = has_peer ? time_of(peer) : 0;
+  const double ours_time = time_of(ours), peer_time = time_of(peer);
   const auto rate = [&](double seconds) { return seconds > 0 ? item.work / seconds / 1e9 : 0; };
   std::vector<double> ratio;
-  for (std::size_t i = 0; has_peer && i < std::min(ours.seconds.size(), peer.seconds.size()); ++i)
+  for (std::size_t i = 0; i < std::min(ours.seconds.size(), peer.seconds.size()); ++i)
     ratio.push_back(peer.seconds[i] / ours.seconds[i]);
   const Spread ratios = ratio.empty() ? Spread{} : spread(ratio);
   const double share = ours_time > 0 ? item.least_seconds / ours_time : 0;
@@ -113,15 +114,12 @@ bool compare(const Options &options, const Case &item, std::FILE *csv) {
   std::fflush(stdout);
 
   if (csv != nullptr) {
-    const auto row = [&](double peer_cores, const char *peer_outcome) {
-      std::fprintf(csv, "%s,%s,%s,%ld,%.4g,%.4g,%.4g,%.4g,%s,%.4g,%.4g,%.4g,%.4g,%.4g,%.3g,%.3g,%s,%s\n",
-                   item.routine.c_str(), item.letters.c_str(), item.numbers.c_str(), options.threads, ours_time * 1e9,
-                   rate(ours_time), peer_time * 1e9, rate(peer_time), item.unit, ratios.median, ratios.low, ratios.high,
-                   rate(item.least_seconds), share, ours.cores, peer_cores, name(ours.outcome), peer_outcome);
-    };
-    has_peer ? row(peer.cores, name(peer.outcome)) : row(0, name(Outcome::absent));
+    std::fprintf(csv, "%s,%s,%s,%ld,%.4g,%.4g,%.4g,%.4g,%s,%.4g,%.4g,%.4g,%.4g,%.4g,%.3g,%.3g,%s,%s\n",
+                 item.routine.c_str(), item.letters.c_str(), item.numbers.c_str(), options.threads, ours_time * 1e9,
+                 rate(ours_time), peer_time * 1e9, rate(peer_time), item.unit, ratios.median, ratios.low, ratios.high,
+                 rate(item.least_seconds), share, ours.cores, peer.cores, name(ours.outcome), name(peer.outcome));
   }
-  return !failed(ours.outcome) && !(has_peer && failed(peer.outcome));
+  return !failed(ours.outcome) && !failed(peer.outcome);
 }
 
 Case vector_case(const Options &options, const CoreLimits &limits, const Routine &routine, long n) {
@@ -201,7 +199,8 @@ std::complex<double> parse_scalar(const std::string &text) {
 
 Options parse(int argc, char **argv) {
   Options options;
-  std::string tier = std::getenv("QTB_DEBUG_CPU_TYPE") != nullptr ? std::getenv("QTB_DEBUG_CPU_TYPE") : "";
+  const char *tier_of_process = std::getenv("QTB_DEBUG_CPU_TYPE");
+  std::string tier = tier_of_process != nullptr ? tier_of_process : "";
   for (int i = 1; i < argc; i += 2) {
     const std::string key = argv[i];
     if (i + 1 >= argc) fail("no value for " + key);

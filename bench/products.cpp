@@ -2,6 +2,7 @@
 
 #include "bench/products.h"
 
+#include <algorithm>
 #include <cmath>
 #include <cstdint>
 #include <limits>
