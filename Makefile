@@ -18,7 +18,7 @@ help:
 	@echo 'make demo       builds and runs the examples'
 	@echo 'make test       builds everything and runs the tests'
 	@echo 'make test-long  more cases, both sanitizers, and the fuzz targets'
-	@echo 'make bench      benchmarks'
+	@echo 'make bench      benchmarks, beside PEER=library; bench/run.sh has the other variables'
 	@echo 'make lint       formatting and static analysis'
 	@echo 'make format     formats the sources'
 	@echo 'make asan       the tests under the address and undefined-behaviour sanitizers'

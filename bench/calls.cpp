@@ -2,11 +2,8 @@
 
 #include "bench/calls.h"
 
-#include <dlfcn.h>
-
 #include <algorithm>
 #include <cstdint>
-#include <cstdio>
 #include <cstring>
 #include <random>
 #include <type_traits>
@@ -40,8 +37,6 @@ const std::vector<Routine> routines = {
     {"dgthrz", "gthr", 'd', 1, 2, 0},   {"cgthrz", "gthr", 'c', 1, 2, 0},   {"zgthrz", "gthr", 'z', 1, 2, 0},
     {"ssctr", "sctr", 's', 1, 1, 0},    {"dsctr", "sctr", 'd', 1, 1, 0},    {"csctr", "sctr", 'c', 1, 1, 0},
     {"zsctr", "sctr", 'z', 1, 1, 0},    {"sroti", "roti", 's', 2, 2, 6},    {"droti", "roti", 'd', 2, 2, 6},
-    {"sgemm", "gemm", 's', 0, 0, 2},    {"dgemm", "gemm", 'd', 0, 0, 2},    {"cgemm", "gemm", 'c', 0, 0, 8},
-    {"zgemm", "gemm", 'z', 0, 0, 8},
 };
 
 std::size_t type_bytes(char type) {
@@ -54,17 +49,6 @@ std::size_t type_bytes(char type) {
 
 namespace {
 
-double *aligned(std::size_t bytes) { return static_cast<double *>(std::aligned_alloc(64, (bytes + 4095) / 64 * 64)); }
-
-template <class R>
-void fill(void *p, std::size_t bytes) {
-  std::mt19937 random(12345);
-  std::uniform_real_distribution<R> values(R(0.5), R(1));
-  R *values_of = static_cast<R *>(p);
-  for (std::size_t i = 0; i < bytes / sizeof(R); ++i)
-    values_of[i] = (random() & 1U) != 0 ? values(random) : -values(random);
-}
-
 double sink;  // keeps results alive
 
 // The calls of one routine of one library on the operands, with integers of type I and real parts of type R. Scalars
@@ -73,7 +57,6 @@ template <class I, class R>
 Calls make_calls(const Routine &routine, void *function, long size, long increment, Operands &operands) {
   const I n = static_cast<I>(size), inc = static_cast<I>(increment);
   R *x = reinterpret_cast<R *>(operands.x.get()), *y = reinterpret_cast<R *>(operands.y.get());
-  R *z = reinterpret_cast<R *>(operands.z.get());
   const std::string kind = routine.kind;
   if (kind == "dot") {
     auto *f = reinterpret_cast<R (*)(const I *, const R *, const I *, const R *, const I *)>(function);
@@ -144,7 +127,7 @@ Calls make_calls(const Routine &routine, void *function, long size, long increme
     auto *f = reinterpret_cast<void (*)(R *, R *, R *, R *)>(function);
     return [=](long count) {
       for (long i = 0; i < count; ++i) {
-        R a[2] = {R(3), R(1)}, b[2] = {R(4), R(2)}, c[2], s[2];
+        R a[2] = {R(3), R(1)}, b[2] = {R(4), R(2)}, c[2] = {}, s[2] = {};
         f(a, b, c, s);
         sink = static_cast<double>(c[0]);
       }
@@ -178,7 +161,7 @@ Calls make_calls(const Routine &routine, void *function, long size, long increme
   if (kind == "cdoti") {
     auto *f = reinterpret_cast<R *(*)(R *, const I *, const R *, const I *, const R *)>(function);
     return [=](long count) {
-      R result[2];
+      R result[2] = {};
       for (long i = 0; i < count; ++i) f(result, &n, x, index, y);
       sink = static_cast<double>(result[0]);
     };
@@ -202,15 +185,6 @@ Calls make_calls(const Routine &routine, void *function, long size, long increme
       for (long i = 0; i < count; ++i) f(&n, x, index, y, &c, &s);
     };
   }
-  if (kind == "gemm") {
-    auto *f =
-        reinterpret_cast<void (*)(const char *, const char *, const I *, const I *, const I *, const R *, const R *,
-                                  const I *, const R *, const I *, const R *, R *, const I *)>(function);
-    return [=](long count) {
-      const R one[2] = {R(1), R(0)}, nothing[2] = {R(0), R(0)};
-      for (long i = 0; i < count; ++i) f("N", "N", &n, &n, &n, one, x, &n, y, &n, nothing, z, &n);
-    };
-  }
   return {};
 }
 
@@ -223,7 +197,7 @@ Calls make_complex_dot(const Library &library, void *function, long size, long i
     auto *f = reinterpret_cast<void *(*)(R *, const std::int64_t *, const R *, const std::int64_t *, const R *,
                                          const std::int64_t *)>(function);
     return [=, n = std::int64_t{size}, inc = std::int64_t{increment}](long count) {
-      R result[2];
+      R result[2] = {};
       for (long i = 0; i < count; ++i) f(result, &n, x, &inc, y, &inc);
       sink = static_cast<double>(result[0]);
     };
@@ -254,25 +228,21 @@ Calls bind(const Library &library, const Routine &routine, long n, long incremen
                 : make_calls<std::int32_t, double>(routine, function, n, increment, operands);
 }
 
-bool Routine::is_matrix() const { return std::strcmp(kind, "gemm") == 0; }
 bool Routine::is_single() const { return type == 's' || type == 'c'; }
 
-double call_flops(const Routine &routine, long n) {
-  const double size = static_cast<double>(n);
-  return routine.flops * (routine.is_matrix() ? size * size * size : size);
-}
+double call_flops(const Routine &routine, long n) { return routine.flops * static_cast<double>(n); }
 
 double call_bytes(const Routine &routine, long n) {
-  const double size = static_cast<double>(n), width = static_cast<double>(type_bytes(routine.type));
-  return routine.is_matrix() ? 3 * size * size * width : size * width * (routine.read + routine.written);
+  const double bytes = static_cast<double>(n) * static_cast<double>(type_bytes(routine.type));
+  return bytes * (routine.read + routine.written);
 }
 
 Operands make_operands(const Routine &routine, long n, long increment) {
-  const std::size_t elements = static_cast<std::size_t>(routine.is_matrix() ? n * n : n * increment);
+  const std::size_t elements = static_cast<std::size_t>(n * increment);
   const std::size_t bytes = elements * type_bytes(routine.type);
   Operands operands;
-  for (auto *p : {&operands.x, &operands.y, &operands.z}) {
-    p->reset(aligned(bytes));
+  for (auto *p : {&operands.x, &operands.y}) {
+    *p = allocate(bytes);
     if (routine.is_single())
       fill<float>(p->get(), bytes);
     else
@@ -289,19 +259,6 @@ Operands make_operands(const Routine &routine, long n, long increment) {
     first = last;
   }
   return operands;
-}
-
-void *Library::find(const std::string &name) const { return dlsym(handle, (wide ? name : name + "_").c_str()); }
-
-Library load_library(const std::string &path, bool wide) {
-  Library library;
-  library.wide = wide;
-  library.handle = dlopen(path.c_str(), RTLD_NOW | RTLD_LOCAL);
-  if (library.handle == nullptr) {
-    std::fprintf(stderr, "%s\n", dlerror());
-    std::exit(2);
-  }
-  return library;
 }
 
 }  // namespace qtb::bench

@@ -54,7 +54,6 @@ std::string rate_text(double rate, const char *unit) {
 int main(int argc, char **argv) {
   static const Library library = load_library(QTB_LIBRARY_PATH, true);
   for (const Routine &routine : routines) {
-    if (routine.is_matrix()) continue;
     for (const long increment : increments) {
       if (increment != 1 && (is_sparse(routine) || !has_vector(routine))) continue;
       for (const long n : sizes) {
@@ -71,6 +70,8 @@ int main(int argc, char **argv) {
   const CoreLimits limits = measure_core_limits();
   benchmark::AddCustomContext("double arithmetic", rate_text(limits.double_flops, "GFLOP/s"));
   benchmark::AddCustomContext("single arithmetic", rate_text(limits.single_flops, "GFLOP/s"));
+  benchmark::AddCustomContext("double arithmetic, 32 bytes", rate_text(limits.wide_double_flops, "GFLOP/s"));
+  benchmark::AddCustomContext("single arithmetic, 32 bytes", rate_text(limits.wide_single_flops, "GFLOP/s"));
   benchmark::AddCustomContext("16-byte loads", rate_text(limits.load_rate, "G/s"));
   benchmark::AddCustomContext("16-byte stores", rate_text(limits.store_rate, "G/s"));
   benchmark::AddCustomContext("copy bandwidth, one thread", rate_text(measure_copy_bandwidth(copy_bytes, 1), "GB/s"));

@@ -13,8 +13,11 @@
 namespace qtb::bench {
 namespace {
 
-constexpr double measure_seconds = 0.02;
-constexpr int measure_times = 7;  // the best of so many: a limit is what the core does undisturbed
+// A limit is what the core does undisturbed: the best of many looks, each shorter than a time slice, so that some fall
+// between the slices of other programs.
+constexpr double measure_seconds = 0.001;
+constexpr int measure_times = 100;
+constexpr int copy_times = 7;  // a copy beyond the caches takes longer than any slice
 
 template <class Run>
 double best_rate(Run &&run, double work_per_call) {
@@ -24,20 +27,21 @@ double best_rate(Run &&run, double work_per_call) {
   return work_per_call / best;
 }
 
-// Sixteen registers, each its own chain: products of ones and sums of zeros, in turn, so that both kinds of units are
-// full and no value ever changes.
+// Sixteen registers, each its own chain: products and sums in turn, so that both kinds of units are full. All registers
+// are zero and stay so, since what they hold is of no matter as long as it is neither subnormal nor NaN.
 // clang-format off
 #define QTB_PAIR(type, a, b) "mul" type " %%xmm" #a ", %%xmm" #a "\n\tadd" type " %%xmm" #b ", %%xmm" #b "\n\t"
-#define QTB_ARITHMETIC(type) \
-  QTB_PAIR(type, 0, 8) QTB_PAIR(type, 1, 9) QTB_PAIR(type, 2, 10) QTB_PAIR(type, 3, 11) \
-  QTB_PAIR(type, 4, 12) QTB_PAIR(type, 5, 13) QTB_PAIR(type, 6, 14) QTB_PAIR(type, 7, 15)
+#define QTB_WIDE_PAIR(type, a, b) \
+  "vmul" type " %%ymm" #a ", %%ymm" #a ", %%ymm" #a "\n\tvadd" type " %%ymm" #b ", %%ymm" #b ", %%ymm" #b "\n\t"
+#define QTB_ARITHMETIC(pair, type) \
+  pair(type, 0, 8) pair(type, 1, 9) pair(type, 2, 10) pair(type, 3, 11) \
+  pair(type, 4, 12) pair(type, 5, 13) pair(type, 6, 14) pair(type, 7, 15)
 #define QTB_CLOBBERED                                                                                                 \
   "xmm0", "xmm1", "xmm2", "xmm3", "xmm4", "xmm5", "xmm6", "xmm7", "xmm8", "xmm9", "xmm10", "xmm11", "xmm12", "xmm13", \
       "xmm14", "xmm15"
 
 constexpr double instructions = 16;  // per pass of each loop
 
-// What the registers hold is of no matter as long as it is neither subnormal nor NaN: all are set to zero first.
 #define QTB_CLEAR(r) "xorps %%xmm" #r ", %%xmm" #r "\n\t"
 #define QTB_CLEAR_ALL \
   QTB_CLEAR(0) QTB_CLEAR(1) QTB_CLEAR(2) QTB_CLEAR(3) QTB_CLEAR(4) QTB_CLEAR(5) QTB_CLEAR(6) QTB_CLEAR(7) \
@@ -47,10 +51,23 @@ constexpr double instructions = 16;  // per pass of each loop
 #define QTB_LOOP(body) ".p2align 6\n1:\n\t" body "dec %0\n\tjnz 1b"
 
 void double_loop(long count) {
-  asm volatile(QTB_CLEAR_ALL QTB_LOOP(QTB_ARITHMETIC("pd")) : "+r"(count) : : QTB_CLOBBERED);
+  asm volatile(QTB_CLEAR_ALL QTB_LOOP(QTB_ARITHMETIC(QTB_PAIR, "pd")) : "+r"(count) : : QTB_CLOBBERED);
 }
 void single_loop(long count) {
-  asm volatile(QTB_CLEAR_ALL QTB_LOOP(QTB_ARITHMETIC("ps")) : "+r"(count) : : QTB_CLOBBERED);
+  asm volatile(QTB_CLEAR_ALL QTB_LOOP(QTB_ARITHMETIC(QTB_PAIR, "ps")) : "+r"(count) : : QTB_CLOBBERED);
+}
+// Upper halves that stay in use would slow the 16-byte instructions behind them.
+[[gnu::target("avx")]] void wide_double_loop(long count) {
+  asm volatile("vzeroall\n\t" QTB_LOOP(QTB_ARITHMETIC(QTB_WIDE_PAIR, "pd")) "\n\tvzeroupper"
+               : "+r"(count)
+               :
+               : QTB_CLOBBERED);
+}
+[[gnu::target("avx")]] void wide_single_loop(long count) {
+  asm volatile("vzeroall\n\t" QTB_LOOP(QTB_ARITHMETIC(QTB_WIDE_PAIR, "ps")) "\n\tvzeroupper"
+               : "+r"(count)
+               :
+               : QTB_CLOBBERED);
 }
 
 alignas(64) char block[256];
@@ -81,6 +98,10 @@ CoreLimits measure_core_limits() {
   CoreLimits limits{};
   limits.double_flops = best_rate(double_loop, instructions * 2);
   limits.single_flops = best_rate(single_loop, instructions * 4);
+  if (__builtin_cpu_supports("avx") != 0) {
+    limits.wide_double_flops = best_rate(wide_double_loop, instructions * 4);
+    limits.wide_single_flops = best_rate(wide_single_loop, instructions * 8);
+  }
   limits.load_rate = best_rate(load_loop, instructions);
   limits.store_rate = best_rate(store_loop, instructions);
   return limits;
@@ -97,7 +118,7 @@ double measure_copy_bandwidth(std::size_t bytes, int threads) {
     copy_vectors(from[first].part, to[first].part, share * 4);
   };
   double best = 1e300;
-  for (int time = 0; time < measure_times; ++time) {
+  for (int time = 0; time < copy_times; ++time) {
     const double start = now();
     std::vector<std::thread> others;
     for (int t = 1; t < threads; ++t) others.emplace_back(copy_share, t);

@@ -5,10 +5,12 @@
 
 namespace qtb::bench {
 
-// Rates of one core. A vector is 16 bytes, the width of every kernel but the widest.
+// Rates of one core. Arithmetic is multiplications and additions in equal numbers, on registers alone.
 struct CoreLimits {
-  double double_flops;  // multiplications and additions per second on registers alone, in equal numbers
+  double double_flops;  // per second, with vectors of 16 bytes, the width of every kernel but the widest
   double single_flops;
+  double wide_double_flops;  // with vectors of 32 bytes; 0 where the processor has none
+  double wide_single_flops;
   double load_rate;   // 16-byte loads per second from the first-level cache
   double store_rate;  // 16-byte stores per second to the first-level cache
 };

@@ -1,0 +1,169 @@
+// Children that measure, and the parent that gives them their turns.
+
+#include "bench/sides.h"
+
+#include <sys/prctl.h>
+#include <sys/socket.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <csignal>
+#include <cstdio>
+#include <cstdlib>
+#include <ctime>
+
+#include "bench/timing.h"
+
+namespace qtb::bench {
+namespace {
+
+constexpr double turn_seconds = 0.001;  // long against the clock, short against a disturbance
+constexpr long warm_share = 4;          // of a turn's calls so many are first made without a look at the clock
+constexpr int least_turns = 5;
+
+// What a child sends: once when it is ready, with what a turn will take, and after each turn.
+struct Report {
+  Outcome outcome;
+  double seconds;  // ready: of a turn; later: per call
+  double cores;
+};
+
+constexpr pid_t gone = 0;
+
+struct Child {
+  pid_t process = gone;
+  int channel = -1;
+  Report last{Outcome::crashed, 0, 0};
+};
+
+double processor_seconds() {
+  timespec time{};
+  clock_gettime(CLOCK_PROCESS_CPUTIME_ID, &time);
+  return static_cast<double>(time.tv_sec) + static_cast<double>(time.tv_nsec) * 1e-9;
+}
+
+Report measure_turn(const Calls &calls, long count) {
+  if (count >= warm_share) calls(count / warm_share);
+  const double processor_start = processor_seconds(), start = now();
+  calls(count);
+  const double elapsed = now() - start;
+  return {Outcome::measured, elapsed / static_cast<double>(count), (processor_seconds() - processor_start) / elapsed};
+}
+
+void send_report(int channel, const Report &report) {
+  if (send(channel, &report, sizeof report, MSG_NOSIGNAL) != sizeof report) _exit(1);
+}
+
+// The life of a child. It leaves without cleaning up: what runs at the end of a program is the parent's to do.
+[[noreturn]] void serve(const Side &side, const Prepare &prepare, int channel) {
+  prctl(PR_SET_PDEATHSIG, SIGKILL);
+  for (const std::string &setting : side.settings) set_environment(setting);
+  const Library library = load_library(side.library, side.wide);
+  const Prepared prepared = prepare(library);
+  if (!prepared.calls || !prepared.correct) {
+    send_report(channel, {prepared.calls ? Outcome::wrong : Outcome::absent, 0, 0});
+    _exit(0);
+  }
+  prepared.calls(1);
+  const long count = calibrate(prepared.calls, turn_seconds);
+  const double seconds = measure_turn(prepared.calls, count).seconds * static_cast<double>(count);
+  send_report(channel, {Outcome::measured, seconds, 0});
+  char turn = 0;
+  while (recv(channel, &turn, 1, 0) == 1) send_report(channel, measure_turn(prepared.calls, count));
+  _exit(0);
+}
+
+// Waits for a child's report and stops the child. A child that is gone reports a crash.
+void take_report(Child &child) {
+  if (recv(child.channel, &child.last, sizeof child.last, 0) != sizeof child.last) {
+    child.last = {Outcome::crashed, 0, 0};
+    return;
+  }
+  kill(child.process, SIGSTOP);
+  int status = 0;
+  waitpid(child.process, &status, WUNTRACED);
+  if (!WIFSTOPPED(status)) child.process = gone;  // it had reported that there is nothing to measure
+}
+
+Child start(const Side &side, const Prepare &prepare) {
+  int channel[2];
+  if (socketpair(AF_UNIX, SOCK_SEQPACKET, 0, channel) != 0) {
+    std::perror("socketpair");
+    std::exit(2);
+  }
+  std::fflush(nullptr);
+  Child child;
+  child.process = fork();
+  if (child.process < 0) {
+    std::perror("fork");
+    std::exit(2);
+  }
+  if (child.process == 0) {
+    close(channel[0]);
+    serve(side, prepare, channel[1]);
+  }
+  close(channel[1]);
+  child.channel = channel[0];
+  take_report(child);
+  return child;
+}
+
+void take_turn(Child &child) {
+  const char turn = 1;
+  send(child.channel, &turn, 1, MSG_NOSIGNAL);
+  kill(child.process, SIGCONT);
+  take_report(child);
+}
+
+void end(Child &child) {
+  close(child.channel);
+  if (child.process == gone) return;
+  kill(child.process, SIGKILL);
+  waitpid(child.process, nullptr, 0);
+}
+
+}  // namespace
+
+std::vector<Measurement> measure_in_turn(const std::vector<Side> &sides, const Prepare &prepare, int most_turns,
+                                         double budget) {
+  std::vector<Child> children;
+  double seconds_of_turns = 0;
+  for (const Side &side : sides) {
+    children.push_back(start(side, prepare));
+    seconds_of_turns += children.back().last.seconds;
+  }
+  std::vector<Measurement> measurements(sides.size());
+  std::vector<std::vector<double>> cores(sides.size());
+  const double fitting = budget / std::max(seconds_of_turns, turn_seconds);
+  const int turns = std::max(least_turns, static_cast<int>(std::min<double>(fitting, most_turns)));
+  for (int turn = 0; turn < turns; ++turn)
+    for (std::size_t i = 0; i < children.size(); ++i) {
+      const std::size_t which = turn % 2 == 0 ? i : children.size() - 1 - i;
+      Child &child = children[which];
+      if (child.last.outcome != Outcome::measured) continue;
+      take_turn(child);
+      measurements[which].seconds.push_back(child.last.seconds);
+      cores[which].push_back(child.last.cores);
+    }
+  for (std::size_t i = 0; i < children.size(); ++i) {
+    measurements[i].outcome = children[i].last.outcome;
+    if (measurements[i].outcome == Outcome::measured)
+      measurements[i].cores = spread(cores[i]).median;
+    else
+      measurements[i].seconds.clear();
+    end(children[i]);
+  }
+  return measurements;
+}
+
+void set_environment(const std::string &assignment) {
+  const std::size_t equals = assignment.find('=');
+  if (equals == std::string::npos) {
+    std::fprintf(stderr, "a setting is NAME=VALUE: %s\n", assignment.c_str());
+    std::exit(2);
+  }
+  setenv(assignment.substr(0, equals).c_str(), assignment.substr(equals + 1).c_str(), 1);
+}
+
+}  // namespace qtb::bench

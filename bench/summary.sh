@@ -1,0 +1,82 @@
+#!/bin/sh
+# summary.sh RESULTS: the comparisons in RESULTS/*.csv as Markdown tables: a row per routine and case, a column per
+# tier.
+set -eu
+cd "$1"
+
+# table CELL FILE...: the rows of files named <kind>-<tier>.csv. A cell is "rate" (the rate, its share of the limit, the
+# ratio to the peer) or "ratio" (that of each kind of file, in the order given).
+table() {
+  cell=$1
+  shift
+  awk -F, -v cell="$cell" '
+    function join_cell(key, text) {
+      if (key in cells) text = cells[key] " / " text
+      cells[key] = text
+    }
+    FNR == 1 {
+      split("", column)
+      for (i = 1; i <= NF; i++) column[$i] = i
+      tier = FILENAME
+      sub(/\.csv$/, "", tier)
+      sub(/.*-/, "", tier)
+      seen[tier] = 1
+      next
+    }
+    {
+      shape = $column["n"]
+      if ($column["m"] != "") {
+        shape = $column["m"] " x " $column["n"] " x " $column["k"]
+        if ($column["m"] == $column["n"] && $column["n"] == $column["k"]) shape = $column["n"]
+      }
+      row = $column["routine"] " | " $column["options"] " | " shape
+      if (!(row in known)) { known[row] = 1; rows[++count] = row }
+      ratio = $column["ratio"] > 0 ? sprintf("%.2f", $column["ratio"]) : "-"
+      outcome = $column["outcome"]
+      if (outcome != "measured") text = outcome
+      else if (cell == "ratio") text = ratio
+      else text = sprintf("%.1f / %.0f%% / %s", $column["rate"], 100 * $column["share"], ratio)
+      join_cell(row SUBSEP tier, text)
+    }
+    END {
+      tiers = split("def sse3 ssse3 sse42 avx", order, " ")
+      head = "| Routine | Options | Case |"
+      line = "|---|---|---|"
+      for (t = 1; t <= tiers; t++) if (order[t] in seen) { head = head " " order[t] " |"; line = line "---|" }
+      print head
+      print line
+      for (r = 1; r <= count; r++) {
+        text = "| " rows[r] " |"
+        for (t = 1; t <= tiers; t++)
+          if (order[t] in seen) text = text " " ((rows[r], order[t]) in cells ? cells[rows[r], order[t]] : "-") " |"
+        print text
+      }
+    }' "$@"
+}
+
+# section TITLE TEXT CELL KIND...: a heading and a table, where there are files of the first kind.
+section() {
+  title=$1 text=$2 cell=$3
+  ls "$4"-*.csv > /dev/null 2>&1 || return 0
+  shift 3
+  files=
+  for kind in "$@"; do
+    for tier in def sse3 ssse3 sse42 avx; do
+      [ ! -s "$kind-$tier.csv" ] || files="$files $kind-$tier.csv"
+    done
+  done
+  printf '## %s\n\n%s\n\n' "$title" "$text"
+  # shellcheck disable=SC2086 # a list of names without blanks
+  table "$cell" $files
+  echo
+}
+
+section 'Matrix products, one thread' \
+  'GFLOP/s / share of the arithmetic peak / ratio to the peer (above 1: this library is faster)' \
+  rate square flat options
+section 'Matrix products, all threads' \
+  'Ratio to this library on one thread / ratio to the peer on all threads' \
+  ratio threads-serial threads-peer
+section 'Level 1, one thread' \
+  'GFLOP/s, or GB/s where nothing is computed / share of what a core allows in cache / ratio to the peer' \
+  rate vectors
