@@ -13,7 +13,7 @@ void gemm_1d_row(QTB_PARAMS_GEMM_STRATEGY(T)) {
   (void)panel_set;
   const GemmOperands<T> at = gemm_operands(plan, a, lda, b, ldb, c, ldc);
   const QtbInt t = plan->nthreads;
-#pragma omp for schedule(static, 1)
+#pragma omp for schedule(static, 1) nowait
   for (QtbInt i = 0; i < t; ++i) {
     const GemmRange rows = gemm_range(*m, t, i);
     plan->kernel.gemm(transa, transb, &rows.count, n, k, alpha, at.a_at(rows.first, 0), lda, b, ldb, beta,
@@ -26,7 +26,7 @@ void gemm_1d_col(QTB_PARAMS_GEMM_STRATEGY(T)) {
   (void)panel_set;
   const GemmOperands<T> at = gemm_operands(plan, a, lda, b, ldb, c, ldc);
   const QtbInt t = plan->nthreads;
-#pragma omp for schedule(static, 1)
+#pragma omp for schedule(static, 1) nowait
   for (QtbInt i = 0; i < t; ++i) {
     const GemmRange columns = gemm_range(*n, t, i);
     plan->kernel.gemm(transa, transb, m, &columns.count, k, alpha, a, lda, at.b_at(0, columns.first), ldb, beta,

@@ -31,7 +31,7 @@ template <class T>
 void gemm_2d_xgemm_p(QTB_PARAMS_GEMM_STRATEGY(T)) {
   (void)beta;
   const GemmOperands<T> at = gemm_operands(plan, a, lda, b, ldb, c, ldc);
-#pragma omp for schedule(static, 1)
+#pragma omp for schedule(static, 1) nowait
   for (QtbInt i = 0; i < plan->nthreads; ++i) {
     const GemmTile tile = gemm_grid_tile(*m, *n, plan->grid_rows, plan->grid_cols, panel_set->mu, 1, i);
     for (QtbInt j = 0; j < tile.columns; j += plan->nb) {
@@ -177,7 +177,7 @@ void gemm_2d_abcopy(QTB_PARAMS_GEMM_STRATEGY(T)) {
   const QtbInt t = plan->nthreads, mu = panel_set->mu, nu = panel_set->nu, ku = panel_set->ku;
   const QtbInt mb = plan->mb, nb = plan->nb, kb = plan->kb;
   const QtbInt share = gemm_rows(*m, t, mu, 0).count, super_slabs = multiple_below(*n, t * nb);
-#pragma omp for schedule(static, 1)
+#pragma omp for schedule(static, 1) nowait
   for (QtbInt i = 0; i < t; ++i) {
     if (share < 1) continue;
     const GemmRange own = gemm_rows(*m, t, mu, i);
