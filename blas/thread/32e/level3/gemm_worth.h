@@ -1,0 +1,60 @@
+// Whether threads pay for a GEMM, on the machine classes with a tuned set of strategies. On the others they always do.
+#pragma once
+
+#include "blas/types.h"
+
+namespace qtb {
+
+// m, n and k below or at these stay on the caller's thread whatever the machine: too little work for a second thread.
+constexpr QtbInt gemm_serial_k = 4, gemm_serial_half_m = 2, gemm_serial_size = 16;
+
+constexpr bool gemm_is_tiny(QtbInt m, QtbInt n, QtbInt k) {
+  return k <= gemm_serial_k || m / 2 <= gemm_serial_half_m ||
+         (m <= gemm_serial_size && n <= gemm_serial_size && k <= gemm_serial_size);
+}
+
+// The worth test of one type: a measure of the work and one of the traffic of a pair of threads, and the depth, each
+// with its limit. Where the limits are shared, they are divided by half the number of threads.
+struct GemmWorth {
+  QtbInt least_half_m;  // of rows, below which threads do not pay; 0 for no such test
+  bool least_columns;   // whether a column for each pair of threads is not enough
+  int work_shift;       // the work is half_m*columns*k over 2^work_shift
+  int traffic_shift;    // the traffic over 2^traffic_shift
+  QtbInt work_limit, traffic_limit, depth_limit;
+  bool limits_shared;
+};
+template <class T>
+constexpr GemmWorth gemm_worth = {};
+// The limits in single precision do not shrink with the number of threads.
+template <>
+inline constexpr GemmWorth gemm_worth<float> = {5, true, 9, 8, 18, 24, 256, false};
+template <>
+inline constexpr GemmWorth gemm_worth<double> = {0, true, 9, 7, 36, 48, 512, true};
+template <>
+inline constexpr GemmWorth gemm_worth<cfloat> = {0, false, 7, 7, 48, 48, 256, true};
+template <>
+inline constexpr GemmWorth gemm_worth<cdouble> = {0, false, 7, 6, 24, 24, 256, true};
+
+// For m, n, k of at least 1 and at least 2 threads. Products wrap round where they leave 64 bits: no matrix of such a
+// size fits a memory.
+template <class T>
+constexpr bool gemm_threads_pay(QtbInt m, QtbInt n, QtbInt k, QtbInt threads) {
+  constexpr GemmWorth worth = gemm_worth<T>;
+  const QtbInt pairs = threads / 2 > 1 ? threads / 2 : 1;
+  const QtbInt half_m = m / 2, columns = n / pairs;
+  if (half_m < worth.least_half_m || (worth.least_columns && columns <= 1)) return false;
+
+  const auto u_half_m = static_cast<std::uint64_t>(half_m), u_columns = static_cast<std::uint64_t>(columns),
+             u_k = static_cast<std::uint64_t>(k);
+  const auto work = static_cast<QtbInt>(u_half_m * u_columns * u_k) >> worth.work_shift;
+  QtbInt traffic;
+  if constexpr (is_complex<T>)
+    traffic = static_cast<QtbInt>(((u_half_m + u_columns) * u_k + u_half_m * u_columns) >> worth.traffic_shift);
+  else
+    traffic = static_cast<QtbInt>((u_half_m + u_k) * u_columns + u_half_m * u_k) >> worth.traffic_shift;
+
+  const QtbInt share = worth.limits_shared ? pairs : 1;
+  return work > worth.work_limit / share || traffic > worth.traffic_limit / share || k > worth.depth_limit / share;
+}
+
+}  // namespace qtb
