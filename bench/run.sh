@@ -3,11 +3,12 @@
 # charts and the summary (summary.md) are kept in BUILD_FOLDER/bench-results.
 #
 # Environment:
-#   BENCH_PARTS            what to run (default: slot level1 gemm threads)
+#   BENCH_PARTS            what to run (default: slot level1 gemm threads balance)
 #                            slot     what a dispatch slot costs
 #                            level1   Level 1 on one thread and on all, and beside the peer
 #                            gemm     matrix products on one thread, beside the peer
 #                            threads  matrix products on all threads, beside one thread and beside the peer
+#                            balance  how evenly matrix products are cut over up to 64 threads (nothing is timed)
 #   BENCH_TIERS            on which tiers (default: def sse3 ssse3 sse42 avx)
 #   BENCH_LONG             with any value, products of sizes 2000 and 4000 too
 #   BENCH_FILTER           regular expression of the Level-1 cases (default: all)
@@ -18,7 +19,7 @@ set -eu
 build=$1
 results=$build/bench-results
 all_tiers='def sse3 ssse3 sse42 avx' # in the order of their numbers
-parts=${BENCH_PARTS:-slot level1 gemm threads}
+parts=${BENCH_PARTS:-slot level1 gemm threads balance}
 tiers=${BENCH_TIERS:-$all_tiers}
 threads=$(nproc)
 products=sgemm,dgemm,cgemm,zgemm
@@ -96,6 +97,11 @@ part_threads() {
   [ -n "${PEER:-}" ] || return 0
   heading "products, $threads threads, beside $PEER"
   beside_peer threads-peer --threads "$threads" --routines $products --sizes $sizes
+}
+
+part_balance() {
+  heading 'products, the share of an even cut over that of the busiest thread'
+  "$build/bench/load_balance" | tee "$results/balance-$tier.txt"
 }
 
 number=0
