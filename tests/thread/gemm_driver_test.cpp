@@ -10,12 +10,16 @@
 
 #include <algorithm>
 #include <array>
+#include <atomic>
+#include <chrono>
 #include <cmath>
 #include <cstddef>
 #include <cstring>
 #include <limits>
+#include <memory>
 #include <mutex>
 #include <string>
+#include <thread>
 #include <vector>
 
 #include "blas/dispatch/slots.h"
@@ -64,13 +68,15 @@ struct World {
   std::vector<void *> memory;  // what the allocations return, the first one first
   // What the selectors put into a plan.
   std::int32_t a_buffers = 0, b_buffers = 0;
+  // Whether the selector keeps all threads but the first until a strategy has begun.
+  bool others_wait = false;
 
   std::string asked;  // a letter per question to a service
   std::vector<Call> calls;
   std::vector<Allocation> allocations;
   std::vector<void *> released;
-  std::size_t strategies = 0;           // begun
-  std::size_t strategies_released = 0;  // begun by the first release
+  std::atomic<std::size_t> strategies = 0;  // begun
+  std::size_t strategies_released = 0;      // begun by the first release
 };
 World world;
 std::mutex world_mutex;  // of what is noted
@@ -132,6 +138,11 @@ template <class T>
 void select(const char *name, const QtbInt *m, const QtbInt *n, const QtbInt *k, GemmPanelSet<T> *panel_set,
             GemmPlan<T> *plan, qtb::GemmStrategy<T> *strategy) {
   note({name, 0, 0, 0, {m, n, k}, *m, *n, *k, "", bytes_of(*plan), bytes_of(*panel_set)});
+  if (world.others_wait && omp_get_thread_num() != 0) {
+    const auto end = std::chrono::steady_clock::now() + std::chrono::seconds(10);
+    while (world.strategies == 0 && std::chrono::steady_clock::now() < end) std::this_thread::yield();
+    EXPECT_GT(world.strategies, 0U) << "the first thread waits for the others";
+  }
   plan->strategy = strategy;
   plan->mb = chosen_mb;
   plan->nb = chosen_nb;
@@ -149,7 +160,6 @@ void select(const char *name, const QtbInt *m, const QtbInt *n, const QtbInt *k,
 template <class T>
 void strategy(const char *name, QTB_PARAMS_GEMM_STRATEGY(T)) {
   note({name, 0, 0, 0, {QTB_ARGS(gemm)}, *m, *n, *k, bytes_of(*beta), bytes_of(*plan), bytes_of(*panel_set)});
-  const std::lock_guard lock(world_mutex);
   ++world.strategies;
 }
 
@@ -168,6 +178,8 @@ void qtb_serv_get_cache_sizes(std::uint32_t *out) {
   std::copy(std::begin(world.cache), std::end(world.cache), out);
 }
 void *qtb_serv_malloc(std::uint64_t size, std::int32_t alignment) {
+  // Time enough for the other threads to go on, if nothing made them wait.
+  std::this_thread::sleep_for(std::chrono::milliseconds(1));
   const std::lock_guard lock(world_mutex);
   world.allocations.push_back({size, alignment, world.strategies});
   const std::size_t number = world.allocations.size() - 1;
@@ -211,13 +223,12 @@ namespace {
 
 template <class T>
 struct Front;
-#define QTB_FRONT(t, T)                                     \
-  template <>                                               \
-  struct Front<T> {                                         \
-    static constexpr auto gemm = &qtb_blas_##t##gemm;       \
-    static constexpr auto slot = &qtb_blas_x##t##gemm;      \
-    static constexpr auto row = &qtb_blas_##t##gemm_1d_row; \
-    static inline const std::string name = #t "gemm";       \
+#define QTB_FRONT(t, T)                                \
+  template <>                                          \
+  struct Front<T> {                                    \
+    static constexpr auto gemm = &qtb_blas_##t##gemm;  \
+    static constexpr auto slot = &qtb_blas_x##t##gemm; \
+    static inline const std::string name = #t "gemm";  \
   };
 QTB_FOR_EACH_GEMM(QTB_FRONT)
 #undef QTB_FRONT
@@ -247,7 +258,8 @@ struct Problem {
     world.calls.clear();
     world.allocations.clear();
     world.released.clear();
-    world.strategies = world.strategies_released = 0;
+    world.strategies = 0;
+    world.strategies_released = 0;
     Front<T>::gemm(&transa, &transb, &m, &n, &k, &alpha, a, &lda, b, &ldb, &beta, c, &ldc);
   }
   Pointers args() const { return {&transa, &transb, &m, &n, &k, &alpha, a, &lda, b, &ldb, &beta, c, &ldc}; }
@@ -300,7 +312,10 @@ std::string questions(int machine_class) {
 template <class T>
 class GemmDriver : public testing::Test {
  protected:
-  void SetUp() override { world = World{}; }
+  void SetUp() override {
+    std::destroy_at(&world);
+    std::construct_at(&world);
+  }
   static constexpr bool is_real = !is_complex<T>;
 
   // One call of the serial slot with the caller's own arguments, and nothing else but the questions.
@@ -700,9 +715,16 @@ TYPED_TEST(GemmDriver, OneThreadAllocatesTheSharedPanelsAndAllFindThemAtPageBoun
       }
 }
 
+TYPED_TEST(GemmDriver, WithoutSharedPanelsNoThreadWaitsForAnother) {
+  world.others_wait = true;
+  Problem<TypeParam> p;
+  p.call();
+  this->expect_region(4, "");
+}
+
 TYPED_TEST(GemmDriver, WithoutMemoryForSharedPanelsAllThreadsTakeRowsByTheSlot) {
   const std::string &name = Front<TypeParam>::name;
-  for (const auto &[a_buffers, b_buffers] : {std::pair<int, int>{4, 0}, {0, 6}, {4, 6}})
+  for (const auto &[a_buffers, b_buffers] : {std::pair<int, int>{1, 0}, {4, 0}, {0, 1}, {0, 6}, {4, 6}})
     for (const bool a_fails : {false, true})
       for (const bool b_fails : {false, true}) {
         const bool short_of_memory = (a_fails && a_buffers > 0) || (b_fails && b_buffers > 0);
