@@ -1,0 +1,273 @@
+// The strategy and plan that a GEMM's team takes: a table to be read beside the rules, a sweep over teams, classes and
+// extents against a second transcription of them, and that a plan depends on nothing but what it is for.
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <cstdio>
+#include <cstring>
+#include <map>
+#include <random>
+#include <set>
+#include <string>
+#include <tuple>
+#include <utility>
+#include <vector>
+
+#include "tests/support/together.h"
+#include "tests/thread/gemm_select_table.h"
+#include "tests/thread/gemm_selection.h"
+
+namespace {
+
+// ---- The table ----
+
+// use(point, outcome) for each point of the table.
+template <class Use>
+void for_each_point(Use use) {
+  for (const Section &section : select_table)
+    for (const char *type = section.types; *type != 0; ++type)
+      for (const int machine_class : section.classes)
+        for (const Row &r : section.rows)
+          use(Point{*type, machine_class, r.t, r.m, r.n, r.k, section.cache_count, section.third_size}, r.outcome);
+}
+
+TEST(GemmSelectTable, EveryPointByHand) {
+  long points = 0, rows = 0;
+  for (const Section &section : select_table) rows += long(section.rows.size());
+  for_each_point([&](const Point &p, const Outcome &want) {
+    EXPECT_TRUE(selects(p, want));
+    EXPECT_EQ(expected(p), want) << text(p) << ": " << text(expected(p)) << " by the transcription";
+    ++points;
+  });
+  std::printf("rows %ld, points %ld\n", rows, points);
+}
+
+// Threads select at the same time, each for itself, twice.
+TEST(GemmSelectTable, EveryThreadSelectsTheSamePlan) {
+  std::vector<Point> points;
+  for_each_point([&](const Point &p, const Outcome &) { points.push_back(p); });
+  constexpr int thread_count = 4;
+  std::vector<std::string> plans[thread_count];
+  on_threads(thread_count, [&](int i) {
+    for (int round = 0; round < 2; ++round)
+      for (const Point &p : points)
+        with_type(p.type, [&](auto *s) {
+          select(p, tile_rows(p.type), s);
+          plans[i].emplace_back(reinterpret_cast<const char *>(s), sizeof *s);
+        });
+  });
+  for (int i = 0; i < thread_count; ++i)
+    for (std::size_t j = 0; j < plans[i].size(); ++j)
+      ASSERT_EQ(plans[i][j], plans[0][j % points.size()]) << text(points[j % points.size()]);
+}
+
+// ---- What each class and type may come to ----
+
+struct Reach {
+  const char *types;
+  std::vector<int> classes;
+  std::set<std::string> outcomes;  // "kind", "kind shape" with a grid, "kind mb" with a preset block of rows
+};
+// clang-format off
+const Reach reaches[] = {
+  {"sdcz", {0, 5},  {"row", "col"}},
+  {"scz",  {6},     {"row", "col"}},
+  {"d",    {6},     {"grid_fa 1xt", "grid_fa 2xt/2", "grid_fa 4xt/4", "grid_fa tx1",
+                     "grid_fb 1xt", "grid_fb 2xt/2", "grid_fb 4xt/4", "grid_fb tx1"}},
+  {"d",    {1},     {"grid_t 2xt/2", "bcopy_1d 512"}},
+  {"s",    {1},     {"grid_t 2xt/2"}},
+  {"cz",   {1},     {"bcopy 2xt/2"}},
+  {"d",    {3},     {"row", "col", "grid_t 1xt", "grid_t 2xt/2", "grid_t tx1", "acopy 2xt/2 384", "acopy 2xt/2 1000",
+                     "acopy 4xt/4 384", "acopy 4xt/4 1000"}},
+  {"s",    {3},     {"grid_t 1xt", "grid_t 2xt/2", "grid_t tx1"}},
+  {"cz",   {3},     {"row", "col", "bcopy 2xt/2"}},
+  {"d",    {2},     {"grid_41 1xt", "grid_41 2xt/2", "grid_41 tx1", "abcopy 704", "abcopy 1024"}},
+  {"d",    {4},     {"row", "col", "grid_41 1xt", "grid_41 2xt/2", "grid_41 tx1", "abcopy 448", "xgemm 2xt/2 200"}},
+  {"s",    {2},     {"grid_41 1xt", "grid_41 2xt/2", "grid_41 tx1", "abcopy 1024"}},
+  {"s",    {4},     {"grid_41 1xt", "grid_41 2xt/2", "grid_41 tx1", "abcopy 1024", "xgemm 2xt/2 200"}},
+  {"c",    {2},     {"bcopy_41 2xt/2", "abcopy 1024"}},
+  {"c",    {4},     {"bcopy_41 2xt/2", "abcopy 448"}},
+  {"z",    {2},     {"bcopy_41 2xt/2", "abcopy 512"}},
+  {"z",    {4},     {"bcopy_41 2xt/2", "abcopy 256"}},
+};
+// clang-format on
+
+const std::set<std::string> &reach_of(char type, int machine_class) {
+  for (const Reach &r : reaches)
+    if (std::strchr(r.types, type) != nullptr &&
+        std::find(r.classes.begin(), r.classes.end(), machine_class) != r.classes.end())
+      return r.outcomes;
+  std::abort();
+}
+
+// An outcome but for the size of its team. A small team's grid may have the shape of two rules; it counts as the first.
+enum Shape { no_grid, one_row, two_rows, one_column, four_rows };
+struct Label {
+  Kind kind;
+  Shape shape;
+  Int mb;
+  auto operator<=>(const Label &) const = default;
+};
+
+Label label(const Outcome &o) {
+  const Shape shape = o.grid_rows == 0   ? no_grid
+                      : o.grid_rows == 1 ? one_row
+                      : o.grid_rows == 2 ? two_rows
+                      : o.grid_cols == 1 ? one_column
+                                         : four_rows;
+  return {o.kind, shape, o.mb};
+}
+
+std::string text(const Label &l) {
+  static const char *const shapes[] = {"", " 1xt", " 2xt/2", " tx1", " 4xt/4"};
+  return std::string(kind_routines[l.kind].name) + shapes[l.shape] + (l.mb != 0 ? " " + std::to_string(l.mb) : "");
+}
+
+TEST(GemmSelectTable, EveryOutcomeOfEveryClassAndTypeIsInTheTable) {
+  std::map<std::pair<char, int>, std::set<std::string>> found;
+  for_each_point([&](const Point &p, const Outcome &o) { found[{p.type, p.machine_class}].insert(text(label(o))); });
+  for (const char type : types)
+    for (int machine_class = 0; machine_class < qtb::machine_class_count; ++machine_class)
+      EXPECT_EQ((found[{type, machine_class}]), reach_of(type, machine_class)) << type << machine_class;
+}
+
+// The tiers that a class is of.
+unsigned tiers_of(int machine_class) {
+  using namespace qtb::tier_set;
+  const unsigned tiers[qtb::machine_class_count] = {DEF | SSE3, SSSE3, SSSE3, SSE42, SSSE3, AVX, DEF};
+  return tiers[machine_class];
+}
+
+// Slots of other tiers hold an empty routine.
+TEST(GemmSelectTable, TheTiersOfAClassHaveTheRoutinesThatItSelects) {
+  for_each_point([&](const Point &p, const Outcome &o) {
+    const KindInType &kind = kind_in_type(p.type, o.kind);
+    ASSERT_TRUE(kind.exists) << text(p);
+    ASSERT_EQ(kind.tiers & tiers_of(p.machine_class), tiers_of(p.machine_class)) << text(p) << ' ' << text(o);
+  });
+}
+
+// ---- The sweep ----
+
+// Positive numbers one below, at and one above each limit, without repetition.
+std::vector<Int> around(const std::vector<Int> &limits) {
+  std::set<Int> all;
+  for (const Int limit : limits)
+    for (const Int v : {limit - 1, limit, limit + 1})
+      if (v > 0) all.insert(v);
+  return {all.begin(), all.end()};
+}
+
+// Every number that a rule compares an extent with, and some beyond.
+const std::vector<Int> m_limits = {6,    100,  200,  256,  400,  500,  512,  600,  700,   800,   1000,
+                                   1200, 2048, 4700, 4800, 5000, 5400, 7000, 8000, 10000, 14000, 15000};
+const std::vector<Int> n_limits = {1,    100,  128,  400,  500,  512,  600,  700,  800,
+                                   1000, 1200, 2000, 2048, 3000, 4000, 5000, 10000};
+const std::vector<Int> k_limits = {5, 120, 128, 150, 200, 256, 400, 512, 2000};
+
+std::vector<Int> joined(std::vector<Int> a, const std::vector<Int> &b) {
+  a.insert(a.end(), b.begin(), b.end());
+  return a;
+}
+
+// Points of one type and class. Stops at the first failure.
+struct Sweep {
+  char type;
+  int machine_class;
+  long points = 0;
+  std::map<Label, long> outcomes = {};
+
+  void at(Int t, Int m, Int n, Int k, std::uint32_t cache_count = 3, std::uint32_t third_size = 8u << 20) {
+    const Point p{type, machine_class, t, m, n, k, cache_count, third_size};
+    const Outcome want = expected(p);
+    with_type(type, [&](auto *s) {
+      select(p, tile_rows(type), s);
+      if (!is_outcome(*s, p, want)) FAIL() << text(p) << ": " << text(*s, type) << ", not " << text(want);
+    });
+    ++points;
+    ++outcomes[label(want)];
+  }
+
+  // Every combination of limits for a team, or one in so many of them.
+  void team(Int t, std::mt19937_64 *bits, std::uint64_t one_in) {
+    for (const Int m : around(joined(m_limits, {32 * t}))) {
+      if (testing::Test::HasFailure()) return;
+      // Where the quotients of m and n, t and the columns of a grid meet a limit.
+      const std::vector<Int> ns = around(joined(n_limits, {m / 4, m / 2, m, 2 * m, m / t, m * t, m * (t - t % 2),
+                                                           16 * t, 384, 385 * t, 385 * (t / 2), 385 * (t / 4)}));
+      for (const Int n : ns)
+        for (const Int k : around(joined(k_limits, {2 * m, 5 * n})))
+          if (one_in == 1 || (*bits)() % one_in == 0) at(t, m, n, k);
+    }
+  }
+};
+
+class GemmSelectSweep : public testing::TestWithParam<std::tuple<char, int>> {};
+INSTANTIATE_TEST_SUITE_P(All, GemmSelectSweep, testing::Combine(testing::ValuesIn(types), testing::Range(0, 7)),
+                         [](const auto &point) {
+                           return std::string(1, std::get<0>(point.param)) + "_class" +
+                                  std::to_string(std::get<1>(point.param));
+                         });
+
+TEST_P(GemmSelectSweep, MatchesTheTranscriptionAndReachesEveryOutcome) {
+  const auto [type, machine_class] = GetParam();
+  Sweep sweep{type, machine_class};
+  std::mt19937_64 bits(20241103);
+  const bool one_rule = machine_class == 0 || machine_class == 5;
+  const std::set<Int> whole = {2, 3, 4, 5, 7, 8, 9, 12, 16, 24, 25, 64};
+  // A team of one is no team, but where the rules allow for any.
+  const bool any_team = one_rule || machine_class == 6;
+  for (Int t = any_team ? 1 : 2; t <= 64; ++t) sweep.team(t, &bits, one_rule || whole.count(t) == 0 ? 20 : 1);
+  for (const std::uint32_t count : {0u, 1u, 2u, 3u, 4u})
+    for (const std::uint32_t third : {0u, 4194303u, 4194304u, 4194305u, 4294967295u})
+      for (const Int t : {2, 8, 10, 24})
+        for (const Int m : {512, 1500, 2500})
+          for (const Int k : {100, 500}) sweep.at(t, m, 1500, k, count, third);
+
+  std::set<std::string> reached;
+  std::printf("%c class %d: %ld points;", type, machine_class, sweep.points);
+  for (const auto &[outcome, count] : sweep.outcomes) {
+    reached.insert(text(outcome));
+    std::printf(" %s %ld;", text(outcome).c_str(), count);
+  }
+  std::printf("\n");
+  EXPECT_EQ(reached, reach_of(type, machine_class));
+}
+
+// ---- Teams of hundreds ----
+
+// A cut by rows leaves each thread a register tile at least; a team too large for that takes slabs of rows or columns.
+TEST(GemmSelectLargeTeams, ACutByRowsLeavesEachThreadATile) {
+  long cuts = 0, slabs = 0;
+  for (const char type : types)
+    for (const int machine_class : {2, 4})
+      for (Int t = 2; t <= 700; ++t)
+        for (const Int m : around({16 * t, 8 * t, 4 * t, 2 * t, 700, 800, 1000, 2048, 7000}))
+          for (const Int n : around({600, 1000, 2048, m}))
+            for (const Int mu : {1, 2, 4, 8, 16}) {
+              const Point p{type, machine_class, t, m, n, 512};
+              const Outcome chosen = expected(p);
+              if (chosen.kind != k_abcopy) continue;
+              with_type(type, [&](auto *s) {
+                select(p, mu, s);
+                if (m >= chosen.nthreads * mu) {
+                  ASSERT_TRUE(is_outcome(*s, p, chosen)) << text(p) << " mu " << mu << ": " << text(*s, type);
+                  ++cuts;
+                  return;
+                }
+                const Routines found = routines_in(*s), &want = kind_in_type(type, m > n ? k_row : k_col).routines;
+                ASSERT_EQ(found.strategy, want.strategy) << text(p) << " mu " << mu << ": " << text(*s, type);
+                ASSERT_EQ(found.kernel, want.kernel) << text(p);
+                ASSERT_EQ(s->plan.nthreads, chosen.nthreads) << text(p);
+                ASSERT_EQ(s->plan.a_buffers + s->plan.b_buffers, 0) << text(p);
+                ++slabs;
+              });
+              if (HasFatalFailure()) return;
+            }
+  std::printf("cuts by rows %ld, slabs instead %ld\n", cuts, slabs);
+  EXPECT_GT(cuts, 0);
+  EXPECT_GT(slabs, 0);
+}
+
+}  // namespace
