@@ -138,7 +138,6 @@ template <class T>
   plan.b_is_n = is_letter(*transb, 'N');
   plan.a_is_t = is_letter(*transa, 'T');
   plan.b_is_t = is_letter(*transb, 'T');
-  plan.nthreads = threads;
   SharedPanels shared{};
   const unsigned callers_choice = floating_choice();
 #pragma omp parallel num_threads(threads)
