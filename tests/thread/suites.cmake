@@ -1,3 +1,4 @@
+qtb_add_test(gemm_share_test SOURCES thread/gemm_share_test.cpp TIMEOUT 60)
 qtb_add_test(level1_decision_test SOURCES thread/level1_decision_test.cpp TIMEOUT 60)
 qtb_add_test(level1_drivers_test SOURCES thread/level1_drivers_test.cpp LIBRARIES qtb_static SHARDS 2)
 qtb_add_test(level1_front_ends_test SOURCES thread/level1_front_ends_test.cpp LIBRARIES qtb_static TIMEOUT 60)
