@@ -5,3 +5,5 @@ qtb_add_test(level1_front_ends_test SOURCES thread/level1_front_ends_test.cpp LI
 qtb_add_test(level1_library_test SOURCES thread/level1_library_test.cpp
   LIBRARIES qtb_static qtb_platform_fake SHARDS 2)
 qtb_add_test(level1_share_test SOURCES thread/level1_share_test.cpp TIMEOUT 60)
+qtb_add_test(gemm_strategy_cover_test SOURCES thread/gemm_strategy_cover_test.cpp LIBRARIES qtb_static
+  ENVIRONMENT OMP_WAIT_POLICY=passive)
