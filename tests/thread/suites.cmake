@@ -7,3 +7,8 @@ qtb_add_test(level1_library_test SOURCES thread/level1_library_test.cpp
 qtb_add_test(level1_share_test SOURCES thread/level1_share_test.cpp TIMEOUT 60)
 qtb_add_test(gemm_strategy_cover_test SOURCES thread/gemm_strategy_cover_test.cpp LIBRARIES qtb_static
   ENVIRONMENT OMP_WAIT_POLICY=passive)
+# A process is one machine; see gemm_machines.h.
+set(gemm_machines def def_amd sse3 ssse3 sse41_large_l2 sse41_small_l2 sse41_no_table sse42 sse42_small_l3 avx)
+list(TRANSFORM gemm_machines REPLACE "(.+)" "\\1=QTB_TEST_MACHINE=\\1" OUTPUT_VARIABLE gemm_machine_runs)
+qtb_add_test(gemm_strategy_test SOURCES thread/gemm_strategy_test.cpp LIBRARIES qtb_static qtb_platform_fake
+  RUNS ${gemm_machine_runs} ENVIRONMENT OMP_WAIT_POLICY=passive)
