@@ -133,7 +133,7 @@ class GemmProblem {
  private:
   static bool is_n(char trans) { return trans == 'N' || trans == 'n'; }
   static std::size_t extent(QtbInt rows, QtbInt cols, QtbInt ld) {
-    return static_cast<std::size_t>(ld * (cols - 1) + rows);
+    return cols < 1 ? 0 : static_cast<std::size_t>(ld * (cols - 1) + rows);
   }
   static T times(T x, T y) requires is_complex<T> { return {x.re * y.re - x.im * y.im, x.re * y.im + x.im * y.re}; }
   static T plus(T x, T y) requires is_complex<T> { return {x.re + y.re, x.im + y.im}; }

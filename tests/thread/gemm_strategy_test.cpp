@@ -328,6 +328,39 @@ TEST(GemmStrategy, PlansByHandInDoublePrecision) { by_hand<double>(); }
 TEST(GemmStrategy, PlansByHandInSingleComplex) { by_hand<cfloat>(); }
 TEST(GemmStrategy, PlansByHandInDoubleComplex) { by_hand<cdouble>(); }
 
+// The same team gives the same bits, whichever thread is the first.
+template <class T>
+void same_bits_again() {
+  if (!stands_for_its_tier(machine)) GTEST_SKIP() << "these depend on the tier alone";
+  for (const Outcome<T> &outcome : outcomes<T>()) {
+    GemmShape s;
+    s.m = 67, s.n = 53, s.k = 77;
+    s.transb = 'T';
+    GemmProblem<T> p(s, number<T>(1.25, -0.5), number<T>(1));
+    Planned<T> planned = outcome.plan(4, 2);
+    if (planned.panels.blocks != nullptr) {
+      if (planned.plan.kb == 0) planned.plan.kb = 32;
+      planned.panels.blocks(&s.m, &s.n, &s.k, &planned.plan.mb, &planned.plan.nb, &planned.plan.kb, &planned.panels.mu,
+                            &planned.panels.nu, &planned.panels.ku);
+    }
+    std::vector<T> first;
+    for (int i = 0; i < 100; ++i) {
+      p.restore();
+      run(planned, p, 5);
+      if (i == 0) {
+        p.expect_within_bound();
+        first.assign(p.c.data(), p.c.data() + p.c.size());
+      }
+      ASSERT_EQ(std::memcmp(first.data(), p.c.data(), first.size() * sizeof(T)), 0) << outcome.name << ", run " << i;
+    }
+  }
+}
+
+TEST(GemmStrategy, SameTeamGivesTheSameBitsInSinglePrecision) { same_bits_again<float>(); }
+TEST(GemmStrategy, SameTeamGivesTheSameBitsInDoublePrecision) { same_bits_again<double>(); }
+TEST(GemmStrategy, SameTeamGivesTheSameBitsInSingleComplex) { same_bits_again<cfloat>(); }
+TEST(GemmStrategy, SameTeamGivesTheSameBitsInDoubleComplex) { same_bits_again<cdouble>(); }
+
 // ---- Plans by the selector ----
 
 template <class T>

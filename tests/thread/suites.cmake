@@ -12,3 +12,7 @@ set(gemm_machines def def_amd sse3 ssse3 sse41_large_l2 sse41_small_l2 sse41_no_
 list(TRANSFORM gemm_machines REPLACE "(.+)" "\\1=QTB_TEST_MACHINE=\\1" OUTPUT_VARIABLE gemm_machine_runs)
 qtb_add_test(gemm_strategy_test SOURCES thread/gemm_strategy_test.cpp LIBRARIES qtb_static qtb_platform_fake
   RUNS ${gemm_machine_runs} ENVIRONMENT OMP_WAIT_POLICY=passive)
+qtb_add_test(gemm_classes_test SOURCES thread/gemm_classes_test.cpp LIBRARIES qtb_static qtb_platform_fake
+  RUNS ${gemm_machine_runs} ENVIRONMENT OMP_WAIT_POLICY=passive)
+qtb_add_test(gemm_teams_test TIERS SOURCES thread/gemm_teams_test.cpp LIBRARIES qtb_static qtb_platform_static
+  ENVIRONMENT OMP_WAIT_POLICY=passive QTB_DYNAMIC=FALSE)
