@@ -211,5 +211,58 @@ TEST(GemmClasses, LargeProblemsAreExact) {
   }
 }
 
+// ---- Without memory ----
+
+// With each request for memory failing, alone and with all that follow it, the product is right, and nothing is kept.
+template <class T>
+void without_memory(QtbInt m, QtbInt n, QtbInt k, int team) {
+  SCOPED_TRACE(std::string(FrontEnd<T>::name) + " on " + std::to_string(team) + " threads");
+  GemmShape s = shape_of(m, n, k, large_seed++);
+  s.whole_numbers = true;
+  omp_set_num_threads(team);
+  GemmProblem<T> p(s, number<T>(2, 1), number<T>(3, -1));
+  checked_memory.requests = 0;
+  call(p);
+  p.expect_exact();
+  const long requests = checked_memory.requests;
+  const std::string what = std::string(FrontEnd<T>::name) + " without memory";
+  // Of very many requests, the first of each thread and some of the others.
+  constexpr long most = 60, least_step = 1;
+  for (long first = 0; first < requests; first += requests <= most || first < 2 * team ? least_step : requests / 7)
+    for (const long count : {1L, 1000000L}) {
+      p.restore();
+      checked_memory.requests = 0;
+      checked_memory.failing_count = count;
+      checked_memory.failing_first = first;
+      call(p);
+      checked_memory.failing_first = -1;
+      p.expect_exact();
+      ASSERT_EQ(checked_memory.outstanding, 0);
+      ASSERT_FALSE(testing::Test::HasFailure())
+          << "request " << first << " of " << requests << " and " << count - 1 << " more";
+      ++runs[what];
+    }
+  std::printf("%-14s %-5s %td x %td x %td on %d: %ld requests for memory\n", machine.name, FrontEnd<T>::name, m, n, k,
+              team, requests);
+}
+
+TEST(GemmClasses, EveryFailureOfMemoryLeavesARightProduct) {
+  for (const int team : {2, 4, 5}) {
+    without_memory<float>(190, 64, 20, team);
+    without_memory<double>(300, 90, 40, team);
+    without_memory<cfloat>(190, 64, 20, team);
+    without_memory<cdouble>(190, 80, 20, team);
+    without_memory<cfloat>(64, 60, 40, team);
+    without_memory<cdouble>(64, 60, 40, team);
+  }
+  switch (machine.machine_class) {
+    case machine_ssse3: without_memory<double>(8001, 3001, 5, 2); break;
+    case machine_sse41_large_l2:
+    case machine_sse41_small_l2: without_memory<double>(1003, 1001, 151, 2); break;
+    case machine_sse42: without_memory<double>(203, 140, 201, 8); break;
+    default: break;
+  }
+}
+
 }  // namespace
 }  // namespace qtb::test
