@@ -22,7 +22,7 @@ struct Step {
   std::int64_t depth, depths;  // of k
   std::int64_t place;  // byte offset into the shared or own panel that is written, or is read by compute; -1: none
   std::int64_t ld;     // stride between the strips of that panel, in elements; 0: none
-  std::int64_t phase;  // barriers before this Step
+  std::int64_t phase;  // barriers before this step
   friend bool operator==(const Step &, const Step &) = default;
 };
 
@@ -222,7 +222,7 @@ inline Schedule shared_b_pairs(const Setting &p) {
 }
 
 // Rows shared out; each thread packs A and B for itself and walks the slabs of B from its own number on. Place 0 is the
-// thread's own panel; of a compute Step `ld` is that of A.
+// thread's own panel; of a compute step `ld` is that of A.
 inline Schedule own_a_and_b(const Setting &p) {
   Schedule all{std::vector<std::vector<Step>>(static_cast<std::size_t>(p.t)), 1};
   const std::int64_t row_share = down(p.m / p.t, p.mu);

@@ -1,6 +1,8 @@
 // The partition strategies of a parallel GEMM with the kernels that they are made for, on real teams: with plans by
 // the selectors, for pretended machine classes and teams, and with plans by hand, whose blocks are small, so that small
 // matrices have every kind of edge. Each result is judged by the oracle.
+//
+// The table of outcomes takes up what the file has of length: it stands apart from the selectors', as their check.
 
 #include <gtest/gtest.h>
 #include <omp.h>
