@@ -185,6 +185,7 @@ void add_blocks(const Product<T> &p, GemmBlocks blocks, CallersPanel<T> given_a,
 
   const GemmBuffers<T> buffers = get_buffers<T, family>(a_given ? 0 : blocks.mb, b_given ? 0 : blocks.nb, blocks.kb,
                                                         InnerKernel<T, family>::stage_bytes(largest_depth));
+  if (buffers.allocation == nullptr) return add_small(p, a_is_n, b_is_n, 0, 0, p.n, 0, p.k);
   for (QtbInt j0 = 0; j0 < p.n; j0 += column_step) {
     const QtbInt n = smaller(column_step, p.n - j0);
     for (QtbInt l0 = 0; l0 < p.k; l0 += depth_step) {
@@ -228,6 +229,7 @@ void add_blocks_in_place(const Product<T> &p, GemmBlocks blocks) {
 
   const GemmBuffers<T> buffers =
       get_buffers<T, family>(blocks.mb, 0, blocks.kb, InPlaceKernel<T, family>::stage_bytes(largest_depth));
+  if (buffers.allocation == nullptr) return add_small(p, a_is_n, b_is_n, 0, 0, p.n, 0, p.k);
   for (QtbInt l0 = 0; l0 < p.k; l0 += blocks.kb) {
     const QtbInt k = smaller(blocks.kb, p.k - l0), step_a = round_up(k, rules.ku) * rules.mr;
     const T *const b = p.b + (b_is_n ? l0 : l0 * p.ldb);

@@ -32,7 +32,7 @@ constexpr QtbInt slack_for_both = 20992, slack_for_b = 12800, slack_for_a = 1228
 
 template <class T>
 struct GemmBuffers {
-  void *allocation;  // what qtb_serv_free gets
+  void *allocation;  // what qtb_serv_free gets; null where memory is out, and the body then takes the small path
   T *a, *b, *stage;
 };
 

@@ -28,6 +28,7 @@ void add_wide(const Product<double> &p) {
   const QtbInt full_m = round_down(p.m, rules.mr), full_n = round_down(p.n, packed_columns);
   const GemmBuffers<double> buffers =
       get_buffers_for<double>(blocks.mb, blocks.nb, blocks.kb, stage_bytes_per_k * blocks.kb, slack);
+  if (buffers.allocation == nullptr) return add_small(p, a_is_n, b_is_n, 0, 0, p.n, 0, p.k);
   for (QtbInt j0 = 0; j0 < full_n; j0 += blocks.nb) {
     const QtbInt n = smaller(blocks.nb, full_n - j0);
     for (QtbInt l0 = 0; l0 < p.k; l0 += blocks.kb) {

@@ -53,6 +53,7 @@ void run_packed(const Product<double> &p, bool a_is_n, bool b_is_n, const GemmBl
   const BetaLanes<double> beta_lanes(first_beta);
   const GemmBuffers<double> buffers =
       get_buffers_for<double>(blocks.mb, blocks.nb, blocks.kb, stage_bytes_per_k * blocks.kb, slack);
+  if (buffers.allocation == nullptr) return run_small(p, a_is_n, b_is_n, 0, 0, p.n, 0, p.k, first_beta);
   for (QtbInt j0 = 0; j0 < p.n; j0 += blocks.nb) {
     const QtbInt columns = smaller(blocks.nb, p.n - j0);
     for (QtbInt l0 = 0; l0 < p.k; l0 += blocks.kb) {

@@ -52,6 +52,7 @@ QTB_FUNCTION(gemm, T, gemm) {
   const QtbInt full_m = round_down(p.m, rules.mr), remainder = p.k % blocks.kb;
   const QtbInt stage_bytes = InnerKernel<T, Family::base>::stage_bytes(blocks.kb);
   const GemmBuffers<T> buffers = get_buffers_for<T>(blocks.mb, blocks.nb, blocks.kb, stage_bytes, slack_of_regions);
+  if (buffers.allocation == nullptr) return small_path<T>(QTB_ARGS(gemm));
 
   for (QtbInt j0 = 0; j0 < p.n; j0 += blocks.nb) {
     const QtbInt columns = smaller(blocks.nb, p.n - j0);

@@ -1,0 +1,75 @@
+// The made-up machines that a parallel GEMM tells apart: one for each machine class, and for each cache table that a
+// selector asks for. A process is one machine, named by QTB_TEST_MACHINE in its environment.
+#pragma once
+
+#include <cstdio>
+#include <cstdlib>
+#include <string>
+
+#include "blas/thread/32e/level3/gemm_plan.h"
+#include "tests/platform/fake.h"
+#include "tests/support/tiers.h"
+
+namespace qtb::test {
+
+struct GemmMachine {
+  const char *name;
+  ProcessorTier tier;
+  GemmMachineClass machine_class;
+  bool sse41;
+  bool amd_family;
+  std::uint32_t second_kib, third_kib;  // cache levels; 0 for none
+};
+
+inline constexpr GemmMachine gemm_machines[] = {
+    {"def", tier_def, machine_plain, false, false, 512, 0},
+    {"def_amd", tier_def, machine_def_amd, false, true, 512, 0},
+    {"sse3", tier_sse3, machine_plain, false, false, 512, 0},
+    {"ssse3", tier_ssse3, machine_ssse3, false, false, 2048, 0},
+    {"sse41_large_l2", tier_ssse3, machine_sse41_large_l2, true, false, 6144, 0},
+    {"sse41_small_l2", tier_ssse3, machine_sse41_small_l2, true, false, 3072, 0},
+    {"sse41_no_table", tier_ssse3, machine_sse41_large_l2, true, false, 0, 0},
+    {"sse42", tier_sse42, machine_sse42, true, false, 256, 8192},
+    {"sse42_small_l3", tier_sse42, machine_sse42, true, false, 256, 4096},
+    {"avx", tier_avx, machine_avx, true, false, 256, 8192},
+};
+
+// Makes this process the machine. Ends it as skipped where the processor cannot run the machine's tier.
+inline void become(const GemmMachine &machine) {
+  constexpr int exit_skipped = 77;
+  constexpr std::uint32_t sse41_bit = 1U << 19, family_of_kernels = 0x100F00;
+  if (!processor_runs(machine.tier)) {
+    std::printf("skipped: this processor lacks the instructions of tier %s\n", tier_name(machine.tier));
+    std::exit(exit_skipped);
+  }
+  fake.environment["QTB_DEBUG_CPU_TYPE"] = std::to_string(machine.tier);
+  fake.environment["QTB_DYNAMIC"] = "FALSE";
+  FakeProcessor &processor = fake.processors[0];
+  processor.vendor = machine.amd_family ? "AuthenticAMD" : "GenuineBelmo";
+  processor.signature = machine.amd_family ? family_of_kernels : 0;
+  processor.features_ecx = machine.sse41 ? sse41_bit : 0;
+  processor.caches.clear();
+  if (machine.second_kib != 0)
+    processor.caches = {fake_cache(1, 64, 1, 8, 64), fake_cache(3, 64, 1, 16, machine.second_kib)};
+  if (machine.third_kib != 0) processor.caches.push_back(fake_cache(3, 64, 1, 16, machine.third_kib));
+  insert_processors(&fake.process, 0, 0);
+  fake.online = fake.process;
+}
+
+// Whether it is the first machine of its tier: what depends on the tier alone need not run on the others.
+inline bool stands_for_its_tier(const GemmMachine &machine) {
+  for (const GemmMachine &other : gemm_machines)
+    if (other.tier == machine.tier) return &other == &machine;
+  return false;
+}
+
+// The machine that QTB_TEST_MACHINE names; the plain one where nothing does.
+inline const GemmMachine &named_machine() {
+  const char *name = std::getenv("QTB_TEST_MACHINE");
+  for (const GemmMachine &machine : gemm_machines)
+    if (name != nullptr && std::string(name) == machine.name) return machine;
+  if (name != nullptr) std::abort();
+  return gemm_machines[0];
+}
+
+}  // namespace qtb::test

@@ -1,0 +1,182 @@
+// A GEMM on matrices between trapping pages, and the two ways to judge its result: by the oracle, under the derived
+// bound, or, for whole numbers, exactly. Spare rows, and what may not be read, hold signalling NaN.
+#pragma once
+
+#include <gtest/gtest.h>
+
+#include <random>
+#include <string>
+#include <vector>
+
+#include "blas/shapes.h"
+#include "tests/reference/level3.h"
+#include "tests/support/guarded.h"
+#include "tests/support/placed.h"
+
+namespace qtb::test {
+
+template <class T>
+T number(double re, double im = 0) {
+  if constexpr (is_complex<T>)
+    return {static_cast<Real<T>>(re), static_cast<Real<T>>(im)};
+  else
+    return static_cast<T>(re);
+}
+
+struct GemmShape {
+  char transa = 'N', transb = 'N';
+  QtbInt m = 1, n = 1, k = 1;
+  bool whole_numbers = false;  // small ones, so that all sums are exact
+  Flush flush = Flush::back;
+  std::uint64_t seed = 1;
+};
+
+inline std::string text_of(const GemmShape &s) {
+  return std::string("op ") + s.transa + s.transb + " m " + std::to_string(s.m) + " n " + std::to_string(s.n) + " k " +
+         std::to_string(s.k) + " seed " + std::to_string(s.seed);
+}
+
+template <class T>
+class GemmProblem {
+ public:
+  GemmShape shape;
+  T alpha, beta;
+  QtbInt lda, ldb, ldc;
+  Guarded<T> a, b, c;
+  std::vector<T> before;
+
+  GemmProblem(const GemmShape &s, T alpha_, T beta_)
+      : shape(s),
+        alpha(alpha_),
+        beta(beta_),
+        lda((is_n(s.transa) ? s.m : s.k) + 1),
+        ldb((is_n(s.transb) ? s.k : s.n) + 2),
+        ldc(s.m + 3),
+        a(extent(lda - 1, is_n(s.transa) ? s.k : s.m, lda), s.flush),
+        b(extent(ldb - 2, is_n(s.transb) ? s.n : s.k, ldb), s.flush),
+        c(extent(s.m, s.n, ldc), s.flush) {
+    std::mt19937_64 random(s.seed * 977 + 5);
+    const bool reads_operands = !reference::is_value(widen(alpha), 0);
+    const bool reads_c = !reference::is_value(widen(beta), 0);
+    fill(a, lda - 1, lda, reads_operands, random);
+    fill(b, ldb - 2, ldb, reads_operands, random);
+    fill(c, s.m, ldc, reads_c, random);
+    before.assign(c.data(), c.data() + c.size());
+  }
+
+  void restore() { std::memcpy(static_cast<void *>(c.data()), before.data(), before.size() * sizeof(T)); }
+
+  // The largest error over its bound; fails where that is above 1, or where a spare row is not what it was.
+  double expect_within_bound() {
+    expect_spare_rows();
+    const reference::Expectation want = reference::gemm(shape.transa, shape.transb, shape.m, shape.n, shape.k, alpha,
+                                                        a.data(), lda, b.data(), ldb, beta, before.data(), ldc);
+    double worst = 0;
+    for (QtbInt j = 0; j < shape.n; ++j)
+      for (QtbInt i = 0; i < shape.m; ++i) {
+        const T got = c.data()[i + j * ldc];
+        const reference::Expected &expected = want.at(i, j);
+        if (expected.outcome == reference::Outcome::unchanged) {
+          const bool same = same_bits(got, before[static_cast<std::size_t>(i + j * ldc)]);
+          EXPECT_TRUE(same) << text_of(shape) << ": C(" << i << ", " << j << ") is not what it was";
+          if (!same) return 2;
+          continue;
+        }
+        const double ratio = error_ratio(got, expected.value, expected.gauge, want.roundings, want.alpha_magnitude);
+        worst = std::fmax(worst, ratio);
+        if (!(ratio <= 1)) {
+          ADD_FAILURE() << text_of(shape) << ": C(" << i << ", " << j << ") is " << ratio << " times its bound off";
+          return ratio;
+        }
+      }
+    return worst;
+  }
+
+  // For whole numbers: every element is the exact one. alpha and beta have to be whole, too.
+  void expect_exact() {
+    expect_spare_rows();
+    const auto m = static_cast<std::size_t>(shape.m), k = static_cast<std::size_t>(shape.k);
+    std::vector<Real<T>> a_re(m * k), a_im(is_complex<T> ? m * k : 0), re(m), im(m);
+    for (std::size_t l = 0; l < k; ++l)
+      for (std::size_t i = 0; i < m; ++i)
+        put(operand(shape.transa, a, lda, static_cast<QtbInt>(i), static_cast<QtbInt>(l)), a_re, a_im, i + l * m);
+    for (QtbInt j = 0; j < shape.n; ++j) {
+      std::fill(re.begin(), re.end(), Real<T>(0));
+      std::fill(im.begin(), im.end(), Real<T>(0));
+      for (std::size_t l = 0; l < k; ++l) {
+        const T y = operand(shape.transb, b, ldb, static_cast<QtbInt>(l), j);
+        if constexpr (is_complex<T>) {
+          for (std::size_t i = 0; i < m; ++i) re[i] += a_re[i + l * m] * y.re - a_im[i + l * m] * y.im;
+          for (std::size_t i = 0; i < m; ++i) im[i] += a_re[i + l * m] * y.im + a_im[i + l * m] * y.re;
+        } else {
+          for (std::size_t i = 0; i < m; ++i) re[i] += a_re[i + l * m] * y;
+        }
+      }
+      for (std::size_t i = 0; i < m; ++i) {
+        const std::size_t at = i + static_cast<std::size_t>(j * ldc);
+        T want = number<T>(0);
+        if constexpr (is_complex<T>) {
+          const T x = {re[i], im[i]};
+          want = plus(times(alpha, x), reference::is_value(widen(beta), 0) ? number<T>(0) : times(beta, before[at]));
+        } else {
+          want = alpha * re[i] + (beta == 0 ? 0 : beta * before[at]);
+        }
+        const T got = c.data()[at];
+        if (!equal(got, want)) {
+          ADD_FAILURE() << text_of(shape) << ": C(" << i << ", " << j << ") is not the exact value";
+          return;
+        }
+      }
+    }
+  }
+
+ private:
+  static bool is_n(char trans) { return trans == 'N' || trans == 'n'; }
+  static std::size_t extent(QtbInt rows, QtbInt cols, QtbInt ld) {
+    return cols < 1 ? 0 : static_cast<std::size_t>(ld * (cols - 1) + rows);
+  }
+  static T times(T x, T y) requires is_complex<T> { return {x.re * y.re - x.im * y.im, x.re * y.im + x.im * y.re}; }
+  static T plus(T x, T y) requires is_complex<T> { return {x.re + y.re, x.im + y.im}; }
+  static bool equal(T x, T y) {
+    if constexpr (is_complex<T>)
+      return x.re == y.re && x.im == y.im;
+    else
+      return x == y;
+  }
+  static void put(T v, std::vector<Real<T>> &re, std::vector<Real<T>> &im, std::size_t at) {
+    if constexpr (is_complex<T>) {
+      re[at] = v.re;
+      im[at] = v.im;
+    } else {
+      re[at] = v;
+    }
+  }
+  static T operand(char trans, const Guarded<T> &array, QtbInt ld, QtbInt i, QtbInt j) {
+    T v = array.data()[is_n(trans) ? i + j * ld : j + i * ld];
+    if constexpr (is_complex<T>)
+      if (trans == 'C' || trans == 'c') v.im = -v.im;
+    return v;
+  }
+  void fill(Guarded<T> &array, QtbInt rows, QtbInt ld, bool is_read, std::mt19937_64 &random) {
+    std::uniform_real_distribution<double> part(-1, 1);
+    std::uniform_int_distribution<int> whole(-4, 4);
+    const auto draw = [&] { return shape.whole_numbers ? whole(random) : part(random); };
+    for (std::size_t i = 0; i < array.size(); ++i) {
+      if (is_read && static_cast<QtbInt>(i) % ld < rows) {
+        const double re = draw();
+        array[i] = number<T>(re, is_complex<T> ? draw() : 0);
+      } else {
+        store_signalling_nan<T>(array.data() + i);
+      }
+    }
+  }
+  void expect_spare_rows() {
+    for (std::size_t i = 0; i < c.size(); ++i)
+      if (static_cast<QtbInt>(i) % ldc >= shape.m && !same_bits(c[i], before[i])) {
+        ADD_FAILURE() << text_of(shape) << ": a spare row of C was written";
+        return;
+      }
+  }
+};
+
+}  // namespace qtb::test
