@@ -15,6 +15,11 @@ set(QTB_TEST_ENVIRONMENT "")
 set(qtb_asan -fsanitize=address,undefined -fno-sanitize=vptr,alignment -fno-sanitize-recover=all
   -fno-omit-frame-pointer)
 
+# Tells the sources that every load and store is watched.
+if(QTB_INSTRUMENT MATCHES "^(asan|tsan|fuzz)$")
+  add_compile_definitions(QTB_WATCHED)
+endif()
+
 if(QTB_INSTRUMENT STREQUAL "asan")
   add_compile_options(${qtb_asan})
   add_link_options(${qtb_asan})

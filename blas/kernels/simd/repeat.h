@@ -27,9 +27,9 @@ template <int count, int k = 0, class F>
 }  // namespace
 }  // namespace qtb::QTB_TIER
 
-// In front of a loop that is written out in full; not where every load is watched, since the compiler would need
-// minutes for so long a line of checks.
-#if defined(__SANITIZE_ADDRESS__)
+// In front of a loop that is written out in full; not where every load is watched, since compilers would need minutes
+// for so long a line of checks.
+#if defined(QTB_WATCHED)
 #define QTB_WRITTEN_OUT _Pragma("GCC unroll 1")
 #else
 #define QTB_WRITTEN_OUT _Pragma("GCC unroll 128")
