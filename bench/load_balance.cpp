@@ -31,7 +31,7 @@ struct MachineRow {
   const char *name;
 };
 constexpr MachineRow machines[] = {{tier_def, machine_plain, "def"},
-                                   {tier_def, machine_def_amd, "def, on the family with kernels of its own"},
+                                   {tier_def, machine_family16, "def, on the family with kernels of its own"},
                                    {tier_sse3, machine_plain, "sse3"},
                                    {tier_ssse3, machine_ssse3, "ssse3"},
                                    {tier_ssse3, machine_sse41_large_l2, "ssse3 and SSE4.1, large second cache level"},

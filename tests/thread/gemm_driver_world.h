@@ -285,23 +285,23 @@ std::vector<Call> calls_of(const std::string &routine) {
   return found;
 }
 
-constexpr int plain = 0, ssse3 = 1, large_l2 = 2, sse42 = 3, small_l2 = 4, avx = 5, def_amd = 6;
-constexpr int all_classes[] = {plain, ssse3, large_l2, sse42, small_l2, avx, def_amd};
+constexpr int plain = 0, ssse3 = 1, large_l2 = 2, sse42 = 3, small_l2 = 4, avx = 5, def_family16 = 6;
+constexpr int all_classes[] = {plain, ssse3, large_l2, sse42, small_l2, avx, def_family16};
 constexpr int tuned_classes[] = {ssse3, large_l2, sse42, small_l2};
-constexpr int untuned_classes[] = {plain, avx, def_amd};
+constexpr int untuned_classes[] = {plain, avx, def_family16};
 
 // The services answer as a processor of the class does.
 void be_of_class(int machine_class) {
   const ProcessorTier tiers[] = {tier_def, tier_ssse3, tier_ssse3, tier_sse42, tier_ssse3, tier_avx, tier_def};
   world.tier = tiers[machine_class];
   world.sse41 = machine_class != ssse3;
-  world.family16 = machine_class == def_amd;
+  world.family16 = machine_class == def_family16;
   world.cache[cache_second_size] = machine_class == large_l2 ? 3145729 : 3145728;
 }
 
 // What a front end asks of a processor of the class: the threads, the tier, the caches, and the class's own question.
 std::string questions(int machine_class) {
-  const bool is_def = machine_class == plain || machine_class == def_amd;
+  const bool is_def = machine_class == plain || machine_class == def_family16;
   const bool is_ssse3 = machine_class == ssse3 || machine_class == large_l2 || machine_class == small_l2;
   return std::string("ntc") + (is_def ? "f" : is_ssse3 ? "4" : "");
 }

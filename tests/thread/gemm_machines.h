@@ -23,7 +23,7 @@ struct GemmMachine {
 
 inline constexpr GemmMachine gemm_machines[] = {
     {"def", tier_def, machine_plain, false, false, 512, 0},
-    {"def_amd", tier_def, machine_def_amd, false, true, 512, 0},
+    {"def_family16", tier_def, machine_family16, false, true, 512, 0},
     {"sse3", tier_sse3, machine_plain, false, false, 512, 0},
     {"ssse3", tier_ssse3, machine_ssse3, false, false, 2048, 0},
     {"sse41_large_l2", tier_ssse3, machine_sse41_large_l2, true, false, 6144, 0},

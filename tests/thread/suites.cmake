@@ -1,6 +1,6 @@
 # Teams of many more threads than processors: idle threads sleep there. Some suites run once for each made-up machine,
 # which a process is for good; see gemm_machines.h.
-set(gemm_machines def def_amd sse3 ssse3 sse41_large_l2 sse41_small_l2 sse41_no_table sse42 sse42_small_l3 avx)
+set(gemm_machines def def_family16 sse3 ssse3 sse41_large_l2 sse41_small_l2 sse41_no_table sse42 sse42_small_l3 avx)
 list(TRANSFORM gemm_machines REPLACE "(.+)" "\\1=QTB_TEST_MACHINE=\\1" OUTPUT_VARIABLE gemm_machine_runs)
 qtb_add_test(gemm_classes_test SOURCES thread/gemm_classes_test.cpp LIBRARIES qtb_static qtb_platform_fake
   RUNS ${gemm_machine_runs} ENVIRONMENT OMP_WAIT_POLICY=passive)

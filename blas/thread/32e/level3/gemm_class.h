@@ -14,7 +14,7 @@ constexpr std::uint32_t gemm_small_l2_bytes = 3145728;
 template <class Process>
 GemmMachineClass gemm_machine_class(ProcessorTier tier, const std::uint32_t *cache, Process process) {
   switch (tier) {
-    case tier_def: return process.is_amd_family16() ? machine_def_amd : machine_plain;
+    case tier_def: return process.is_amd_family16() ? machine_family16 : machine_plain;
     case tier_ssse3:
       if (!process.has_sse41()) return machine_ssse3;
       return cache[cache_count] != 0 && cache[cache_second_size] <= gemm_small_l2_bytes ? machine_sse41_small_l2

@@ -124,8 +124,8 @@ template <class T>
     return GemmSlots<T>::gemm(QTB_ARGS(gemm));
   }
 
-  const bool always_threads =
-      plan.machine_class == machine_plain || plan.machine_class == machine_avx || plan.machine_class == machine_def_amd;
+  const bool always_threads = plan.machine_class == machine_plain || plan.machine_class == machine_avx ||
+                              plan.machine_class == machine_family16;
   const T *working_beta = beta;
   if (!always_threads) {
     if (!gemm_threads_pay<T>(*m, *n, *k, threads)) return GemmSlots<T>::gemm(QTB_ARGS(gemm));

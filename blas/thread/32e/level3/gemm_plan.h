@@ -11,13 +11,13 @@ namespace qtb {
 
 // The keys of the tuned tables, worked out at each call.
 enum GemmMachineClass : std::int32_t {
-  machine_plain,           // tiers def (but for machine_def_amd) and sse3
+  machine_plain,           // tiers def (but for machine_family16) and sse3
   machine_ssse3,           // tier ssse3 without SSE4.1
   machine_sse41_large_l2,  // tier ssse3 with SSE4.1; the second cache level large, or none reported
   machine_sse42,
   machine_sse41_small_l2,  // tier ssse3 with SSE4.1, the second cache level small
   machine_avx,
-  machine_def_amd,  // tier def on the processor family that has kernels of its own
+  machine_family16,  // tier def on the processor family that has kernels of its own
   machine_class_count
 };
 

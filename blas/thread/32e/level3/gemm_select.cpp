@@ -130,7 +130,7 @@ struct Selection {
 // ---- Double precision ----
 
 // Tile kernels of their own: few columns a thread take the one with blocks of few columns.
-void select_def_amd(Selection<double> &s) {
+void select_family16(Selection<double> &s) {
   const QtbInt m = s.m, n = s.n, t = s.t;
   QtbInt rows;
   if (t % 2 != 0 || m > 2 * n || n > 2 * m)
@@ -237,7 +237,7 @@ void select_sse41(Selection<double> &s) {
 
 void select(Selection<double> &s) {
   switch (s.plan.machine_class) {
-    case machine_def_amd: return select_def_amd(s);
+    case machine_family16: return select_family16(s);
     case machine_ssse3: return select_ssse3(s);
     case machine_sse42: return select_sse42(s);
     case machine_sse41_large_l2:
