@@ -35,7 +35,7 @@ inline std::ostream &operator<<(std::ostream &out, const Step &s) {
 
 struct Schedule {
   std::vector<std::vector<Step>> threads;
-  std::int64_t phases = 0;  // barriers in all
+  std::int64_t phases = 0;  // barriers in all; without any, the end of the region is what makes C whole
 };
 
 struct Setting {
@@ -56,7 +56,7 @@ inline void add(Schedule &all, std::int64_t thread, const Step &s) {
 }
 
 inline Schedule rows_of_c(const Setting &p) {
-  Schedule all{std::vector<std::vector<Step>>(static_cast<std::size_t>(p.t)), 1};
+  Schedule all{std::vector<std::vector<Step>>(static_cast<std::size_t>(p.t)), 0};
   const std::int64_t q = p.m / p.t;
   for (std::int64_t i = 0; i < p.t; i++) {
     const std::int64_t rows = i < p.t - 1 ? q : std::max<std::int64_t>(p.m - q * i, 0);
@@ -66,7 +66,7 @@ inline Schedule rows_of_c(const Setting &p) {
 }
 
 inline Schedule columns_of_c(const Setting &p) {
-  Schedule all{std::vector<std::vector<Step>>(static_cast<std::size_t>(p.t)), 1};
+  Schedule all{std::vector<std::vector<Step>>(static_cast<std::size_t>(p.t)), 0};
   const std::int64_t q = p.n / p.t;
   for (std::int64_t i = 0; i < p.t; i++) {
     const std::int64_t cols = i < p.t - 1 ? q : std::max<std::int64_t>(p.n - q * i, 0);
@@ -122,7 +122,7 @@ inline Schedule tiles(const Setting &p) {
 
 // Tiles, each walked in blocks of columns, rows, depth.
 inline Schedule tiles_in_blocks(const Setting &p) {
-  Schedule all{std::vector<std::vector<Step>>(static_cast<std::size_t>(p.t)), 1};
+  Schedule all{std::vector<std::vector<Step>>(static_cast<std::size_t>(p.t)), 0};
   const std::int64_t row_share = down(p.m / p.r, p.mu);
   const std::int64_t col_share = p.n / p.c;
   const std::int64_t last_rows = std::max<std::int64_t>(p.m - p.r * row_share + row_share, 0);
@@ -224,7 +224,7 @@ inline Schedule shared_b_pairs(const Setting &p) {
 // Rows shared out; each thread packs A and B for itself and walks the slabs of B from its own number on. Place 0 is the
 // thread's own panel; of a compute step `ld` is that of A.
 inline Schedule own_a_and_b(const Setting &p) {
-  Schedule all{std::vector<std::vector<Step>>(static_cast<std::size_t>(p.t)), 1};
+  Schedule all{std::vector<std::vector<Step>>(static_cast<std::size_t>(p.t)), 0};
   const std::int64_t row_share = down(p.m / p.t, p.mu);
   const std::int64_t last_rows = p.m - (p.t - 1) * row_share;
   const std::int64_t super = p.t * p.nb;
