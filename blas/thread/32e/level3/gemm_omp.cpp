@@ -78,7 +78,9 @@ void gemm_region(const GemmPlan<T> &prepared, SharedPanels *shared, QTB_PARAMS_g
   panels.b_panel_bytes = panel_bytes<T>(plan.nb, plan.kb);
 
   if (plan.a_buffers > 0 || plan.b_buffers > 0) {
-#pragma omp single nowait
+    // The caller's own thread allocates, since it also gives back: its buffers then serve call after call, and no other
+    // thread of the team keeps a set that it may never need again.
+#pragma omp master
     {
       if (plan.b_buffers > 0)
         shared->b = qtb_serv_malloc(static_cast<std::uint64_t>(plan.b_buffers * panels.b_panel_bytes),
