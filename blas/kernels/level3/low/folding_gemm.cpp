@@ -3,7 +3,7 @@
 // C is m x n with columns ldc apart, op(A) m x k, op(B) k x n. A beta of 0 stores without reading C, an alpha of 0
 // reads neither A nor B. A and B do not overlap C.
 //
-// The depth is cut into blocks of the length that the kernels have written out, the remainder first. The first block
+// The depth is cut into blocks of a fixed length, the remainder first. The first block
 // applies beta, all others add: C is read and written once per block and never for beta alone.
 #include "blas/kernels/level3/body.h"
 #include "blas/kernels/level3/low/buffers.h"

@@ -9,7 +9,7 @@ constexpr int block_depth_of = static_cast<int>(rules_of<T>.kb.value);
 template <class T>
 constexpr StagedForm fixed_depth{Steps::all, block_depth_of<T>};
 template <class T>
-constexpr StagedForm general_depth{Steps::some, block_depth_of<T>};
+constexpr StagedForm general_depth{Steps::fours, 0};
 
 }  // namespace
 

@@ -29,7 +29,7 @@ struct InPlaceA {
 
 template <int columns>
 struct PackedB {
-  static constexpr bool paced = false, is_operand = false;
+  static constexpr bool paced = false;
   const double *at;
   [[gnu::always_inline]] __m128d load(int j) const { return broadcast(load_single(at + j)); }
   [[gnu::always_inline]] void next() { at += columns; }
@@ -37,13 +37,31 @@ struct PackedB {
 
 template <bool transposed>
 struct InPlaceB {
-  static constexpr bool paced = true, is_operand = false;
+  static constexpr bool paced = true;
   const double *at;
   QtbInt ld;
   [[gnu::always_inline]] __m128d load(int j) const { return broadcast(load_single(transposed ? at + j : at + j * ld)); }
   [[gnu::always_inline]] void next() { at += transposed ? ld : 1; }
   [[gnu::always_inline]] const double *&pace() { return at; }
 };
+
+QTB_STEP(add_doubled, double, QTB_STEP_NONE, "pd", "movaps", "movddup")
+QTB_STEP(add_doubled_with_vector_in_memory, double, QTB_STEP_SECOND_VECTOR, "pd", "movaps", "movddup")
+QTB_STEP(add_doubled_in_place, double, QTB_STEP_NONE, "pd", "movups", "movddup")
+
+template <int ahead_bytes>
+[[gnu::always_inline]] inline void add_step(int l, Sums<double, 2, 4> &sums,
+                                            const PackedA<double, 2, ahead_bytes> &from_a, const PackedB<4> &from_b) {
+  if (l % 3 == 0)
+    add_doubled(sums.v, from_a.at, from_b.at, 1);
+  else
+    add_doubled_with_vector_in_memory(sums.v, from_a.at, from_b.at, 1);
+}
+template <bool transposed>
+[[gnu::always_inline]] inline void add_step(int, Sums<double, 2, 4> &sums, const InPlaceA<4> &from_a,
+                                            const InPlaceB<transposed> &from_b) {
+  add_doubled_in_place(sums.v, from_a.at, from_b.at, transposed ? 1 : from_b.ld);
+}
 
 // rows of C from the sums of a tile.
 template <Beta beta, int rows, int vectors, int columns>
@@ -141,16 +159,16 @@ void run_in_place(QTB_EDGE_KERNEL_PARAMS) {
   }
 QTB_SSE3_KERNEL(a112, run_packed<Steps::all, Beta::one>)
 QTB_SSE3_KERNEL(a112e, run_packed<Steps::all, Beta::one>)
-QTB_SSE3_KERNEL(ak, run_packed<Steps::some, Beta::one>)
-QTB_SSE3_KERNEL(ak_b, run_packed<Steps::some, Beta::other>)
-QTB_SSE3_KERNEL(ak_0, run_packed<Steps::some, Beta::zero>)
+QTB_SSE3_KERNEL(ak, run_packed<Steps::fours, Beta::one>)
+QTB_SSE3_KERNEL(ak_b, run_packed<Steps::fours, Beta::other>)
+QTB_SSE3_KERNEL(ak_0, run_packed<Steps::fours, Beta::zero>)
 QTB_SSE3_KERNEL(n112, run_in_place<false, Steps::all, Beta::one>)
 QTB_SSE3_KERNEL(t112, run_in_place<true, Steps::all, Beta::one>)
-QTB_SSE3_KERNEL(nk, run_in_place<false, Steps::some, Beta::one>)
-QTB_SSE3_KERNEL(tk, run_in_place<true, Steps::some, Beta::one>)
-QTB_SSE3_KERNEL(nk_b, run_in_place<false, Steps::some, Beta::other>)
-QTB_SSE3_KERNEL(tk_b, run_in_place<true, Steps::some, Beta::other>)
-QTB_SSE3_KERNEL(nk_0, run_in_place<false, Steps::some, Beta::zero>)
-QTB_SSE3_KERNEL(tk_0, run_in_place<true, Steps::some, Beta::zero>)
+QTB_SSE3_KERNEL(nk, run_in_place<false, Steps::any, Beta::one>)
+QTB_SSE3_KERNEL(tk, run_in_place<true, Steps::any, Beta::one>)
+QTB_SSE3_KERNEL(nk_b, run_in_place<false, Steps::any, Beta::other>)
+QTB_SSE3_KERNEL(tk_b, run_in_place<true, Steps::any, Beta::other>)
+QTB_SSE3_KERNEL(nk_0, run_in_place<false, Steps::any, Beta::zero>)
+QTB_SSE3_KERNEL(tk_0, run_in_place<true, Steps::any, Beta::zero>)
 
 }  // namespace qtb::QTB_TIER

@@ -13,7 +13,7 @@ namespace {
 
 constexpr int staged_vectors = 2, staged_columns = 4;  // of real numbers, in one pass
 
-// A kernel's constants: longest is the depth that is written out.
+// A kernel's constants: longest is the depth of Steps::all.
 struct StagedForm {
   Steps steps;
   int longest;

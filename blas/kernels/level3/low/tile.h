@@ -6,10 +6,11 @@
 // combined once, when the depth is done. Two such passes make a tile of four complex columns, whose sums would not fit
 // the registers at once.
 //
-// The depth is written out in full, as far as a panel of these tiers can reach: once for panels of exactly that depth,
-// and once with a test after each step. Edges of C take a loop.
+// The steps stand in a row of sixteen, which a loop repeats, with one of four for what is left. Edges of C take a loop
+// around each.
 #pragma once
 
+#include "blas/kernels/level3/low/step.h"
 #include "blas/kernels/plain/plain.h"
 #include "blas/kernels/simd/repeat.h"
 
@@ -21,10 +22,10 @@ struct Sums {
   Vec<R> v[columns][vectors];
 };
 
-// Where the steps of A and B come from: load(i) is vector i of A, or column i of B in all lanes, at the present step,
-// or times(a, i) its product with a; next() goes on to the next step. paced: the address of a step is not known to the
-// compiler before the sums of the step before. Left alone, it computes the addresses of all steps ahead of the first
-// and spills them, or asks for all lines of a panel at once.
+// Where the steps of A and B come from: load(i) is vector i of A, or column i of B in all lanes, at the present step;
+// next() goes on to the next step. paced: the address of a step is not known to the compiler before the sums of the
+// step before. Left alone, it computes the addresses of all steps of a row ahead of the first and spills them, or asks
+// for all lines at once.
 
 // Micro-panels of A: aligned vectors, in the order of the steps. ahead_bytes: how far ahead of its loads the panel is
 // asked for, a cache line per step and with the least claim on the caches; 0: it is not.
@@ -47,84 +48,77 @@ struct PackedA {
 // The stage of B: a vector per column and step.
 template <class R, int columns>
 struct StagedB {
-  static constexpr bool paced = false, is_operand = false;
+  static constexpr bool paced = false;
   const R *at;
   [[gnu::always_inline]] Vec<R> load(int j) const { return load_aligned(at + j * lanes<R>); }
   [[gnu::always_inline]] void next() { at += columns * lanes<R>; }
 };
 
-// The same where a column serves a single product: its vector stays a memory operand of the multiplication. Compilers
-// load it into a register first, and such loads compete with the products and sums; operands do not.
-[[gnu::always_inline]] inline __m128d times_at(__m128d a, const double *at) {
-  __asm__("mulpd %1, %0" : "+x"(a) : "m"(*reinterpret_cast<const __m128d *>(at)));
-  return a;
-}
-template <int columns>
-struct OperandB {
-  static constexpr bool paced = true, is_operand = true;
-  const double *at;
-  [[gnu::always_inline]] __m128d times(__m128d a, int j) const { return times_at(a, at + j * lanes<double>); }
-  [[gnu::always_inline]] void next() { at += columns * lanes<double>; }
-  [[gnu::always_inline]] const double *&pace() { return at; }
-};
-
+// Step l of a row. Tiles that matter have forms of their own (step.h), chosen by where their factors come from.
 template <class R, int vectors, int columns, class A, class B>
-[[gnu::always_inline]] inline void add_step(Sums<R, vectors, columns> &sums, A &from_a, B &from_b) {
+[[gnu::always_inline]] inline void add_step(int, Sums<R, vectors, columns> &sums, const A &from_a, const B &from_b) {
   Vec<R> a[vectors];
   for (int v = 0; v < vectors; v++) a[v] = from_a.load(v);
   for (int j = 0; j < columns; j++) {
-    const auto add_products = [&](auto product) __attribute__((always_inline)) {
-      for (int v = 0; v < vectors; v++) {
-        sums.v[j][v] = add(sums.v[j][v], product(a[v]));
-        keep_in_place(sums.v[j][v]);
-      }
-    };
-    if constexpr (B::is_operand) {
-      add_products([&](Vec<R> x) __attribute__((always_inline)) { return from_b.times(x, j); });
-    } else {
-      Vec<R> b = from_b.load(j);
-      keep_in_place(b);
-      add_products([&](Vec<R> x) __attribute__((always_inline)) { return mul(b, x); });
+    Vec<R> b = from_b.load(j);
+    keep_in_place(b);
+    for (int v = 0; v < vectors; v++) {
+      sums.v[j][v] = add(sums.v[j][v], mul(b, a[v]));
+      keep_in_place(sums.v[j][v]);
     }
   }
-  from_a.next();
-  from_b.next();
-  Vec<R> &last = sums.v[columns - 1][vectors - 1];
-  if constexpr (A::paced) __asm__("" : "+r"(from_a.pace()), "+x"(last));
-  if constexpr (B::paced) __asm__("" : "+r"(from_b.pace()), "+x"(last));
 }
 
-// How the steps of a depth are written: all of longest steps, up to longest with a test after each, all of longest in a
-// loop of four steps per turn, any depth in such a loop, or in one of a step per turn.
-enum class Steps { all, some, all_by_fours, fours, any };
+QTB_STEP(add_with_column_in_memory, float, QTB_STEP_LAST_COLUMN, "ps", "movaps", "movaps")
+QTB_STEP(add_with_column_in_memory, double, QTB_STEP_LAST_COLUMN, "pd", "movaps", "movaps")
+QTB_STEP(add_with_vector_in_memory, float, QTB_STEP_SECOND_VECTOR, "ps", "movaps", "movaps")
+QTB_STEP(add_with_vector_in_memory, double, QTB_STEP_SECOND_VECTOR, "pd", "movaps", "movaps")
 
-// The sums over a depth of at least one step. Steps::all and Steps::all_by_fours take longest for the depth.
+template <class R, int ahead_bytes>
+[[gnu::always_inline]] inline void add_step(int l, Sums<R, 2, 4> &sums, const PackedA<R, 2, ahead_bytes> &from_a,
+                                            const StagedB<R, 4> &from_b) {
+  if (l % 2 == 0)
+    add_with_column_in_memory(sums.v, from_a.at, from_b.at, lanes<R>);
+  else
+    add_with_vector_in_memory(sums.v, from_a.at, from_b.at, lanes<R>);
+}
+
+// Steps in a row. A loop of fewer loses two cycles per turn to its jump; far more, as the whole of a depth, run at
+// anything from a third of the speed up, as the code happens to lie in memory.
+constexpr int steps_in_row = 16, steps_in_short_row = 4;
+
+template <int count, class R, int vectors, int columns, class A, class B>
+[[gnu::always_inline]] inline void add_steps(Sums<R, vectors, columns> &sums, A &a, B &b) {
+  QTB_WRITTEN_OUT
+  for (int l = 0; l < count; l++) {
+    add_step(l, sums, a, b);
+    a.next();
+    b.next();
+    Vec<R> &last = sums.v[columns - 1][vectors - 1];
+    if constexpr (A::paced) __asm__("" : "+r"(a.pace()), "+x"(last));
+    if constexpr (B::paced) __asm__("" : "+r"(b.pace()), "+x"(last));
+  }
+}
+
+// What is known of a depth: all of it, that it is a multiple of four, or nothing.
+enum class Steps { all, fours, any };
+
+// The sums over a depth. Steps::all takes longest for the depth.
 template <class R, int vectors, int columns, Steps steps, int longest, class A, class B>
 [[gnu::always_inline]] inline Sums<R, vectors, columns> sums_over(QtbInt depth, A a, B b) {
   Sums<R, vectors, columns> sums;
   for (int j = 0; j < columns; j++)
     for (int v = 0; v < vectors; v++) sums.v[j][v] = zero<R>();
-  if constexpr (steps == Steps::any) {
-    for (QtbInt l = 0; l < depth; l++) add_step(sums, a, b);
-  } else if constexpr (steps == Steps::fours || steps == Steps::all_by_fours) {
-    const QtbInt end = steps == Steps::all_by_fours ? longest : depth;
-    for (QtbInt l = 0; l < end; l += 4) {
-      add_step(sums, a, b);
-      add_step(sums, a, b);
-      add_step(sums, a, b);
-      add_step(sums, a, b);
-    }
+  if constexpr (steps == Steps::all) {
+    static_assert(longest % steps_in_row == 0);
+    for (int l = 0; l < longest; l += steps_in_row) add_steps<steps_in_row>(sums, a, b);
   } else {
-    for (;; depth -= longest) {
-      QTB_WRITTEN_OUT
-      for (int l = 0; l < longest; l++) {
-        add_step(sums, a, b);
-        if (steps == Steps::some && l + 1 == depth) return sums;
-      }
-      if constexpr (steps == Steps::all) return sums;
-    }
+    for (; depth >= steps_in_row; depth -= steps_in_row) add_steps<steps_in_row>(sums, a, b);
+    for (; depth >= steps_in_short_row; depth -= steps_in_short_row) add_steps<steps_in_short_row>(sums, a, b);
+    if constexpr (steps == Steps::any)
+      for (; depth > 0; depth--) add_steps<1>(sums, a, b);
   }
-  if constexpr (steps != Steps::all && steps != Steps::some) return sums;
+  return sums;
 }
 
 // Where a micro-panel of B lies: element (l, j) at first[l*step + j*column].
