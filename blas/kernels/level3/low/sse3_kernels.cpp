@@ -81,12 +81,6 @@ template <Beta beta, int rows, int vectors, int columns>
     }
 }
 
-// C where the next tile of these columns begins.
-template <int columns>
-[[gnu::always_inline]] inline void ask_for_c(const double *c, QtbInt ldc) {
-  for (int j = 0; j < columns; j++) _mm_prefetch(reinterpret_cast<const char *>(c + tile_rows + j * ldc), _MM_HINT_NTA);
-}
-
 // ---- A and B packed ----
 
 template <Steps steps, Beta beta, int columns>
@@ -94,7 +88,7 @@ void run_packed_columns(QtbInt m, QtbInt k, const double *a, QtbInt lda, const d
                         const double *lanes_of_beta) {
   using A = PackedA<double, 2, panel_ahead_bytes>;
   for (; m >= tile_rows; m -= tile_rows, a += lda, c += tile_rows) {
-    ask_for_c<columns>(c, ldc);
+    ask_for_c<columns, tile_rows>(c, ldc);
     store_rows<beta, 4>(sums_over<double, 2, columns, steps, fixed_depth>(k, A(a), PackedB<columns>{b}), c, ldc,
                         lanes_of_beta);
   }

@@ -38,6 +38,7 @@ void run_staged_columns(QtbInt m, QtbInt kp, const T *ap, QtbInt ldap, SourceB<R
   for (QtbInt i0 = 0; i0 < m; i0 += mr, ap += ldap, c += mr) {
     const R *a = parts(ap);
     T *to = c;
+    ask_for_c<columns * lanes<T> / lanes<R>, mr>(c, ldc);
     for (int p = 0; p < whole; p++, to += columns_per_pass * ldc)
       store_tile<T, beta>(sums_over<R, staged_vectors, staged_columns, form.steps, form.longest>(
                               kp, A(a), StagedB<R, staged_columns>{stage + p * stage_step}),

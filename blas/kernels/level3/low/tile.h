@@ -186,6 +186,14 @@ template <class T, Beta beta>
   }
 }
 
+// C where the next tile of these columns begins: it is asked for before the depth, and there by its end.
+template <int columns, int rows, class T>
+[[gnu::always_inline]] inline void ask_for_c(const T *c, QtbInt ldc) {
+  for (int j = 0; j < columns; j++)
+    _mm_prefetch(reinterpret_cast<const char *>(reinterpret_cast<std::uintptr_t>(c + j * ldc) + rows * sizeof(T)),
+                 _MM_HINT_NTA);
+}
+
 // C from the sums of a tile: columns of C, each of vectors.
 template <class T, Beta beta, int vectors, int columns>
 [[gnu::always_inline]] inline void store_tile(const Sums<Real<T>, vectors, columns> &sums, T *c, QtbInt ldc,
