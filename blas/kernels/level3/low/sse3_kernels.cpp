@@ -37,7 +37,7 @@ struct PackedB {
 
 template <bool transposed>
 struct InPlaceB {
-  static constexpr bool paced = true;
+  static constexpr bool paced = transposed;
   const double *at;
   QtbInt ld;
   [[gnu::always_inline]] __m128d load(int j) const { return broadcast(load_single(transposed ? at + j : at + j * ld)); }
@@ -45,22 +45,22 @@ struct InPlaceB {
   [[gnu::always_inline]] const double *&pace() { return at; }
 };
 
-QTB_STEP(add_doubled, double, QTB_STEP_NONE, "pd", "movaps", "movddup")
-QTB_STEP(add_doubled_with_vector_in_memory, double, QTB_STEP_SECOND_VECTOR, "pd", "movaps", "movddup")
-QTB_STEP(add_doubled_in_place, double, QTB_STEP_NONE, "pd", "movups", "movddup")
+QTB_STEP(add_with_two_copies, double, QTB_TWO_COPIES, "pd", "movaps", "movddup")
+QTB_STEP(add_with_second_vector, double, QTB_SECOND_VECTOR, "pd", "movaps", "movddup")
+QTB_STEP(add_in_place, double, QTB_LOADED_AGAIN, "pd", "movups", "movddup")
 
 template <int ahead_bytes>
 [[gnu::always_inline]] inline void add_step(int l, Sums<double, 2, 4> &sums,
                                             const PackedA<double, 2, ahead_bytes> &from_a, const PackedB<4> &from_b) {
   if (l % 3 == 0)
-    add_doubled(sums.v, from_a.at, from_b.at, 1);
+    add_with_two_copies(sums.v, from_a.at, from_b.at, 1);
   else
-    add_doubled_with_vector_in_memory(sums.v, from_a.at, from_b.at, 1);
+    add_with_second_vector(sums.v, from_a.at, from_b.at, 1);
 }
 template <bool transposed>
 [[gnu::always_inline]] inline void add_step(int, Sums<double, 2, 4> &sums, const InPlaceA<4> &from_a,
                                             const InPlaceB<transposed> &from_b) {
-  add_doubled_in_place(sums.v, from_a.at, from_b.at, transposed ? 1 : from_b.ld);
+  add_in_place(sums.v, from_a.at, from_b.at, transposed ? 1 : from_b.ld);
 }
 
 // rows of C from the sums of a tile.

@@ -1,18 +1,16 @@
 // The step of the tile of two vectors by four columns, s[j][v] += a[v]*b[j], as instructions of the machine.
 //
-// Compilers do not write it: they load all operands into registers, and copy sums besides. With two pipes for products
-// and two for sums a step takes four cycles, unless it has many more than 24 instructions or eight loads. Sixteen are
-// the products and sums; the others bring factors to registers and copy those that another product needs, since a
-// product takes the place of one of its factors: those of a column the places of b and of a copy of it, those of the
-// last column the places of b and of a[0], or of both a. The forms differ in what stays an operand in memory:
+// Compilers do not write it: they load all operands into registers, and copy sums besides. Sixteen instructions are the
+// products and sums, and fill two pipes for either for four cycles. Others bring the factors to registers, a second
+// time where a product has taken the place of a factor that another one needs: those of a column take the places of b
+// and of b again, those of the last column the places of b and of a[0], or of both a. What is there again may be a copy
+// or another load. Instructions cost little up to 24 or 25, loads up to eight, copies up to two; beyond, each costs a
+// part of a cycle, whatever the order. The forms, with the cycles of a step that they or their mixture take:
 //
-//   none             25 instructions, 6 loads
-//   last_column      24 instructions, 7 loads: b[3], which must lie there in all lanes
-//   second_vector    24 instructions, 9 loads: a[1], which must be aligned
-//
-// The fastest are mixtures whose loads just fit: last_column and second_vector in turn, and where an instruction
-// doubles b on its way, one step of none and two of second_vector. A mixture takes 4.1 to 4.2 cycles a step, none and
-// last_column by themselves 4.9 and 4.6, in whatever order their instructions stand.
+//   loaded_again   25 instructions, 8 loads, 1 copy      4.3   any two operands
+//   last_column    24 instructions, 8 loads, 2 copies    4.1   b[3] stays in memory, where it lies in all lanes
+//   two_copies     25 instructions, 7 loads, 2 copies    4.2   one step of these and two
+//   second_vector  24 instructions, 9 loads, 3 copies          of these, whose a[1] stays in memory, aligned
 #pragma once
 
 #include "blas/kernels/simd/vec.h"
@@ -20,31 +18,49 @@
 namespace qtb::QTB_TIER {
 namespace {
 
-// p and q are a, x and y an element of b and its copy.
+// p and q are a, x and y an element of b and that element again.
 // clang-format off
-#define QTB_COLUMN(arithmetic, load_b, j, a1, s0, s1)                                                         \
-  load_b " %[b" #j "], %[x]\n\tmovaps %[x], %[y]\n\tmul" arithmetic " %[p], %[x]\n\tadd" arithmetic " %[x], " \
-         "%[" #s0 "]\n\tmul" arithmetic " " a1 ", %[y]\n\tadd" arithmetic " %[y], %[" #s1 "]\n\t"
-#define QTB_FIRST_COLUMNS(arithmetic, load_b, a1)     \
-  QTB_COLUMN(arithmetic, load_b, 0, a1, s00, s01)     \
-  QTB_COLUMN(arithmetic, load_b, 1, a1, s10, s11)     \
-  QTB_COLUMN(arithmetic, load_b, 2, a1, s20, s21)
-#define QTB_PRODUCT(arithmetic, factor, place, s) \
-  "mul" arithmetic " " factor ", " place "\n\tadd" arithmetic " " place ", %[" #s "]\n\t"
+#define QTB_LOADED(load_b, j) load_b " %[b" #j "], %[y]\n\t"
+#define QTB_COPIED(load_b, j) "movaps %[x], %[y]\n\t"
+#define QTB_COLUMN(arithmetic, load_b, again, j, a1)                                \
+  load_b " %[b" #j "], %[x]\n\t" again(load_b, j)                                   \
+  "mul" arithmetic " %[p], %[x]\n\tadd" arithmetic " %[x], %[s" #j "0]\n\t"         \
+  "mul" arithmetic " " a1 ", %[y]\n\tadd" arithmetic " %[y], %[s" #j "1]\n\t"
+#define QTB_PRODUCT(arithmetic, factor, place, sum) \
+  "mul" arithmetic " " factor ", " place "\n\tadd" arithmetic " " place ", %[" sum "]\n\t"
+#define QTB_BOTH_VECTORS(load_a) load_a " %[a0], %[p]\n\t" load_a " %[a1], %[q]\n\t"
 
-#define QTB_STEP_NONE(arithmetic, load_a, load_b)                                \
-  load_a " %[a0], %[p]\n\t" load_a " %[a1], %[q]\n\t"                            \
-  QTB_FIRST_COLUMNS(arithmetic, load_b, "%[q]") load_b " %[b3], %[x]\n\t"        \
-  QTB_PRODUCT(arithmetic, "%[x]", "%[p]", s30) QTB_PRODUCT(arithmetic, "%[q]", "%[x]", s31)
-#define QTB_STEP_LAST_COLUMN(arithmetic, load_a, load_b)  \
-  load_a " %[a0], %[p]\n\t" load_a " %[a1], %[q]\n\t"     \
-  QTB_FIRST_COLUMNS(arithmetic, load_b, "%[q]")           \
-  QTB_PRODUCT(arithmetic, "%[b3]", "%[p]", s30) QTB_PRODUCT(arithmetic, "%[b3]", "%[q]", s31)
-#define QTB_STEP_SECOND_VECTOR(arithmetic, load_a, load_b)                    \
-  load_a " %[a0], %[p]\n\t"                                                   \
-  QTB_FIRST_COLUMNS(arithmetic, load_b, "%[a1]") load_b " %[b3], %[x]\n\t"    \
-  QTB_PRODUCT(arithmetic, "%[x]", "%[p]", s30) QTB_PRODUCT(arithmetic, "%[a1]", "%[x]", s31)
-
+#define QTB_LOADED_AGAIN(arithmetic, load_a, load_b)         \
+  QTB_BOTH_VECTORS(load_a)                                   \
+  QTB_COLUMN(arithmetic, load_b, QTB_LOADED, 0, "%[q]")      \
+  QTB_COLUMN(arithmetic, load_b, QTB_LOADED, 1, "%[q]")      \
+  QTB_COLUMN(arithmetic, load_b, QTB_COPIED, 2, "%[q]")      \
+  load_b " %[b3], %[x]\n\t"                                  \
+  QTB_PRODUCT(arithmetic, "%[x]", "%[p]", "s30")             \
+  QTB_PRODUCT(arithmetic, "%[q]", "%[x]", "s31")
+#define QTB_TWO_COPIES(arithmetic, load_a, load_b)           \
+  QTB_BOTH_VECTORS(load_a)                                   \
+  QTB_COLUMN(arithmetic, load_b, QTB_LOADED, 0, "%[q]")      \
+  QTB_COLUMN(arithmetic, load_b, QTB_COPIED, 1, "%[q]")      \
+  QTB_COLUMN(arithmetic, load_b, QTB_COPIED, 2, "%[q]")      \
+  load_b " %[b3], %[x]\n\t"                                  \
+  QTB_PRODUCT(arithmetic, "%[x]", "%[p]", "s30")             \
+  QTB_PRODUCT(arithmetic, "%[q]", "%[x]", "s31")
+#define QTB_LAST_COLUMN(arithmetic, load_a, load_b)          \
+  QTB_BOTH_VECTORS(load_a)                                   \
+  QTB_COLUMN(arithmetic, load_b, QTB_LOADED, 0, "%[q]")      \
+  QTB_COLUMN(arithmetic, load_b, QTB_COPIED, 1, "%[q]")      \
+  QTB_COLUMN(arithmetic, load_b, QTB_COPIED, 2, "%[q]")      \
+  QTB_PRODUCT(arithmetic, "%[b3]", "%[p]", "s30")            \
+  QTB_PRODUCT(arithmetic, "%[b3]", "%[q]", "s31")
+#define QTB_SECOND_VECTOR(arithmetic, load_a, load_b)        \
+  load_a " %[a0], %[p]\n\t"                                  \
+  QTB_COLUMN(arithmetic, load_b, QTB_COPIED, 0, "%[a1]")     \
+  QTB_COLUMN(arithmetic, load_b, QTB_COPIED, 1, "%[a1]")     \
+  QTB_COLUMN(arithmetic, load_b, QTB_COPIED, 2, "%[a1]")     \
+  load_b " %[b3], %[x]\n\t"                                  \
+  QTB_PRODUCT(arithmetic, "%[x]", "%[p]", "s30")             \
+  QTB_PRODUCT(arithmetic, "%[a1]", "%[x]", "s31")
 // clang-format on
 
 // A vector of which an instruction reads all or a part, at any address.

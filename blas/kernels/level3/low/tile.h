@@ -69,21 +69,16 @@ template <class R, int vectors, int columns, class A, class B>
   }
 }
 
-QTB_STEP(add_with_column_in_memory, float, QTB_STEP_LAST_COLUMN, "ps", "movaps", "movaps")
-QTB_STEP(add_with_column_in_memory, double, QTB_STEP_LAST_COLUMN, "pd", "movaps", "movaps")
-QTB_STEP(add_with_vector_in_memory, float, QTB_STEP_SECOND_VECTOR, "ps", "movaps", "movaps")
-QTB_STEP(add_with_vector_in_memory, double, QTB_STEP_SECOND_VECTOR, "pd", "movaps", "movaps")
+QTB_STEP(add_staged, float, QTB_LAST_COLUMN, "ps", "movaps", "movaps")
+QTB_STEP(add_staged, double, QTB_LAST_COLUMN, "pd", "movaps", "movaps")
 
 template <class R, int ahead_bytes>
-[[gnu::always_inline]] inline void add_step(int l, Sums<R, 2, 4> &sums, const PackedA<R, 2, ahead_bytes> &from_a,
+[[gnu::always_inline]] inline void add_step(int, Sums<R, 2, 4> &sums, const PackedA<R, 2, ahead_bytes> &from_a,
                                             const StagedB<R, 4> &from_b) {
-  if (l % 2 == 0)
-    add_with_column_in_memory(sums.v, from_a.at, from_b.at, lanes<R>);
-  else
-    add_with_vector_in_memory(sums.v, from_a.at, from_b.at, lanes<R>);
+  add_staged(sums.v, from_a.at, from_b.at, lanes<R>);
 }
 
-// Steps in a row. A loop of fewer loses two cycles per turn to its jump; far more, as the whole of a depth, run at
+// Steps in a row. A loop of fewer loses two cycles per turn to its jump; far more, such as a whole depth, run at
 // anything from a third of the speed up, as the code happens to lie in memory.
 constexpr int steps_in_row = 16, steps_in_short_row = 4;
 
