@@ -58,12 +58,13 @@ void change_one(const T *from, T *to, const Change &change) {
 template <class T>
 constexpr QtbInt line_elements = 64 / static_cast<QtbInt>(sizeof(T));
 
-// How far ahead of its reads a pass asks for the source.
-constexpr QtbInt source_ahead_bytes = 256;
+// How far ahead of its reads a pass asks for the source: a few lines where it runs along the columns, the line of the
+// next pass where it steps from one column to the next, mostly onto another page, beyond what processors foresee.
+constexpr QtbInt along_ahead_bytes = 256, across_ahead_bytes = 64;
 
-template <class T>
+template <QtbInt bytes_ahead, class T>
 void ask_for(const T *p) {
-  _mm_prefetch(reinterpret_cast<const char *>(reinterpret_cast<std::uintptr_t>(p) + source_ahead_bytes), _MM_HINT_T0);
+  _mm_prefetch(reinterpret_cast<const char *>(reinterpret_cast<std::uintptr_t>(p) + bytes_ahead), _MM_HINT_T0);
 }
 
 template <class T>
@@ -78,6 +79,7 @@ void pack_side_by_side(QtbInt depth, QtbInt padded, const T *src, QtbInt ld, T *
   const T *from = src;
   for (QtbInt l = 0; l < depth; l++, from += ld) {
     T *to = dst + l * w;
+    ask_for<across_ahead_bytes>(from);
     repeat<panels>([&](auto p) {
       const T *part = from + p.value * w;
       T *panel = to + p.value * ldp;
@@ -105,14 +107,19 @@ inline void transpose(__m128d (&)[1]) {}
 
 // Step l of one micro-panel of width w takes element l + i*ld to place l*w + i.
 template <class T, int w, class Change>
-void pack_columns(QtbInt depth, QtbInt padded, const T *src, QtbInt ld, T *dst, const Change &change) {
+void pack_columns(QtbInt depth, QtbInt padded, const T *src, QtbInt ld, T *dst, Change change) {
   constexpr int step = static_cast<int>(lanes<T>), groups = w / step, line = static_cast<int>(line_elements<T>);
-  const auto block = [&](QtbInt l) {
-    repeat<groups>([&](auto g) {
+  const auto block = [=](QtbInt l) __attribute__((always_inline)) {
+    repeat<groups>([&](auto g) __attribute__((always_inline)) {
       const T *from = src + l + g.value * step * ld;
       T *to = dst + l * w + g.value * step;
       Vec<T> v[step];
-      repeat<step>([&](auto i) { v[i.value] = change(load_unaligned(from + i.value * ld)); });
+      repeat<step>([&](auto i) __attribute__((always_inline)) {
+        Vec<T> x = load_unaligned(from + i.value * ld);
+        // Loaded once: rather than transpose two vectors of two, compilers load the halves of both, four loads for two.
+        if constexpr (step == 2) keep_in_place(x);
+        v[i.value] = change(x);
+      });
       transpose(v);
       repeat<step>([&](auto i) { store_unaligned(to + i.value * w, v[i.value]); });
     });
@@ -121,7 +128,7 @@ void pack_columns(QtbInt depth, QtbInt padded, const T *src, QtbInt ld, T *dst, 
   };
   QtbInt l = 0;
   for (; l + line <= depth; l += line) {
-    for (int i = 0; i < w; i++) ask_for(src + l + i * ld);
+    for (int i = 0; i < w; i++) ask_for<along_ahead_bytes>(src + l + i * ld);
     for (int s = 0; s < line; s += step) block(l + s);
   }
   for (; l + step <= depth; l += step) block(l);
