@@ -175,10 +175,12 @@ template <class T, int width, bool aligned>
   }
 }
 
-// Every element of a micro-panel of B in a vector of its own: what fills one already, as it is.
+// Every element of a micro-panel of B in a vector of its own: what fills one already, as it is. elements is a multiple
+// of unit_depth.
 template <class T>
 void stage_columns(QtbInt elements, const T *bp, T *stage) {
-  for (QtbInt e = 0; e < elements; e++) store_aligned(stage + e * lanes<T>, load_repeated(bp + e));
+  for (; elements > 0; elements -= unit_depth, bp += unit_depth, stage += unit_depth * lanes<T>)
+    repeat<unit_depth>([&](auto e) { store_aligned(stage + e.value * lanes<T>, load_repeated(bp + e.value)); });
 }
 
 template <class T, int width, bool aligned>
