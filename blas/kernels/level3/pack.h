@@ -58,13 +58,14 @@ void change_one(const T *from, T *to, const Change &change) {
 template <class T>
 constexpr QtbInt line_elements = 64 / static_cast<QtbInt>(sizeof(T));
 
-// How far ahead of its reads a pass asks for the source: a few lines where it runs along the columns, the line of the
-// next pass where it steps from one column to the next, mostly onto another page, beyond what processors foresee.
-constexpr QtbInt along_ahead_bytes = 256, across_ahead_bytes = 64;
-
-template <QtbInt bytes_ahead, class T>
-void ask_for(const T *p) {
-  _mm_prefetch(reinterpret_cast<const char *>(reinterpret_cast<std::uintptr_t>(p) + bytes_ahead), _MM_HINT_T0);
+// Each pass asks for what the next one will read, as it meets the same column or the same depth: the source lies in
+// short runs a column apart, mostly on other pages, and what processors foresee ends with the run. The last pass asks
+// for what may lie beyond the block, which reads nothing.
+template <class T>
+void ask_for(const T *p, QtbInt ahead) {
+  _mm_prefetch(reinterpret_cast<const char *>(reinterpret_cast<std::uintptr_t>(p) +
+                                              static_cast<std::uintptr_t>(ahead) * sizeof(T)),
+               _MM_HINT_T0);
 }
 
 template <class T>
@@ -79,7 +80,7 @@ void pack_side_by_side(QtbInt depth, QtbInt padded, const T *src, QtbInt ld, T *
   const T *from = src;
   for (QtbInt l = 0; l < depth; l++, from += ld) {
     T *to = dst + l * w;
-    ask_for<across_ahead_bytes>(from);
+    ask_for(from, panels * w);
     repeat<panels>([&](auto p) {
       const T *part = from + p.value * w;
       T *panel = to + p.value * ldp;
@@ -128,7 +129,7 @@ void pack_columns(QtbInt depth, QtbInt padded, const T *src, QtbInt ld, T *dst, 
   };
   QtbInt l = 0;
   for (; l + line <= depth; l += line) {
-    for (int i = 0; i < w; i++) ask_for<along_ahead_bytes>(src + l + i * ld);
+    for (int i = 0; i < w; i++) ask_for(src + l + i * ld, w * ld);
     for (int s = 0; s < line; s += step) block(l + s);
   }
   for (; l + step <= depth; l += step) block(l);
