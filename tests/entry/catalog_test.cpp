@@ -5,9 +5,11 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
+#include <iterator>
 #include <string>
 
 #include "service/messages.h"
@@ -114,6 +116,20 @@ TEST_F(Catalog, what_is_no_catalogue_is_not_used) {
   EXPECT_EQ(message_6(), builtin_6);
   write("1033", std::string(4096, '\xFF'));
   EXPECT_EQ(message_6(), builtin_6);
+}
+
+// Such a machine writes the three words of the header in its own order; the tables behind it stand there in both.
+TEST_F(Catalog, a_catalogue_from_a_machine_of_the_other_byte_order_is_used) {
+  make("1033", "6 parameter %d of %s is bad\n");
+  std::fstream file(directory_ / "1033" / "qtb_msg.cat", std::ios::in | std::ios::out | std::ios::binary);
+  char header[12];
+  file.read(header, sizeof header);
+  for (char *word = header; word != std::end(header); word += 4) std::reverse(word, word + 4);
+  file.seekp(0);
+  file.write(header, sizeof header);
+  file.close();
+  ASSERT_TRUE(file.good());
+  EXPECT_EQ(message_6(), "parameter 3 of DGEMM  is bad\n");
 }
 
 // A cut catalogue is none, or all of its text was before the cut.
