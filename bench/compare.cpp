@@ -77,7 +77,7 @@ bool failed(Outcome outcome) { return outcome == Outcome::wrong || outcome == Ou
 
 // One case: its row in the table and in the file. False where a side failed.
 bool compare(const Options &options, const Case &item, std::FILE *csv) {
-  const bool has_peer = !options.peer.library.empty();
+  const bool has_peer = !options.peer.path.empty();
   std::vector<Side> sides = {options.ours};
   if (has_peer) sides.push_back(options.peer);
   const std::vector<Measurement> measured = measure_in_turn(sides, item.prepare, options.turns, options.seconds);
@@ -206,9 +206,9 @@ Options parse(int argc, char **argv) {
     if (i + 1 >= argc) fail("no value for " + key);
     const std::string value = argv[i + 1];
     if (key == "--library")
-      options.ours.library = value;
+      options.ours.path = value;
     else if (key == "--peer")
-      options.peer.library = value;
+      options.peer.path = value;
     else if (key == "--setting")
       options.ours.settings.push_back(value);
     else if (key == "--peer-setting")
@@ -240,12 +240,12 @@ Options parse(int argc, char **argv) {
     else
       fail("unknown option " + key);
   }
-  if (options.ours.library.empty()) fail("--library is needed");
+  if (options.ours.path.empty()) fail("--library is needed");
   for (const std::string &letters : options.letters)
     if (letters.size() != 2 || letters.find_first_not_of("NTC") != letters.npos) fail("no such options: " + letters);
   if (options.sizes.empty() && options.shapes.empty()) options.sizes = {4000};
-  if (options.peer.library == "self")
-    options.peer.library = options.ours.library;
+  if (options.peer.path == "self")
+    options.peer.path = options.ours.path;
   else
     options.peer.wide = false;
   // What both sides have in common comes first, so that the settings of a side go before it.

@@ -59,7 +59,7 @@ void send_report(int channel, const Report &report) {
 [[noreturn]] void serve(const Side &side, const Prepare &prepare, int channel) {
   prctl(PR_SET_PDEATHSIG, SIGKILL);
   for (const std::string &setting : side.settings) set_environment(setting);
-  const Library library = load_library(side.library, side.wide);
+  const Library library = load_library(side.path, side.wide);
   const Prepared prepared = prepare(library);
   if (!prepared.calls || !prepared.correct) {
     send_report(channel, {prepared.calls ? Outcome::wrong : Outcome::absent, 0, 0});

@@ -15,7 +15,7 @@
 namespace qtb::bench {
 
 struct Side {
-  std::string library;
+  std::string path;                   // of the shared library
   bool wide = true;                   // as in Library
   std::vector<std::string> settings;  // NAME=VALUE for the environment, set before the library is loaded
 };

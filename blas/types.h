@@ -33,6 +33,22 @@ using Real = typename ElementTraits<T>::Part;
 template <class T>
 inline constexpr bool is_complex = ElementTraits<T>::is_complex;
 
+// Whether an element is exactly 0 or 1. A NaN is neither. Inlined always, so that no build emits a procedure.
+template <class T>
+[[gnu::always_inline]] constexpr bool is_zero(T v) {
+  if constexpr (is_complex<T>)
+    return v.re == 0 && v.im == 0;
+  else
+    return v == 0;
+}
+template <class T>
+[[gnu::always_inline]] constexpr bool is_one(T v) {
+  if constexpr (is_complex<T>)
+    return v.re == 1 && v.im == 0;
+  else
+    return v == 1;
+}
+
 // Hidden: a name with C linkage that the library's own parts share and that the shared library does not export.
 #if defined(_WIN32)
 #define QTB_HIDDEN

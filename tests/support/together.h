@@ -1,7 +1,8 @@
-// Threads that begin a piece of a test at the same moment.
+// Threads of this process: some that begin a piece of a test at the same moment, and how many there are.
 #pragma once
 
 #include <atomic>
+#include <cstdio>
 #include <thread>
 #include <vector>
 
@@ -18,6 +19,16 @@ void on_threads(int count, Body body) {
       body(i);
     });
   for (std::thread &thread : threads) thread.join();
+}
+
+inline int threads_of_this_process() {
+  int threads = 0;
+  char line[256];
+  std::FILE *const status = std::fopen("/proc/self/status", "r");
+  while (status != nullptr && std::fgets(line, sizeof line, status) != nullptr)
+    std::sscanf(line, "Threads: %d", &threads);
+  if (status != nullptr) std::fclose(status);
+  return threads;
 }
 
 }  // namespace qtb::test

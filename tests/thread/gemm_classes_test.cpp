@@ -12,6 +12,7 @@
 #include <vector>
 
 #include "blas/thread/drivers.h"
+#include "tests/support/together.h"
 #include "tests/thread/checked_memory.h"
 #include "tests/thread/gemm_machines.h"
 #include "tests/thread/gemm_problem.h"
@@ -112,16 +113,6 @@ TEST(GemmClasses, SmallSizesInSingleComplex) { small_sizes<cfloat>(); }
 TEST(GemmClasses, SmallSizesInDoubleComplex) { small_sizes<cdouble>(); }
 
 // ---- Sizes of each outcome but the largest ----
-
-int threads_of_this_process() {
-  int threads = 0;
-  char line[256];
-  std::FILE *const status = std::fopen("/proc/self/status", "r");
-  while (status != nullptr && std::fgets(line, sizeof line, status) != nullptr)
-    std::sscanf(line, "Threads: %d", &threads);
-  if (status != nullptr) std::fclose(status);
-  return threads;
-}
 
 template <class T>
 void middle_sizes() {

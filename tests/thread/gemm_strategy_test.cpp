@@ -130,6 +130,15 @@ Planned<T> on_grid(QtbInt t, QtbInt rows) {
 }
 
 template <class T>
+Planned<T> in_pairs(QtbInt t, QtbInt rows) {
+  Planned<T> p = on_grid<T>(t, rows);
+  p.plan.strategy = Named<T>::pairs;
+  p.plan.b_buffers = static_cast<std::int32_t>(t);
+  p.plan.nb = 16;
+  return p;
+}
+
+template <class T>
 std::vector<Outcome<T>> outcomes() {
   using Slots = GemmSlots<T>;
   std::vector<Outcome<T>> all;
@@ -191,28 +200,22 @@ std::vector<Outcome<T>> outcomes() {
   if constexpr (is_complex<T>) {
     if (ssse3 || sse42)
       all.push_back({"pairs", true, [](QtbInt t, QtbInt rows) {
-                       Planned<T> p = on_grid<T>(t, rows);
-                       p.plan.strategy = Named<T>::pairs;
+                       Planned<T> p = in_pairs<T>(t, rows);
                        p.plan.kernel.bpacked = Slots::bpacked;
                        p.panels.blocks = Slots::blocks;
                        p.panels.bcopy_n = Slots::bcopy_n;
                        p.panels.bcopy_t = Slots::bcopy_t;
                        p.panels.bcopy_c = Slots::bcopy_c;
-                       p.plan.b_buffers = static_cast<std::int32_t>(t);
-                       p.plan.nb = 16;
                        return p;
                      }});
     if (ssse3)
       all.push_back({"pairs sse41", true, [](QtbInt t, QtbInt rows) {
-                       Planned<T> p = on_grid<T>(t, rows);
-                       p.plan.strategy = Named<T>::pairs;
+                       Planned<T> p = in_pairs<T>(t, rows);
                        p.plan.kernel.bpacked = Slots::sse41;
                        p.panels.blocks = Slots::sse41_blocks;
                        p.panels.bcopy_n = Slots::sse41_bcopy_n;
                        p.panels.bcopy_t = Slots::sse41_bcopy_t;
                        p.panels.bcopy_c = Slots::sse41_bcopy_c;
-                       p.plan.b_buffers = static_cast<std::int32_t>(t);
-                       p.plan.nb = 16;
                        return p;
                      }});
   }

@@ -8,7 +8,6 @@
 #include <unistd.h>
 
 #include <atomic>
-#include <cstdio>
 #include <cstdlib>
 #include <map>
 #include <string>
@@ -196,16 +195,6 @@ TEST(GemmTeams, InsideARegionInDynamicMode) {
 }
 
 // ---- Forked children ----
-
-int threads_of_this_process() {
-  int threads = 0;
-  char line[256];
-  std::FILE *const status = std::fopen("/proc/self/status", "r");
-  while (status != nullptr && std::fgets(line, sizeof line, status) != nullptr)
-    std::sscanf(line, "Threads: %d", &threads);
-  if (status != nullptr) std::fclose(status);
-  return threads;
-}
 
 TEST(GemmTeams, ForkedChildComputesOnItsOneThread) {
   omp_set_num_threads(4);

@@ -27,14 +27,6 @@ struct Update {
   }
 };
 
-template <class T>
-bool is_zero(T v) {
-  if constexpr (is_complex<T>)
-    return v.re == 0 && v.im == 0;
-  else
-    return v == 0;
-}
-
 template <Row row, class T>
 void axpy(const QtbInt *n, const T *alpha, const T *x, const QtbInt *incx, T *y, const QtbInt *incy) {
   if (*n < 1 || is_zero(*alpha)) return;

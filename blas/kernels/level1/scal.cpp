@@ -28,14 +28,6 @@ struct Scaling {
   }
 };
 
-template <class T>
-bool is_one(T v) {
-  if constexpr (is_complex<T>)
-    return v.re == 1 && v.im == 0;
-  else
-    return v == 1;
-}
-
 template <Row row, class T>
 void scal(const QtbInt *n, const T *alpha, T *x, const QtbInt *incx) {
   if (*n < 1) return;

@@ -95,22 +95,6 @@ T conjugate_if(T v) {
   return conjugated ? conjugate(v) : v;
 }
 
-// A NaN is neither.
-template <class T>
-bool is_zero(T v) {
-  if constexpr (is_complex<T>)
-    return v.re == 0 && v.im == 0;
-  else
-    return v == 0;
-}
-template <class T>
-bool is_one(T v) {
-  if constexpr (is_complex<T>)
-    return v.re == 1 && v.im == 0;
-  else
-    return v == 1;
-}
-
 // ---- Vectors ----
 
 // Element i of a vector of the interface, counted along its direction.

@@ -59,13 +59,6 @@ T scalar(Scalar v) {
   else
     return static_cast<T>(v.re);
 }
-template <class T>
-bool is_zero(T v) {
-  if constexpr (is_complex<T>)
-    return v.re == 0 && v.im == 0;
-  else
-    return v == 0;
-}
 
 struct Problem {
   std::uint64_t seed = 0;  // of the contents

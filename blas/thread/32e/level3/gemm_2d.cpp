@@ -48,10 +48,13 @@ void gemm_2d_xgemm_p(QTB_PARAMS_GEMM_STRATEGY(T)) {
   }
 }
 
-// The panel of a group or pair, in steps of bytes that keep it aligned to an element.
+// Shared panels begin at multiples of this behind the first, so that their elements stay aligned.
+constexpr QtbInt panel_step_bytes = 8;
+
+// The panel of a group or pair.
 template <class T>
 T *shared_panel(T *panels, QtbInt number, QtbInt bytes) {
-  return panels + multiple_below(number * bytes, 8) / static_cast<QtbInt>(sizeof(T));
+  return panels + multiple_below(number * bytes, panel_step_bytes) / static_cast<QtbInt>(sizeof(T));
 }
 
 // Where a group's depth is small against its size, its threads pack rows of the block, else depths of it. The shares

@@ -42,22 +42,6 @@ struct ThisProcessor {
 
 constexpr bool is_letter(char given, char letter) { return given == letter || given == letter + ('a' - 'A'); }
 
-template <class T>
-bool is_zero(T v) {
-  if constexpr (is_complex<T>)
-    return v.re == 0 && v.im == 0;
-  else
-    return v == 0;
-}
-// A NaN is not one: it scales.
-template <class T>
-bool is_one(T v) {
-  if constexpr (is_complex<T>)
-    return v.re == 1 && v.im == 0;
-  else
-    return v == 1;
-}
-
 // The panels that threads share, from the memory service; null until one thread has allocated them.
 struct SharedPanels {
   void *a, *b;
@@ -121,8 +105,9 @@ template <class T>
   qtb_serv_get_cache_sizes(plan.cache);
   plan.machine_class = gemm_machine_class(tier, plan.cache, ThisProcessor{});
   if (threads <= 1) {
-    if (!is_complex<T> && plan.machine_class == machine_sse41_small_l2 && omp_in_parallel() != 0)
-      return gemm_in_slices<T>(QTB_ARGS(gemm));
+    if constexpr (!is_complex<T>)
+      if (plan.machine_class == machine_sse41_small_l2 && omp_in_parallel() != 0)
+        return gemm_in_slices<T>(QTB_ARGS(gemm));
     return GemmSlots<T>::gemm(QTB_ARGS(gemm));
   }
 

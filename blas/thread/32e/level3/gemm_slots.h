@@ -23,9 +23,8 @@ struct GemmSlots;
 #define QTB_GEMM_SLOTS_REAL(t)                                  \
   QTB_GEMM_SLOTS(t)                                             \
   static constexpr auto nobcopy = &qtb_blas_x##t##gemm_nobcopy; \
-  /* A conjugate transpose is a transpose. */                   \
-  static constexpr auto sse41_acopy_c = sse41_acopy_t;          \
-  static constexpr auto sse41_bcopy_c = sse41_bcopy_t;
+  /* A real element is its own conjugate. */                    \
+  static constexpr decltype(sse41_acopy_t) sse41_acopy_c = nullptr, sse41_bcopy_c = nullptr;
 
 #define QTB_GEMM_SLOTS_COMPLEX(t)                                           \
   QTB_GEMM_SLOTS(t)                                                         \
