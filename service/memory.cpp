@@ -47,18 +47,20 @@ std::atomic<std::int32_t> mm_disabled{-1};
 std::atomic<std::int32_t> mm_list_count{0};
 MemThreadList *mm_lists[list_limit + 2];  // from index 1; under the lock
 
-bool fast_path_disabled() {
-  if (mm_config_state.load(acquire) == -1) {
-    qtb_serv_lock();
-    if (mm_config_state.load(relaxed) == -1) {
-      char value[16];
-      const bool set = platform_environment("QTB_DISABLE_FAST_MM", value, sizeof value) != 0 ||
-                       platform_environment("QTB_MM_DISABLE", value, sizeof value) != 0;
-      mm_disabled.store(set, relaxed);
-      mm_config_state.store(1, release);
-    }
-    qtb_serv_unlock();
+[[gnu::noinline, gnu::cold]] void read_switches() {
+  qtb_serv_lock();
+  if (mm_config_state.load(relaxed) == -1) {
+    char value[16];
+    const bool set = platform_environment("QTB_DISABLE_FAST_MM", value, sizeof value) != 0 ||
+                     platform_environment("QTB_MM_DISABLE", value, sizeof value) != 0;
+    mm_disabled.store(set, relaxed);
+    mm_config_state.store(1, release);
   }
+  qtb_serv_unlock();
+}
+
+bool fast_path_disabled() {
+  if (mm_config_state.load(acquire) == -1) read_switches();
   return mm_disabled.load(relaxed) == 1;
 }
 

@@ -91,14 +91,6 @@ struct CallersPanel {
   QtbInt ldp = 0;
 };
 
-// Scales C. False where that is all there is to do: no rows or columns, or an alpha of 0, which reads neither A nor B.
-template <class T>
-bool begin_product(const Product<T> &p, const T *beta) {
-  if (p.m < 1 || p.n < 1) return false;
-  if (!is_one(*beta)) scale_columns<T>(&p.m, &p.n, beta, p.c, &p.ldc);
-  return !is_zero(p.alpha);
-}
-
 template <class T>
 bool is_small(const Product<T> &p, SmallLimits limits) {
   return p.m < limits.m || p.n < limits.n || p.k < limits.k;
@@ -116,13 +108,26 @@ template <class T>
 void run_small(const Product<T> &p, bool a_is_n, bool b_is_n, QtbInt i0, QtbInt j0, QtbInt n, QtbInt l0, QtbInt k,
                T beta) {
   const QtbInt m = p.m - i0;
-  if (m <= 0) return;
   small_path<T>(p.transa, p.transb, &m, &n, &k, &p.alpha, p.a + (a_is_n ? i0 + l0 * p.lda : l0 + i0 * p.lda), &p.lda,
                 p.b + (b_is_n ? l0 + j0 * p.ldb : j0 + l0 * p.ldb), &p.ldb, &beta, p.c + i0 + j0 * p.ldc, &p.ldc);
 }
 template <class T>
 void add_small(const Product<T> &p, bool a_is_n, bool b_is_n, QtbInt i0, QtbInt j0, QtbInt n, QtbInt l0, QtbInt k) {
   run_small(p, a_is_n, b_is_n, i0, j0, n, l0, k, one_of(p.alpha));
+}
+
+// Scales C. False where nothing is left to do: no rows or columns, an alpha of 0, which reads neither A nor B, or a
+// small problem, which takes the small path whole.
+template <class T>
+bool begin_product(const Product<T> &p, const T *beta, SmallLimits limits) {
+  if (p.m < 1 || p.n < 1) return false;
+  const bool multiplies = !is_zero(p.alpha);
+  if (multiplies && is_small(p, limits)) {
+    run_small(p, read_op<T>(p.transa) == Op::none, read_op<T>(p.transb) == Op::none, 0, 0, p.n, 0, p.k, *beta);
+    return false;
+  }
+  if (!is_one(*beta)) scale_columns<T>(&p.m, &p.n, beta, p.c, &p.ldc);
+  return multiplies;
 }
 
 template <class T, Family family>
@@ -211,7 +216,7 @@ void add_blocks(const Product<T> &p, GemmBlocks blocks, CallersPanel<T> given_a,
           run_kernel_on_slice<T, family>(aligned, l0, m, n, kp, given_a.panels, given_a.ldp, given_b.panels,
                                          given_b.ldp, c, p.ldc, buffers.stage);
       }
-      add_small(p, a_is_n, b_is_n, full_m, j0, n, l0, k);
+      if (full_m < p.m) add_small(p, a_is_n, b_is_n, full_m, j0, n, l0, k);
     }
   }
   free_buffers(buffers);
@@ -242,17 +247,9 @@ void add_blocks_in_place(const Product<T> &p, GemmBlocks blocks) {
       else
         InPlaceKernel<T, family>::run(!b_is_n, m, p.n, k, buffers.a, step_a, b, p.ldb, p.c + i0, p.ldc, buffers.stage);
     }
-    add_small(p, a_is_n, b_is_n, full_m, 0, p.n, l0, k);
+    if (full_m < p.m) add_small(p, a_is_n, b_is_n, full_m, 0, p.n, l0, k);
   }
   free_buffers(buffers);
-}
-
-// The rest of a body, once C is scaled.
-template <class T, Family family>
-void add_product(const Product<T> &p) {
-  if (is_small(p, limits_of<T, family, BodyForm::full>))
-    return add_small(p, read_op<T>(p.transa) == Op::none, read_op<T>(p.transb) == Op::none, 0, 0, p.n, 0, p.k);
-  add_blocks<T, family, false, false>(p, body_blocks<T, family>(p), {}, {});
 }
 
 }  // namespace

@@ -37,9 +37,14 @@ Product<T> product(const char *transa, const char *transb, const QtbInt *m, cons
 }
 
 template <class T, Family family>
-void add_product_in_place(const Product<T> &p) {
-  if (is_small(p, limits_of<T, family, BodyForm::b_in_place>))
-    return add_small(p, read_op<T>(p.transa) == Op::none, read_op<T>(p.transb) == Op::none, 0, 0, p.n, 0, p.k);
+void multiply(const Product<T> &p, const T *beta) {
+  if (begin_product(p, beta, limits_of<T, family, BodyForm::full>))
+    add_blocks<T, family, false, false>(p, body_blocks<T, family>(p), {}, {});
+}
+
+template <class T, Family family>
+void multiply_in_place(const Product<T> &p, const T *beta) {
+  if (!begin_product(p, beta, limits_of<T, family, BodyForm::b_in_place>)) return;
   GemmBlocks blocks = body_blocks<T, family>(p);
   if constexpr (family == Family::sse41) {
     // This body's own rows, whatever the family's rule says.
@@ -75,41 +80,41 @@ consteval QtbInt find_in_place_rule(char kind, ProcessorTier tier) {
 }
 
 template <class T, Family family>
-void add_product_by_slice(const Product<T> &p) {
+void multiply_by_slice(const Product<T> &p, const T *beta) {
   constexpr QtbInt found = find_in_place_rule(kind_of<T>, this_tier);
   if constexpr (found >= 0) {
     constexpr InPlaceRule rule = in_place_rules[found];
     const QtbInt slice = smaller(p.k, largest_depth) * smaller(p.n, rule.columns) * static_cast<QtbInt>(sizeof(T));
-    if (slice <= rule.most_bytes) return add_product_in_place<T, family>(p);
+    if (slice <= rule.most_bytes) return multiply_in_place<T, family>(p, beta);
   }
-  add_product<T, family>(p);
+  multiply<T, family>(p, beta);
 }
 
 template <class T>
 QTB_FUNCTION(gemm, T, gemm) {
   const Product<T> p = product(transa, transb, m, n, k, alpha, a, lda, b, ldb, c, ldc);
-  if (!begin_product(p, beta)) return;
 #if QTB_TIER_IS(ssse3)
-  if constexpr (is_complex<T>)
-    if (is_small(p, limits_of<T, Family::base, BodyForm::full>)) return add_product<T, Family::base>(p);
-  if (qtb_serv_cpu_has_sse41() != 0) return add_product_by_slice<T, Family::sse41>(p);
+  // Small to all bodies, these being the least of the limits: the processor need not be asked.
+  constexpr SmallLimits least = limits_of<T, Family::base, BodyForm::b_in_place>;
+  if (is_small(p, least)) {
+    begin_product(p, beta, least);
+    return;
+  }
+  if (qtb_serv_cpu_has_sse41() != 0) return multiply_by_slice<T, Family::sse41>(p, beta);
 #endif
-  add_product_by_slice<T, Family::base>(p);
+  multiply_by_slice<T, Family::base>(p, beta);
 }
 
 template <class T, Family family>
 QTB_FUNCTION(gemm, T, gemm_in_place) {
-  const Product<T> p = product(transa, transb, m, n, k, alpha, a, lda, b, ldb, c, ldc);
-  if (begin_product(p, beta)) add_product_in_place<T, family>(p);
+  multiply_in_place<T, family>(product(transa, transb, m, n, k, alpha, a, lda, b, ldb, c, ldc), beta);
 }
 
 // With one panel or both from the caller.
 template <class T, Family family, BodyForm form, bool a_given, bool b_given>
 void gemm_with_panels(const Product<T> &p, const T *beta, CallersPanel<T> a, CallersPanel<T> b) {
-  if (!begin_product(p, beta)) return;
-  if (is_small(p, limits_of<T, family, form>))
-    return add_small(p, read_op<T>(p.transa) == Op::none, read_op<T>(p.transb) == Op::none, 0, 0, p.n, 0, p.k);
-  add_blocks<T, family, a_given, b_given>(p, body_blocks<T, family>(p), a, b);
+  if (begin_product(p, beta, limits_of<T, family, form>))
+    add_blocks<T, family, a_given, b_given>(p, body_blocks<T, family>(p), a, b);
 }
 
 template <class T, Family family = Family::base>

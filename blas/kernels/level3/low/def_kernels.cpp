@@ -31,9 +31,10 @@ inline void ask_for_rows(const double *a) {
     _mm_prefetch(reinterpret_cast<const char *>(a) + ahead, _MM_HINT_T0);
 }
 
+// Not inlined, so that a call computes what its own width needs.
 template <Steps steps, int columns>
-void run_columns(QtbInt m, QtbInt kp, const double *ap, QtbInt ldap, const double *bp, double *c, QtbInt ldc,
-                 double *stage) {
+[[gnu::noinline]] void run_columns(QtbInt m, QtbInt kp, const double *ap, QtbInt ldap, const double *bp, double *c,
+                                   QtbInt ldc, double *stage) {
   fill_stage<double, columns>(kp, {bp, kp, columns, 1}, stage);
   for (QtbInt i0 = 0; i0 < m; i0 += tile_rows, ap += ldap, c += tile_rows) {
     ask_for_rows(ap);

@@ -41,7 +41,7 @@ void add_wide(const Product<double> &p) {
         copy_a(&m, &depth, p.a + (a_is_n ? i0 + l0 * p.lda : l0 + i0 * p.lda), &p.lda, buffers.a, &step_a, &p.alpha);
         kernel(m, n, kp, buffers.a, step_a, buffers.b, step_b, p.c + i0 + j0 * p.ldc, p.ldc, buffers.stage);
       }
-      add_small(p, a_is_n, b_is_n, full_m, j0, n, l0, depth);
+      if (full_m < p.m) add_small(p, a_is_n, b_is_n, full_m, j0, n, l0, depth);
     }
   }
   free_buffers(buffers);
@@ -85,10 +85,7 @@ void add_for_processor(const Product<double> &p) {
 template <void (*add)(const Product<double> &)>
 QTB_FUNCTION(gemm, double, gemm) {
   const Product<double> p = {transa, transb, *m, *n, *k, *alpha, a, *lda, b, *ldb, c, *ldc};
-  if (!begin_product(p, beta)) return;
-  if (is_small(p, limits_of<double, Family::base, BodyForm::full>))
-    return add_small(p, read_op<double>(transa) == Op::none, read_op<double>(transb) == Op::none, 0, 0, p.n, 0, p.k);
-  add(p);
+  if (begin_product(p, beta, limits_of<double, Family::base, BodyForm::full>)) add(p);
 }
 
 }  // namespace

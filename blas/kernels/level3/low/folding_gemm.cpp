@@ -75,7 +75,7 @@ QTB_FUNCTION(gemm, T, gemm) {
                ? kernels.one_fixed
                : kernels.one)(rows, columns, kp, buffers.a, step_a, buffers.b, step_b, tile, p.ldc, buffers.stage);
       }
-      run_small(p, a_is_n, b_is_n, full_m, j0, columns, l0, depth, block_beta);
+      if (full_m < p.m) run_small(p, a_is_n, b_is_n, full_m, j0, columns, l0, depth, block_beta);
     }
   }
   free_buffers(buffers);
