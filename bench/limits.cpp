@@ -92,6 +92,41 @@ void copy_vectors(const __m128i *from, __m128i *to, std::size_t count) {
   }
 }
 
+// The arithmetic of the loops above with a few other instructions among it, each ahead of a product whose register it
+// writes, so that nothing waits for a chain longer than those above. The block holds zeros.
+// clang-format off
+#define QTB_DOUBLE(a, b) QTB_PAIR("pd", a, b)
+#define QTB_WIDE_DOUBLE(a, b) QTB_WIDE_PAIR("pd", a, b)
+#define QTB_MIX(pair, other_0, other_4) \
+  other_0 pair(0, 8) pair(1, 9) pair(2, 10) pair(3, 11) other_4 pair(4, 12) pair(5, 13) pair(6, 14) pair(7, 15)
+#define QTB_SHUFFLE(r) "pshufd $0x4e, (%1), %%xmm" #r "\n\t"
+#define QTB_INSERT(r, from) "vinsertf128 $1, 16(%1), %%ymm" #from ", %%ymm" #r "\n\t"
+#define QTB_PAIR_FROM_MEMORY(at, sum, x) \
+  "movaps %%xmm15, %%xmm" #x "\n\tmulpd " #at "(%1), %%xmm" #x "\n\taddpd %%xmm" #x ", %%xmm" #sum "\n\t"
+#define QTB_THIRTEEN_LOADS \
+  QTB_LOAD(0, 15) \
+  QTB_PAIR_FROM_MEMORY(16, 0, 12) QTB_PAIR_FROM_MEMORY(32, 1, 13) QTB_PAIR_FROM_MEMORY(48, 2, 14) \
+  QTB_PAIR_FROM_MEMORY(64, 3, 12) QTB_PAIR_FROM_MEMORY(80, 4, 13) QTB_PAIR_FROM_MEMORY(96, 5, 14) \
+  QTB_PAIR_FROM_MEMORY(112, 6, 12) QTB_PAIR_FROM_MEMORY(128, 7, 13) QTB_PAIR_FROM_MEMORY(144, 8, 14) \
+  QTB_PAIR_FROM_MEMORY(160, 9, 12) QTB_PAIR_FROM_MEMORY(176, 10, 13) QTB_PAIR_FROM_MEMORY(192, 11, 14)
+// clang-format on
+// Several steps to a turn of the loop, as the kernels have them.
+constexpr double mix_steps = 4;
+#define QTB_STEPS(step) QTB_LOOP(step step step step)
+#define QTB_ON_BLOCK(count) : "+r"(count) : "r"(block) : QTB_CLOBBERED
+
+void one_shuffle_loop(long count) {
+  asm volatile(QTB_CLEAR_ALL QTB_STEPS(QTB_MIX(QTB_DOUBLE, QTB_SHUFFLE(0), "")) QTB_ON_BLOCK(count));
+}
+void two_shuffles_loop(long count) {
+  asm volatile(QTB_CLEAR_ALL QTB_STEPS(QTB_MIX(QTB_DOUBLE, QTB_SHUFFLE(0), QTB_SHUFFLE(4))) QTB_ON_BLOCK(count));
+}
+[[gnu::target("avx")]] void two_wide_inserts_loop(long count) {
+  asm volatile("vzeroall\n\t" QTB_STEPS(
+      QTB_MIX(QTB_WIDE_DOUBLE, QTB_INSERT(0, 8), QTB_INSERT(4, 12))) "\n\tvzeroupper" QTB_ON_BLOCK(count));
+}
+void thirteen_loads_loop(long count) { asm volatile(QTB_CLEAR_ALL QTB_STEPS(QTB_THIRTEEN_LOADS) QTB_ON_BLOCK(count)); }
+
 }  // namespace
 
 CoreLimits measure_core_limits() {
@@ -105,6 +140,18 @@ CoreLimits measure_core_limits() {
   limits.load_rate = best_rate(load_loop, instructions);
   limits.store_rate = best_rate(store_loop, instructions);
   return limits;
+}
+
+MixShares measure_mix_shares() {
+  MixShares shares{};
+  const double rate = best_rate(double_loop, instructions);
+  shares.one_shuffle = best_rate(one_shuffle_loop, mix_steps * instructions) / rate;
+  shares.two_shuffles = best_rate(two_shuffles_loop, mix_steps * instructions) / rate;
+  shares.thirteen_loads = best_rate(thirteen_loads_loop, mix_steps * 24) / rate;
+  if (__builtin_cpu_supports("avx") != 0)
+    shares.two_wide_inserts =
+        best_rate(two_wide_inserts_loop, mix_steps * instructions) / best_rate(wide_double_loop, instructions);
+  return shares;
 }
 
 double measure_copy_bandwidth(std::size_t bytes, int threads) {

@@ -17,6 +17,18 @@ struct CoreLimits {
 
 CoreLimits measure_core_limits();
 
+// The shares of the arithmetic rate that are left where other instructions stand between the products and sums, still
+// without dependences to wait for and with all data in the first-level cache. What the design of an inner kernel puts
+// into a step of depth cannot be faster.
+struct MixShares {
+  double one_shuffle;       // beside 16 products and sums
+  double two_shuffles;      // beside 16
+  double two_wide_inserts;  // of the upper half from memory, beside 16 of 32 bytes; 0 where the processor has none
+  double thirteen_loads;    // beside 24
+};
+
+MixShares measure_mix_shares();
+
 // Bytes read and written per second by a plain copy loop (16-byte loads and ordinary stores, as the kernels have them)
 // over arrays of so many bytes, which should be far larger than the caches, on one thread or on several.
 double measure_copy_bandwidth(std::size_t bytes, int threads);

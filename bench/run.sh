@@ -3,9 +3,10 @@
 # charts and the summary (summary.md) are kept in BUILD_FOLDER/bench-results.
 #
 # Environment:
-#   BENCH_PARTS            what to run (default: slot level1 gemm threads balance)
+#   BENCH_PARTS            what to run (default: slot level1 kernels gemm threads balance)
 #                            slot     what a dispatch slot costs
 #                            level1   Level 1 on one thread and on all, and beside the peer
+#                            kernels  the inner kernels of matrix products, beside what their instructions allow
 #                            gemm     matrix products on one thread, beside the peer
 #                            threads  matrix products on all threads, beside one thread and beside the peer
 #                            balance  how evenly matrix products are cut over up to 64 threads (nothing is timed)
@@ -19,7 +20,7 @@ set -eu
 build=$1
 results=$build/bench-results
 all_tiers='def sse3 ssse3 sse42 avx' # in the order of their numbers
-parts=${BENCH_PARTS:-slot level1 gemm threads balance}
+parts=${BENCH_PARTS:-slot level1 kernels gemm threads balance}
 tiers=${BENCH_TIERS:-$all_tiers}
 threads=$(nproc)
 products=sgemm,dgemm,cgemm,zgemm
@@ -79,6 +80,11 @@ part_level1() {
   [ -n "${PEER:-}" ] || return 0
   heading "Level 1, one thread, beside $PEER"
   beside_peer vectors --threads 1 --sizes 8,32,100,4000,32000
+}
+
+part_kernels() {
+  heading 'the inner kernels of products alone'
+  "$build/bench/inner_kernels" | tee "$results/kernels-$tier.txt"
 }
 
 part_gemm() {

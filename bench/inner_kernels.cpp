@@ -1,0 +1,168 @@
+// inner_kernels: the inner kernels of GEMM alone, beside what their designs allow.
+//
+// Each kernel of the process's tier multiplies panels that lie in the second cache level, over the depth of a block of
+// its family. A row has its rate, the share that this is of the arithmetic rate of a core with the same vectors
+// (CoreLimits), and the most that the instructions of its step leave of that (MixShares). What a whole product has less
+// than its kernel goes to packing, to the small path and to the far caches. QTB_DEBUG_CPU_TYPE chooses the tier.
+
+#include <algorithm>
+#include <cstdio>
+#include <cstring>
+#include <type_traits>
+
+#include "bench/limits.h"
+#include "bench/memory.h"
+#include "bench/timing.h"
+#include "service/cpu.h"
+
+namespace qtb::bench {
+namespace {
+
+template <class T>
+using Kernel = void(QtbInt m, QtbInt n, QtbInt kp, const T *ap, QtbInt ldap, const T *bp, QtbInt ldbp, T *c, QtbInt ldc,
+                    T *stage);
+using EdgeKernel = void(QtbInt m, QtbInt n, QtbInt k, const double *a, QtbInt lda, const double *b, QtbInt ldb,
+                        double *c, QtbInt ldc, const double *alpha, const double *beta_lanes);
+
+extern "C" {
+Kernel<float> qtb_blas_def_sgemm_kernel_112, qtb_blas_sse3_sgemm_kernel_112, qtb_blas_ssse3_sgemm_kernel,
+    qtb_blas_ssse3_sgemm_kernel_sse41_ca, qtb_blas_sse42_sgemm_kernel_ca, qtb_blas_avx_sgemm_kernel_ca;
+Kernel<double> qtb_blas_def_dgemm_kernel_128, qtb_blas_ssse3_dgemm_kernel, qtb_blas_ssse3_dgemm_kernel_sse41_ca,
+    qtb_blas_sse42_dgemm_kernel_ca, qtb_blas_avx_dgemm_kernel, qtb_blas_def_dgemm_def_kernel;
+EdgeKernel qtb_blas_sse3_dgemm_kernel_a112;
+Kernel<cfloat> qtb_blas_def_cgemm_kernel_64, qtb_blas_sse3_cgemm_kernel_64, qtb_blas_ssse3_cgemm_kernel,
+    qtb_blas_ssse3_cgemm_kernel_sse41_ca, qtb_blas_sse42_cgemm_kernel_ca, qtb_blas_avx_cgemm_kernel_ca;
+Kernel<cdouble> qtb_blas_def_zgemm_kernel_64, qtb_blas_sse3_zgemm_kernel_64, qtb_blas_ssse3_zgemm_kernel,
+    qtb_blas_ssse3_zgemm_kernel_sse41_ca, qtb_blas_sse42_zgemm_kernel_ca, qtb_blas_avx_zgemm_kernel_ca;
+}
+
+// The one that takes other arguments. It reads neither alpha nor beta.
+void sse3_dgemm_kernel_a112(QtbInt m, QtbInt n, QtbInt kp, const double *ap, QtbInt ldap, const double *bp, QtbInt ldbp,
+                            double *c, QtbInt ldc, double *) {
+  qtb_blas_sse3_dgemm_kernel_a112(m, n, kp, ap, ldap, bp, ldbp, c, ldc, nullptr, nullptr);
+}
+
+// What limits a step: arithmetic alone or a mix, and the width of the vectors.
+enum class Step { arithmetic, one_shuffle, two_shuffles, two_wide_inserts, thirteen_loads };
+
+double share_left(const MixShares &mixes, Step step) {
+  switch (step) {
+    case Step::arithmetic: return 1;
+    case Step::one_shuffle: return mixes.one_shuffle;
+    case Step::two_shuffles: return mixes.two_shuffles;
+    case Step::two_wide_inserts: return mixes.two_wide_inserts;
+    case Step::thirteen_loads: return mixes.thirteen_loads;
+  }
+  return 0;
+}
+
+const char *text(Step step) {
+  switch (step) {
+    case Step::arithmetic: return "arithmetic alone";
+    case Step::one_shuffle: return "a shuffle beside 16";
+    case Step::two_shuffles: return "two shuffles beside 16";
+    case Step::two_wide_inserts: return "two inserts beside 16";
+    case Step::thirteen_loads: return "13 loads beside 24";
+  }
+  return "";
+}
+
+template <class T>
+struct Listed {
+  ProcessorTier tier;
+  const char *name;
+  Kernel<T> *kernel;
+  QtbInt mr, nr, depth;
+  Step step;
+};
+
+// clang-format off
+constexpr Listed<float> single_kernels[] = {
+    {tier_def,   "sgemm_kernel_112",       qtb_blas_def_sgemm_kernel_112,        8, 4, 112, Step::arithmetic},
+    {tier_sse3,  "sgemm_kernel_112",       qtb_blas_sse3_sgemm_kernel_112,       8, 4, 112, Step::arithmetic},
+    {tier_ssse3, "sgemm_kernel",           qtb_blas_ssse3_sgemm_kernel,          8, 4, 256, Step::arithmetic},
+    {tier_ssse3, "sgemm_kernel_sse41_ca",  qtb_blas_ssse3_sgemm_kernel_sse41_ca, 8, 4, 256, Step::arithmetic},
+    {tier_sse42, "sgemm_kernel_ca",        qtb_blas_sse42_sgemm_kernel_ca,       4, 8, 256, Step::one_shuffle},
+    {tier_avx,   "sgemm_kernel_ca",        qtb_blas_avx_sgemm_kernel_ca,         4, 8, 256, Step::one_shuffle},
+};
+constexpr Listed<double> double_kernels[] = {
+    {tier_def,   "dgemm_kernel_128",       qtb_blas_def_dgemm_kernel_128,        2, 12, 128, Step::thirteen_loads},
+    {tier_def,   "dgemm_def_kernel",       qtb_blas_def_dgemm_def_kernel,        4, 4, 256, Step::arithmetic},
+    {tier_sse3,  "dgemm_kernel_a112",      sse3_dgemm_kernel_a112,               4, 4, 112, Step::arithmetic},
+    {tier_ssse3, "dgemm_kernel",           qtb_blas_ssse3_dgemm_kernel,          4, 4, 256, Step::arithmetic},
+    {tier_ssse3, "dgemm_kernel_sse41_ca",  qtb_blas_ssse3_dgemm_kernel_sse41_ca, 4, 4, 256, Step::two_shuffles},
+    {tier_sse42, "dgemm_kernel_ca",        qtb_blas_sse42_dgemm_kernel_ca,       2, 8, 256, Step::one_shuffle},
+    {tier_avx,   "dgemm_kernel",           qtb_blas_avx_dgemm_kernel,            8, 4, 256, Step::two_wide_inserts},
+};
+constexpr Listed<cfloat> complex_kernels[] = {
+    {tier_def,   "cgemm_kernel_64",        qtb_blas_def_cgemm_kernel_64,         4, 4, 64,  Step::arithmetic},
+    {tier_sse3,  "cgemm_kernel_64",        qtb_blas_sse3_cgemm_kernel_64,        4, 4, 64,  Step::arithmetic},
+    {tier_ssse3, "cgemm_kernel",           qtb_blas_ssse3_cgemm_kernel,          4, 2, 128, Step::arithmetic},
+    {tier_ssse3, "cgemm_kernel_sse41_ca",  qtb_blas_ssse3_cgemm_kernel_sse41_ca, 4, 2, 128, Step::arithmetic},
+    {tier_sse42, "cgemm_kernel_ca",        qtb_blas_sse42_cgemm_kernel_ca,       2, 4, 128, Step::one_shuffle},
+    {tier_avx,   "cgemm_kernel_ca",        qtb_blas_avx_cgemm_kernel_ca,         2, 4, 128, Step::one_shuffle},
+};
+constexpr Listed<cdouble> double_complex_kernels[] = {
+    {tier_def,   "zgemm_kernel_64",        qtb_blas_def_zgemm_kernel_64,         2, 4, 64,  Step::arithmetic},
+    {tier_sse3,  "zgemm_kernel_64",        qtb_blas_sse3_zgemm_kernel_64,        2, 4, 64,  Step::arithmetic},
+    {tier_ssse3, "zgemm_kernel",           qtb_blas_ssse3_zgemm_kernel,          2, 2, 128, Step::arithmetic},
+    {tier_ssse3, "zgemm_kernel_sse41_ca",  qtb_blas_ssse3_zgemm_kernel_sse41_ca, 2, 2, 128, Step::arithmetic},
+    {tier_sse42, "zgemm_kernel_ca",        qtb_blas_sse42_zgemm_kernel_ca,       1, 4, 128, Step::one_shuffle},
+    {tier_avx,   "zgemm_kernel_ca",        qtb_blas_avx_zgemm_kernel_ca,         1, 4, 128, Step::one_shuffle},
+};
+// clang-format on
+
+// A multiple of every mr, and one of every nr. Panels of this size have left the first cache level.
+constexpr QtbInt rows = 96, columns = 48;
+constexpr QtbInt largest_stage_bytes = 64 * 1024;
+
+constexpr double turn_seconds = 0.002;
+constexpr int turns = 100;
+
+template <class T>
+void measure(const Listed<T> &listed, const CoreLimits &limits, const MixShares &mixes) {
+  using R = Real<T>;
+  const auto elements = [](QtbInt count) { return static_cast<std::size_t>(count) * sizeof(T); };
+  const std::size_t a_bytes = elements(rows * listed.depth), b_bytes = elements(columns * listed.depth);
+  const Memory a = allocate(a_bytes), b = allocate(b_bytes), c = allocate(elements(rows * columns)),
+               stage = allocate(largest_stage_bytes);
+  fill<R>(a.get(), a_bytes);
+  fill<R>(b.get(), b_bytes);
+  std::memset(c.get(), 0, elements(rows * columns));
+  const auto run = [&](long count) {
+    for (long i = 0; i < count; ++i)
+      listed.kernel(rows, columns, listed.depth, static_cast<const T *>(a.get()), listed.mr * listed.depth,
+                    static_cast<const T *>(b.get()), listed.nr * listed.depth, static_cast<T *>(c.get()), rows,
+                    static_cast<T *>(stage.get()));
+  };
+  const long count = calibrate(run, turn_seconds);
+  double best = 1e300;
+  for (int i = 0; i < turns; ++i) best = std::min(best, seconds_per_call(run, count));
+
+  constexpr double flops_per_product = is_complex<T> ? 8 : 2;
+  const double rate = flops_per_product * static_cast<double>(rows * columns * listed.depth) / best;
+  const double peak = std::is_same_v<R, float>                ? limits.single_flops
+                      : listed.step == Step::two_wide_inserts ? limits.wide_double_flops
+                                                              : limits.double_flops;
+  std::printf("%-22s %5lld %9.1f %7.3f %7.3f  %s\n", listed.name, static_cast<long long>(listed.depth), rate * 1e-9,
+              rate / peak, share_left(mixes, listed.step), text(listed.step));
+}
+
+}  // namespace
+}  // namespace qtb::bench
+
+int main() {
+  using namespace qtb::bench;
+  const ProcessorTier tier = qtb_serv_cpu_detect();
+  const CoreLimits limits = measure_core_limits();
+  const MixShares mixes = measure_mix_shares();
+  std::printf("%-22s %5s %9s %7s %7s  %s\n", "kernel", "depth", "GFLOP/s", "share", "at most", "by its step");
+  const auto measure_all = [&](const auto &kernels) {
+    for (const auto &listed : kernels)
+      if (listed.tier == tier) measure(listed, limits, mixes);
+  };
+  measure_all(single_kernels);
+  measure_all(double_kernels);
+  measure_all(complex_kernels);
+  measure_all(double_complex_kernels);
+}
