@@ -42,30 +42,15 @@ void sse3_dgemm_kernel_a112(QtbInt m, QtbInt n, QtbInt kp, const double *ap, Qtb
   qtb_blas_sse3_dgemm_kernel_a112(m, n, kp, ap, ldap, bp, ldbp, c, ldc, nullptr, nullptr);
 }
 
-// What limits a step: arithmetic alone or a mix, and the width of the vectors.
-enum class Step { arithmetic, one_shuffle, two_shuffles, two_wide_inserts, thirteen_loads };
-
-double share_left(const MixShares &mixes, Step step) {
-  switch (step) {
-    case Step::arithmetic: return 1;
-    case Step::one_shuffle: return mixes.one_shuffle;
-    case Step::two_shuffles: return mixes.two_shuffles;
-    case Step::two_wide_inserts: return mixes.two_wide_inserts;
-    case Step::thirteen_loads: return mixes.thirteen_loads;
-  }
-  return 0;
-}
-
-const char *text(Step step) {
-  switch (step) {
-    case Step::arithmetic: return "arithmetic alone";
-    case Step::one_shuffle: return "a shuffle beside 16";
-    case Step::two_shuffles: return "two shuffles beside 16";
-    case Step::two_wide_inserts: return "two inserts beside 16";
-    case Step::thirteen_loads: return "13 loads beside 24";
-  }
-  return "";
-}
+// What stands in a step beside so many products and sums, and the share of the arithmetic rate that it leaves.
+struct Step {
+  const char *text;
+  double MixShares::*share;
+};
+constexpr Step arithmetic{"arithmetic alone", nullptr}, one_shuffle{"a shuffle beside 16", &MixShares::one_shuffle},
+    two_shuffles{"two shuffles beside 16", &MixShares::two_shuffles},
+    two_wide_inserts{"two inserts beside 16", &MixShares::two_wide_inserts},
+    thirteen_loads{"13 loads beside 24", &MixShares::thirteen_loads};
 
 template <class T>
 struct Listed {
@@ -73,42 +58,42 @@ struct Listed {
   const char *name;
   Kernel<T> *kernel;
   QtbInt mr, nr, depth;
-  Step step;
+  const Step &step;
 };
 
 // clang-format off
 constexpr Listed<float> single_kernels[] = {
-    {tier_def,   "sgemm_kernel_112",       qtb_blas_def_sgemm_kernel_112,        8, 4, 112, Step::arithmetic},
-    {tier_sse3,  "sgemm_kernel_112",       qtb_blas_sse3_sgemm_kernel_112,       8, 4, 112, Step::arithmetic},
-    {tier_ssse3, "sgemm_kernel",           qtb_blas_ssse3_sgemm_kernel,          8, 4, 256, Step::arithmetic},
-    {tier_ssse3, "sgemm_kernel_sse41_ca",  qtb_blas_ssse3_sgemm_kernel_sse41_ca, 8, 4, 256, Step::arithmetic},
-    {tier_sse42, "sgemm_kernel_ca",        qtb_blas_sse42_sgemm_kernel_ca,       4, 8, 256, Step::one_shuffle},
-    {tier_avx,   "sgemm_kernel_ca",        qtb_blas_avx_sgemm_kernel_ca,         4, 8, 256, Step::one_shuffle},
+    {tier_def,   "sgemm_kernel_112",       qtb_blas_def_sgemm_kernel_112,        8, 4, 112, arithmetic},
+    {tier_sse3,  "sgemm_kernel_112",       qtb_blas_sse3_sgemm_kernel_112,       8, 4, 112, arithmetic},
+    {tier_ssse3, "sgemm_kernel",           qtb_blas_ssse3_sgemm_kernel,          8, 4, 256, arithmetic},
+    {tier_ssse3, "sgemm_kernel_sse41_ca",  qtb_blas_ssse3_sgemm_kernel_sse41_ca, 8, 4, 256, arithmetic},
+    {tier_sse42, "sgemm_kernel_ca",        qtb_blas_sse42_sgemm_kernel_ca,       4, 8, 256, one_shuffle},
+    {tier_avx,   "sgemm_kernel_ca",        qtb_blas_avx_sgemm_kernel_ca,         4, 8, 256, one_shuffle},
 };
 constexpr Listed<double> double_kernels[] = {
-    {tier_def,   "dgemm_kernel_128",       qtb_blas_def_dgemm_kernel_128,        2, 12, 128, Step::thirteen_loads},
-    {tier_def,   "dgemm_def_kernel",       qtb_blas_def_dgemm_def_kernel,        4, 4, 256, Step::arithmetic},
-    {tier_sse3,  "dgemm_kernel_a112",      sse3_dgemm_kernel_a112,               4, 4, 112, Step::arithmetic},
-    {tier_ssse3, "dgemm_kernel",           qtb_blas_ssse3_dgemm_kernel,          4, 4, 256, Step::arithmetic},
-    {tier_ssse3, "dgemm_kernel_sse41_ca",  qtb_blas_ssse3_dgemm_kernel_sse41_ca, 4, 4, 256, Step::two_shuffles},
-    {tier_sse42, "dgemm_kernel_ca",        qtb_blas_sse42_dgemm_kernel_ca,       2, 8, 256, Step::one_shuffle},
-    {tier_avx,   "dgemm_kernel",           qtb_blas_avx_dgemm_kernel,            8, 4, 256, Step::two_wide_inserts},
+    {tier_def,   "dgemm_kernel_128",       qtb_blas_def_dgemm_kernel_128,        2, 12, 128, thirteen_loads},
+    {tier_def,   "dgemm_def_kernel",       qtb_blas_def_dgemm_def_kernel,        4, 4, 256, arithmetic},
+    {tier_sse3,  "dgemm_kernel_a112",      sse3_dgemm_kernel_a112,               4, 4, 112, arithmetic},
+    {tier_ssse3, "dgemm_kernel",           qtb_blas_ssse3_dgemm_kernel,          4, 4, 256, arithmetic},
+    {tier_ssse3, "dgemm_kernel_sse41_ca",  qtb_blas_ssse3_dgemm_kernel_sse41_ca, 4, 4, 256, two_shuffles},
+    {tier_sse42, "dgemm_kernel_ca",        qtb_blas_sse42_dgemm_kernel_ca,       2, 8, 256, one_shuffle},
+    {tier_avx,   "dgemm_kernel",           qtb_blas_avx_dgemm_kernel,            8, 4, 256, two_wide_inserts},
 };
 constexpr Listed<cfloat> complex_kernels[] = {
-    {tier_def,   "cgemm_kernel_64",        qtb_blas_def_cgemm_kernel_64,         4, 4, 64,  Step::arithmetic},
-    {tier_sse3,  "cgemm_kernel_64",        qtb_blas_sse3_cgemm_kernel_64,        4, 4, 64,  Step::arithmetic},
-    {tier_ssse3, "cgemm_kernel",           qtb_blas_ssse3_cgemm_kernel,          4, 2, 128, Step::arithmetic},
-    {tier_ssse3, "cgemm_kernel_sse41_ca",  qtb_blas_ssse3_cgemm_kernel_sse41_ca, 4, 2, 128, Step::arithmetic},
-    {tier_sse42, "cgemm_kernel_ca",        qtb_blas_sse42_cgemm_kernel_ca,       2, 4, 128, Step::one_shuffle},
-    {tier_avx,   "cgemm_kernel_ca",        qtb_blas_avx_cgemm_kernel_ca,         2, 4, 128, Step::one_shuffle},
+    {tier_def,   "cgemm_kernel_64",        qtb_blas_def_cgemm_kernel_64,         4, 4, 64,  arithmetic},
+    {tier_sse3,  "cgemm_kernel_64",        qtb_blas_sse3_cgemm_kernel_64,        4, 4, 64,  arithmetic},
+    {tier_ssse3, "cgemm_kernel",           qtb_blas_ssse3_cgemm_kernel,          4, 2, 128, arithmetic},
+    {tier_ssse3, "cgemm_kernel_sse41_ca",  qtb_blas_ssse3_cgemm_kernel_sse41_ca, 4, 2, 128, arithmetic},
+    {tier_sse42, "cgemm_kernel_ca",        qtb_blas_sse42_cgemm_kernel_ca,       2, 4, 128, one_shuffle},
+    {tier_avx,   "cgemm_kernel_ca",        qtb_blas_avx_cgemm_kernel_ca,         2, 4, 128, one_shuffle},
 };
 constexpr Listed<cdouble> double_complex_kernels[] = {
-    {tier_def,   "zgemm_kernel_64",        qtb_blas_def_zgemm_kernel_64,         2, 4, 64,  Step::arithmetic},
-    {tier_sse3,  "zgemm_kernel_64",        qtb_blas_sse3_zgemm_kernel_64,        2, 4, 64,  Step::arithmetic},
-    {tier_ssse3, "zgemm_kernel",           qtb_blas_ssse3_zgemm_kernel,          2, 2, 128, Step::arithmetic},
-    {tier_ssse3, "zgemm_kernel_sse41_ca",  qtb_blas_ssse3_zgemm_kernel_sse41_ca, 2, 2, 128, Step::arithmetic},
-    {tier_sse42, "zgemm_kernel_ca",        qtb_blas_sse42_zgemm_kernel_ca,       1, 4, 128, Step::one_shuffle},
-    {tier_avx,   "zgemm_kernel_ca",        qtb_blas_avx_zgemm_kernel_ca,         1, 4, 128, Step::one_shuffle},
+    {tier_def,   "zgemm_kernel_64",        qtb_blas_def_zgemm_kernel_64,         2, 4, 64,  arithmetic},
+    {tier_sse3,  "zgemm_kernel_64",        qtb_blas_sse3_zgemm_kernel_64,        2, 4, 64,  arithmetic},
+    {tier_ssse3, "zgemm_kernel",           qtb_blas_ssse3_zgemm_kernel,          2, 2, 128, arithmetic},
+    {tier_ssse3, "zgemm_kernel_sse41_ca",  qtb_blas_ssse3_zgemm_kernel_sse41_ca, 2, 2, 128, arithmetic},
+    {tier_sse42, "zgemm_kernel_ca",        qtb_blas_sse42_zgemm_kernel_ca,       1, 4, 128, one_shuffle},
+    {tier_avx,   "zgemm_kernel_ca",        qtb_blas_avx_zgemm_kernel_ca,         1, 4, 128, one_shuffle},
 };
 // clang-format on
 
@@ -141,11 +126,12 @@ void measure(const Listed<T> &listed, const CoreLimits &limits, const MixShares 
 
   constexpr double flops_per_product = is_complex<T> ? 8 : 2;
   const double rate = flops_per_product * static_cast<double>(rows * columns * listed.depth) / best;
-  const double peak = std::is_same_v<R, float>                ? limits.single_flops
-                      : listed.step == Step::two_wide_inserts ? limits.wide_double_flops
-                                                              : limits.double_flops;
+  const double peak = std::is_same_v<R, float>            ? limits.single_flops
+                      : &listed.step == &two_wide_inserts ? limits.wide_double_flops
+                                                          : limits.double_flops;
+  const double most = listed.step.share == nullptr ? 1 : mixes.*listed.step.share;
   std::printf("%-22s %5lld %9.1f %7.3f %7.3f  %s\n", listed.name, static_cast<long long>(listed.depth), rate * 1e-9,
-              rate / peak, share_left(mixes, listed.step), text(listed.step));
+              rate / peak, most, listed.step.text);
 }
 
 }  // namespace
