@@ -24,16 +24,51 @@ using Kernel = void(QtbInt m, QtbInt n, QtbInt kp, const T *ap, QtbInt ldap, con
 using EdgeKernel = void(QtbInt m, QtbInt n, QtbInt k, const double *a, QtbInt lda, const double *b, QtbInt ldb,
                         double *c, QtbInt ldc, const double *alpha, const double *beta_lanes);
 
+// What stands in a step beside so many products and sums, and the share of the arithmetic rate that it leaves.
+struct Step {
+  const char *text;
+  double MixShares::*share;  // null: all of it
+  bool wide = false;         // vectors of 32 bytes
+};
+constexpr Step arithmetic{"arithmetic alone", nullptr}, one_shuffle{"a shuffle beside 16", &MixShares::one_shuffle},
+    two_shuffles{"two shuffles beside 16", &MixShares::two_shuffles},
+    two_wide_inserts{"two inserts beside 16", &MixShares::two_wide_inserts, true},
+    thirteen_loads{"13 loads beside 24", &MixShares::thirteen_loads};
+
+// X(tier, T, kernel, mr, nr, depth, step)
+// clang-format off
+#define QTB_LISTED_KERNELS(X) \
+  X(def,   float,   sgemm_kernel_112,      8, 4,  112, arithmetic) \
+  X(def,   double,  dgemm_kernel_128,      2, 12, 128, thirteen_loads) \
+  X(def,   double,  dgemm_def_kernel,      4, 4,  256, arithmetic) \
+  X(def,   cfloat,  cgemm_kernel_64,       4, 4,  64,  arithmetic) \
+  X(def,   cdouble, zgemm_kernel_64,       2, 4,  64,  arithmetic) \
+  X(sse3,  float,   sgemm_kernel_112,      8, 4,  112, arithmetic) \
+  X(sse3,  cfloat,  cgemm_kernel_64,       4, 4,  64,  arithmetic) \
+  X(sse3,  cdouble, zgemm_kernel_64,       2, 4,  64,  arithmetic) \
+  X(ssse3, float,   sgemm_kernel,          8, 4,  256, arithmetic) \
+  X(ssse3, double,  dgemm_kernel,          4, 4,  256, arithmetic) \
+  X(ssse3, cfloat,  cgemm_kernel,          4, 2,  128, arithmetic) \
+  X(ssse3, cdouble, zgemm_kernel,          2, 2,  128, arithmetic) \
+  X(ssse3, float,   sgemm_kernel_sse41_ca, 8, 4,  256, arithmetic) \
+  X(ssse3, double,  dgemm_kernel_sse41_ca, 4, 4,  256, two_shuffles) \
+  X(ssse3, cfloat,  cgemm_kernel_sse41_ca, 4, 2,  128, arithmetic) \
+  X(ssse3, cdouble, zgemm_kernel_sse41_ca, 2, 2,  128, arithmetic) \
+  X(sse42, float,   sgemm_kernel_ca,       4, 8,  256, one_shuffle) \
+  X(sse42, double,  dgemm_kernel_ca,       2, 8,  256, one_shuffle) \
+  X(sse42, cfloat,  cgemm_kernel_ca,       2, 4,  128, one_shuffle) \
+  X(sse42, cdouble, zgemm_kernel_ca,       1, 4,  128, one_shuffle) \
+  X(avx,   float,   sgemm_kernel_ca,       4, 8,  256, one_shuffle) \
+  X(avx,   double,  dgemm_kernel,          8, 4,  256, two_wide_inserts) \
+  X(avx,   cfloat,  cgemm_kernel_ca,       2, 4,  128, one_shuffle) \
+  X(avx,   cdouble, zgemm_kernel_ca,       1, 4,  128, one_shuffle)
+// clang-format on
+
 extern "C" {
-Kernel<float> qtb_blas_def_sgemm_kernel_112, qtb_blas_sse3_sgemm_kernel_112, qtb_blas_ssse3_sgemm_kernel,
-    qtb_blas_ssse3_sgemm_kernel_sse41_ca, qtb_blas_sse42_sgemm_kernel_ca, qtb_blas_avx_sgemm_kernel_ca;
-Kernel<double> qtb_blas_def_dgemm_kernel_128, qtb_blas_ssse3_dgemm_kernel, qtb_blas_ssse3_dgemm_kernel_sse41_ca,
-    qtb_blas_sse42_dgemm_kernel_ca, qtb_blas_avx_dgemm_kernel, qtb_blas_def_dgemm_def_kernel;
+#define QTB_DECLARE(tier, T, name, mr, nr, depth, step) Kernel<T> qtb_blas_##tier##_##name;
+QTB_LISTED_KERNELS(QTB_DECLARE)
+#undef QTB_DECLARE
 EdgeKernel qtb_blas_sse3_dgemm_kernel_a112;
-Kernel<cfloat> qtb_blas_def_cgemm_kernel_64, qtb_blas_sse3_cgemm_kernel_64, qtb_blas_ssse3_cgemm_kernel,
-    qtb_blas_ssse3_cgemm_kernel_sse41_ca, qtb_blas_sse42_cgemm_kernel_ca, qtb_blas_avx_cgemm_kernel_ca;
-Kernel<cdouble> qtb_blas_def_zgemm_kernel_64, qtb_blas_sse3_zgemm_kernel_64, qtb_blas_ssse3_zgemm_kernel,
-    qtb_blas_ssse3_zgemm_kernel_sse41_ca, qtb_blas_sse42_zgemm_kernel_ca, qtb_blas_avx_zgemm_kernel_ca;
 }
 
 // The one that takes other arguments. It reads neither alpha nor beta.
@@ -42,60 +77,13 @@ void sse3_dgemm_kernel_a112(QtbInt m, QtbInt n, QtbInt kp, const double *ap, Qtb
   qtb_blas_sse3_dgemm_kernel_a112(m, n, kp, ap, ldap, bp, ldbp, c, ldc, nullptr, nullptr);
 }
 
-// What stands in a step beside so many products and sums, and the share of the arithmetic rate that it leaves.
-struct Step {
-  const char *text;
-  double MixShares::*share;
-};
-constexpr Step arithmetic{"arithmetic alone", nullptr}, one_shuffle{"a shuffle beside 16", &MixShares::one_shuffle},
-    two_shuffles{"two shuffles beside 16", &MixShares::two_shuffles},
-    two_wide_inserts{"two inserts beside 16", &MixShares::two_wide_inserts},
-    thirteen_loads{"13 loads beside 24", &MixShares::thirteen_loads};
-
 template <class T>
 struct Listed {
-  ProcessorTier tier;
   const char *name;
   Kernel<T> *kernel;
   QtbInt mr, nr, depth;
   const Step &step;
 };
-
-// clang-format off
-constexpr Listed<float> single_kernels[] = {
-    {tier_def,   "sgemm_kernel_112",       qtb_blas_def_sgemm_kernel_112,        8, 4, 112, arithmetic},
-    {tier_sse3,  "sgemm_kernel_112",       qtb_blas_sse3_sgemm_kernel_112,       8, 4, 112, arithmetic},
-    {tier_ssse3, "sgemm_kernel",           qtb_blas_ssse3_sgemm_kernel,          8, 4, 256, arithmetic},
-    {tier_ssse3, "sgemm_kernel_sse41_ca",  qtb_blas_ssse3_sgemm_kernel_sse41_ca, 8, 4, 256, arithmetic},
-    {tier_sse42, "sgemm_kernel_ca",        qtb_blas_sse42_sgemm_kernel_ca,       4, 8, 256, one_shuffle},
-    {tier_avx,   "sgemm_kernel_ca",        qtb_blas_avx_sgemm_kernel_ca,         4, 8, 256, one_shuffle},
-};
-constexpr Listed<double> double_kernels[] = {
-    {tier_def,   "dgemm_kernel_128",       qtb_blas_def_dgemm_kernel_128,        2, 12, 128, thirteen_loads},
-    {tier_def,   "dgemm_def_kernel",       qtb_blas_def_dgemm_def_kernel,        4, 4, 256, arithmetic},
-    {tier_sse3,  "dgemm_kernel_a112",      sse3_dgemm_kernel_a112,               4, 4, 112, arithmetic},
-    {tier_ssse3, "dgemm_kernel",           qtb_blas_ssse3_dgemm_kernel,          4, 4, 256, arithmetic},
-    {tier_ssse3, "dgemm_kernel_sse41_ca",  qtb_blas_ssse3_dgemm_kernel_sse41_ca, 4, 4, 256, two_shuffles},
-    {tier_sse42, "dgemm_kernel_ca",        qtb_blas_sse42_dgemm_kernel_ca,       2, 8, 256, one_shuffle},
-    {tier_avx,   "dgemm_kernel",           qtb_blas_avx_dgemm_kernel,            8, 4, 256, two_wide_inserts},
-};
-constexpr Listed<cfloat> complex_kernels[] = {
-    {tier_def,   "cgemm_kernel_64",        qtb_blas_def_cgemm_kernel_64,         4, 4, 64,  arithmetic},
-    {tier_sse3,  "cgemm_kernel_64",        qtb_blas_sse3_cgemm_kernel_64,        4, 4, 64,  arithmetic},
-    {tier_ssse3, "cgemm_kernel",           qtb_blas_ssse3_cgemm_kernel,          4, 2, 128, arithmetic},
-    {tier_ssse3, "cgemm_kernel_sse41_ca",  qtb_blas_ssse3_cgemm_kernel_sse41_ca, 4, 2, 128, arithmetic},
-    {tier_sse42, "cgemm_kernel_ca",        qtb_blas_sse42_cgemm_kernel_ca,       2, 4, 128, one_shuffle},
-    {tier_avx,   "cgemm_kernel_ca",        qtb_blas_avx_cgemm_kernel_ca,         2, 4, 128, one_shuffle},
-};
-constexpr Listed<cdouble> double_complex_kernels[] = {
-    {tier_def,   "zgemm_kernel_64",        qtb_blas_def_zgemm_kernel_64,         2, 4, 64,  arithmetic},
-    {tier_sse3,  "zgemm_kernel_64",        qtb_blas_sse3_zgemm_kernel_64,        2, 4, 64,  arithmetic},
-    {tier_ssse3, "zgemm_kernel",           qtb_blas_ssse3_zgemm_kernel,          2, 2, 128, arithmetic},
-    {tier_ssse3, "zgemm_kernel_sse41_ca",  qtb_blas_ssse3_zgemm_kernel_sse41_ca, 2, 2, 128, arithmetic},
-    {tier_sse42, "zgemm_kernel_ca",        qtb_blas_sse42_zgemm_kernel_ca,       1, 4, 128, one_shuffle},
-    {tier_avx,   "zgemm_kernel_ca",        qtb_blas_avx_zgemm_kernel_ca,         1, 4, 128, one_shuffle},
-};
-// clang-format on
 
 // A multiple of every mr, and one of every nr. Panels of this size have left the first cache level.
 constexpr QtbInt rows = 96, columns = 48;
@@ -126,9 +114,9 @@ void measure(const Listed<T> &listed, const CoreLimits &limits, const MixShares 
 
   constexpr double flops_per_product = is_complex<T> ? 8 : 2;
   const double rate = flops_per_product * static_cast<double>(rows * columns * listed.depth) / best;
-  const double peak = std::is_same_v<R, float>            ? limits.single_flops
-                      : &listed.step == &two_wide_inserts ? limits.wide_double_flops
-                                                          : limits.double_flops;
+  const double peak = std::is_same_v<R, float> ? limits.single_flops
+                      : listed.step.wide       ? limits.wide_double_flops
+                                               : limits.double_flops;
   const double most = listed.step.share == nullptr ? 1 : mixes.*listed.step.share;
   std::printf("%-22s %5lld %9.1f %7.3f %7.3f  %s\n", listed.name, static_cast<long long>(listed.depth), rate * 1e-9,
               rate / peak, most, listed.step.text);
@@ -143,12 +131,10 @@ int main() {
   const CoreLimits limits = measure_core_limits();
   const MixShares mixes = measure_mix_shares();
   std::printf("%-22s %5s %9s %7s %7s  %s\n", "kernel", "depth", "GFLOP/s", "share", "at most", "by its step");
-  const auto measure_all = [&](const auto &kernels) {
-    for (const auto &listed : kernels)
-      if (listed.tier == tier) measure(listed, limits, mixes);
-  };
-  measure_all(single_kernels);
-  measure_all(double_kernels);
-  measure_all(complex_kernels);
-  measure_all(double_complex_kernels);
+#define QTB_MEASURE(listed_tier, T, name, mr, nr, depth, step) \
+  if (tier == tier_##listed_tier)                              \
+    measure<T>({#name, qtb_blas_##listed_tier##_##name, mr, nr, depth, step}, limits, mixes);
+  QTB_LISTED_KERNELS(QTB_MEASURE)
+  if (tier == tier_sse3)
+    measure<double>({"dgemm_kernel_a112", sse3_dgemm_kernel_a112, 4, 4, 112, arithmetic}, limits, mixes);
 }

@@ -1,10 +1,10 @@
 // The blocked loops of a GEMM body: C := alpha*op(A)*op(B) + beta*C on one thread, in the tiers from ssse3 on.
 //
-// C is scaled by beta first; everything after that adds. Over blocks of nb columns and, inside, of kb of the depth, a
-// block of op(B) is packed, and over blocks of mb rows one of op(A) with alpha folded in, on which the inner kernel
-// works. Rows beyond a multiple of mr take the small path, block by block. A body may get A, B or both as panels that
-// its caller has packed, or read B in place; of an operand that the caller has packed the matrix itself is read only by
-// the small path.
+// A small problem takes the small path whole. Otherwise C is scaled by beta, and everything after that adds: over
+// blocks of nb columns and, inside, of kb of the depth, a block of op(B) is packed, and over blocks of mb rows one of
+// op(A) with alpha folded in, on which the inner kernel works. Rows beyond a multiple of mr take the small path, block
+// by block. A body may get A, B or both as panels that its caller has packed, or read B in place; of an operand that
+// the caller has packed the matrix itself is read only by the small path.
 #pragma once
 
 #include "blas/kernels/level3/buffers.h"
