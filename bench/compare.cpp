@@ -13,8 +13,9 @@
 // A row: routine, options, case, this library's time per call and rate, the peer's rate, the ratio of the rates pair by
 // pair (median, lowest, highest; above 1 this library is faster), the share of what the core's own load, store and
 // arithmetic rates allow on that number of threads (vector routines: in cache; products: the arithmetic alone), and the
-// cores that each side kept busy. A product is first checked; where it is wrong, the row says so, nothing is timed,
-// and the exit status is 1. The file has the same as numbers, and what the limit is.
+// cores that each side kept busy. The share is a median of pairs too: a loop of nothing but the work that bounds the
+// call takes its turns beside the sides. A product is first checked; where it is wrong, the row says so, nothing is
+// timed, and the exit status is 1. The file has the same as numbers, and the rate at the limit.
 
 #include <algorithm>
 #include <cstdio>
@@ -54,7 +55,7 @@ struct Case {
   std::string routine, letters, label;
   std::string numbers;  // m,n,k,increment for the file, empty where the routine has none
   double work;          // of a call: flops where there are any, bytes elsewhere
-  double least_seconds;
+  Bound bound;          // of the busiest thread's part of a call
   const char *unit;
   Prepare prepare;
 };
@@ -75,24 +76,38 @@ const char *name(Outcome outcome) {
 
 bool failed(Outcome outcome) { return outcome == Outcome::wrong || outcome == Outcome::crashed; }
 
+// The side that does no more than what bounds a call.
+Runner runner_at_limit(const Bound &bound) {
+  return {
+      Side{}, [bound](const Library &) {
+        return Prepared{[bound](long count) { work_at_limit(bound.limit, bound.amount * static_cast<double>(count)); }};
+      }};
+}
+
+// The other side's time over the first's, turn by turn.
+Spread ratios(const Measurement &first, const Measurement &other) {
+  std::vector<double> ratio;
+  for (std::size_t i = 0; i < std::min(first.seconds.size(), other.seconds.size()); ++i)
+    ratio.push_back(other.seconds[i] / first.seconds[i]);
+  return ratio.empty() ? Spread{} : spread(ratio);
+}
+
 // One case: its row in the table and in the file. False where a side failed.
-bool compare(const Options &options, const Case &item, std::FILE *csv) {
+bool compare(const Options &options, const CoreLimits &limits, const Case &item, std::FILE *csv) {
   const bool has_peer = !options.peer.path.empty();
-  std::vector<Side> sides = {options.ours};
-  if (has_peer) sides.push_back(options.peer);
-  const std::vector<Measurement> measured = measure_in_turn(sides, item.prepare, options.turns, options.seconds);
+  std::vector<Runner> runners = {{options.ours, item.prepare}, runner_at_limit(item.bound)};
+  if (has_peer) runners.push_back({options.peer, item.prepare});
+  const std::vector<Measurement> measured = measure_in_turn(runners, options.turns, options.seconds);
   const Measurement no_peer{Outcome::absent, {}, 0};
-  const Measurement &ours = measured[0], &peer = has_peer ? measured[1] : no_peer;
+  const Measurement &ours = measured[0], &at_limit = measured[1], &peer = has_peer ? measured[2] : no_peer;
   if (ours.outcome == Outcome::absent) return true;
 
   const auto time_of = [](const Measurement &side) { return side.seconds.empty() ? 0 : spread(side.seconds).median; };
   const double ours_time = time_of(ours), peer_time = time_of(peer);
   const auto rate = [&](double seconds) { return seconds > 0 ? item.work / seconds / 1e9 : 0; };
-  std::vector<double> ratio;
-  for (std::size_t i = 0; i < std::min(ours.seconds.size(), peer.seconds.size()); ++i)
-    ratio.push_back(peer.seconds[i] / ours.seconds[i]);
-  const Spread ratios = ratio.empty() ? Spread{} : spread(ratio);
-  const double share = ours_time > 0 ? item.least_seconds / ours_time : 0;
+  const Spread ratio = ratios(ours, peer);
+  const double share = ratios(ours, at_limit).median;
+  const double least_seconds = item.bound.amount / limits.*item.bound.limit;
 
   std::printf("%-7s %-2s %-15s", item.routine.c_str(), item.letters.c_str(), item.label.c_str());
   if (ours.outcome == Outcome::measured)
@@ -104,10 +119,10 @@ bool compare(const Options &options, const Case &item, std::FILE *csv) {
   else
     std::printf(" %8s", has_peer ? name(peer.outcome) : "-");
   std::printf(" %-7s", item.unit);
-  if (ratio.empty())
+  if (ratio.median == 0)
     std::printf(" %6s  %11s", "-", "");
   else
-    std::printf(" %6.2f  %5.2f-%5.2f", ratios.median, ratios.low, ratios.high);
+    std::printf(" %6.2f  %5.2f-%5.2f", ratio.median, ratio.low, ratio.high);
   std::printf("  %4.0f%%  %4.2f", share * 100, ours.cores);
   if (peer_time > 0) std::printf(" %4.2f", peer.cores);
   std::printf("\n");
@@ -116,8 +131,8 @@ bool compare(const Options &options, const Case &item, std::FILE *csv) {
   if (csv != nullptr) {
     std::fprintf(csv, "%s,%s,%s,%ld,%.4g,%.4g,%.4g,%.4g,%s,%.4g,%.4g,%.4g,%.4g,%.4g,%.3g,%.3g,%s,%s\n",
                  item.routine.c_str(), item.letters.c_str(), item.numbers.c_str(), options.threads, ours_time * 1e9,
-                 rate(ours_time), peer_time * 1e9, rate(peer_time), item.unit, ratios.median, ratios.low, ratios.high,
-                 rate(item.least_seconds), share, ours.cores, peer.cores, name(ours.outcome), name(peer.outcome));
+                 rate(ours_time), peer_time * 1e9, rate(peer_time), item.unit, ratio.median, ratio.low, ratio.high,
+                 rate(least_seconds), share, ours.cores, peer.cores, name(ours.outcome), name(peer.outcome));
   }
   return !failed(ours.outcome) && !failed(peer.outcome);
 }
@@ -132,9 +147,8 @@ Case vector_case(const Options &options, const CoreLimits &limits, const Routine
   item.numbers = "," + std::to_string(n) + ",," + std::to_string(increment);
   item.work = flops > 0 ? flops : call_bytes(routine, n);
   item.unit = flops > 0 ? "GFLOP/s" : "GB/s";
-  item.least_seconds =
-      least_seconds(limits, vectors * routine.read, vectors * routine.written, flops, routine.is_single()) /
-      static_cast<double>(options.threads);
+  item.bound = find_bound(limits, vectors * routine.read, vectors * routine.written, flops, routine.is_single());
+  item.bound.amount /= static_cast<double>(options.threads);
   item.prepare = [&routine, n, increment](const Library &library) {
     const auto operands = std::make_shared<Operands>(make_operands(routine, n, increment));
     const Calls calls = bind(library, routine, n, increment, *operands);
@@ -145,12 +159,12 @@ Case vector_case(const Options &options, const CoreLimits &limits, const Routine
 }
 
 // The avx tier's only kernel with 32-byte vectors is that of dgemm.
-double peak_flops(const Options &options, const CoreLimits &limits, const Product &product) {
-  if (options.avx && product.routine == "dgemm") return limits.wide_double_flops;
-  return product.is_single() ? limits.single_flops : limits.double_flops;
+Limit limit_of(const Options &options, const Product &product) {
+  if (options.avx && product.routine == "dgemm") return &CoreLimits::wide_double_flops;
+  return product.is_single() ? &CoreLimits::single_flops : &CoreLimits::double_flops;
 }
 
-Case product_case(const Options &options, const CoreLimits &limits, const Product &product) {
+Case product_case(const Options &options, const Product &product) {
   const auto numbers = [&](char separator) {
     return std::to_string(product.m) + separator + std::to_string(product.n) + separator + std::to_string(product.k);
   };
@@ -161,7 +175,7 @@ Case product_case(const Options &options, const CoreLimits &limits, const Produc
   item.numbers = numbers(',') + ',';
   item.work = product_flops(product);
   item.unit = "GFLOP/s";
-  item.least_seconds = item.work / (peak_flops(options, limits, product) * static_cast<double>(options.threads));
+  item.bound = {limit_of(options, product), item.work / static_cast<double>(options.threads)};
   item.prepare = [product](const Library &library) {
     const BoundProduct bound = bind_product(library, product);
     return Prepared{bound.calls, bound.correct};
@@ -269,7 +283,7 @@ std::vector<Case> list_cases(const Options &options, const CoreLimits &limits) {
       const auto add = [&](long m, long n, long k) {
         Product product{routine, letters[0], letters[1], m, n, k, options.alpha, options.beta};
         if (!product.is_complex()) product.alpha = product.alpha.real(), product.beta = product.beta.real();
-        cases.push_back(product_case(options, limits, product));
+        cases.push_back(product_case(options, product));
       };
       for (const long size : options.sizes) add(size, size, size);
       for (const Shape &shape : options.shapes) add(shape.m, shape.n, shape.k);
@@ -292,7 +306,7 @@ int run(int argc, char **argv) {
   if (csv == nullptr && !options.csv.empty()) fail("cannot write " + options.csv);
   if (csv != nullptr) std::fprintf(csv, "%s\n", header);
   bool all_well = true;
-  for (const Case &item : list_cases(options, limits)) all_well = compare(options, item, csv) && all_well;
+  for (const Case &item : list_cases(options, limits)) all_well = compare(options, limits, item, csv) && all_well;
   if (csv != nullptr) std::fclose(csv);
   return all_well ? 0 : 1;
 }

@@ -5,6 +5,7 @@
 #include <emmintrin.h>
 
 #include <algorithm>
+#include <cmath>
 #include <thread>
 #include <vector>
 
@@ -81,6 +82,21 @@ alignas(64) char block[256];
 void load_loop(long count) { asm volatile(QTB_LOOP(QTB_BLOCK(QTB_LOAD)) : "+r"(count) : "r"(block) : QTB_CLOBBERED); }
 void store_loop(long count) { asm volatile(QTB_LOOP(QTB_BLOCK(QTB_STORE)) : "+r"(count) : "r"(block) : "memory"); }
 
+struct LimitLoop {
+  Limit limit;
+  void (*run)(long count);
+  double amount;      // of a pass
+  bool wide = false;  // vectors of 32 bytes
+};
+constexpr LimitLoop limit_loops[] = {
+    {&CoreLimits::double_flops, double_loop, instructions * 2},
+    {&CoreLimits::single_flops, single_loop, instructions * 4},
+    {&CoreLimits::wide_double_flops, wide_double_loop, instructions * 4, true},
+    {&CoreLimits::wide_single_flops, wide_single_loop, instructions * 8, true},
+    {&CoreLimits::load_rate, load_loop, instructions},
+    {&CoreLimits::store_rate, store_loop, instructions},
+};
+
 void copy_vectors(const __m128i *from, __m128i *to, std::size_t count) {
   for (std::size_t i = 0; i < count; i += 4) {
     const __m128i a = _mm_load_si128(from + i), b = _mm_load_si128(from + i + 1);
@@ -130,16 +146,16 @@ void thirteen_loads_loop(long count) { asm volatile(QTB_CLEAR_ALL QTB_STEPS(QTB_
 }  // namespace
 
 CoreLimits measure_core_limits() {
+  const bool has_wide = __builtin_cpu_supports("avx") != 0;
   CoreLimits limits{};
-  limits.double_flops = best_rate(double_loop, instructions * 2);
-  limits.single_flops = best_rate(single_loop, instructions * 4);
-  if (__builtin_cpu_supports("avx") != 0) {
-    limits.wide_double_flops = best_rate(wide_double_loop, instructions * 4);
-    limits.wide_single_flops = best_rate(wide_single_loop, instructions * 8);
-  }
-  limits.load_rate = best_rate(load_loop, instructions);
-  limits.store_rate = best_rate(store_loop, instructions);
+  for (const LimitLoop &loop : limit_loops)
+    if (has_wide || !loop.wide) limits.*loop.limit = best_rate(loop.run, loop.amount);
   return limits;
+}
+
+void work_at_limit(Limit limit, double amount) {
+  for (const LimitLoop &loop : limit_loops)
+    if (loop.limit == limit) loop.run(std::max(1L, std::lround(amount / loop.amount)));
 }
 
 MixShares measure_mix_shares() {
@@ -176,9 +192,12 @@ double measure_copy_bandwidth(std::size_t bytes, int threads) {
   return 2.0 * static_cast<double>(from.size() * sizeof(Line)) / best;
 }
 
-double least_seconds(const CoreLimits &limits, double loads, double stores, double flops, bool single) {
-  return std::max({loads / limits.load_rate, stores / limits.store_rate,
-                   flops / (single ? limits.single_flops : limits.double_flops)});
+Bound find_bound(const CoreLimits &limits, double loads, double stores, double flops, bool single) {
+  const Limit arithmetic = single ? &CoreLimits::single_flops : &CoreLimits::double_flops;
+  const auto seconds = [&](const Bound &bound) { return bound.amount / limits.*bound.limit; };
+  return std::max(
+      {Bound{&CoreLimits::load_rate, loads}, Bound{&CoreLimits::store_rate, stores}, Bound{arithmetic, flops}},
+      [&](const Bound &a, const Bound &b) { return seconds(a) < seconds(b); });
 }
 
 }  // namespace qtb::bench

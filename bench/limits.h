@@ -17,6 +17,13 @@ struct CoreLimits {
 
 CoreLimits measure_core_limits();
 
+// One of them.
+using Limit = double CoreLimits::*;
+
+// So many flops, loads or stores, as fast as the core does them, on the calling thread. 32-byte vectors need a
+// processor that has them.
+void work_at_limit(Limit limit, double amount);
+
 // The shares of the arithmetic rate that are left where other instructions stand between the products and sums, still
 // without dependences to wait for and with all data in the first-level cache. What the design of an inner kernel puts
 // into a step of depth cannot be faster.
@@ -33,8 +40,12 @@ MixShares measure_mix_shares();
 // over arrays of so many bytes, which should be far larger than the caches, on one thread or on several.
 double measure_copy_bandwidth(std::size_t bytes, int threads);
 
-// The least time of a call that needs so many loads and stores (of 16 bytes each) and flops, all from the first-level
-// cache.
-double least_seconds(const CoreLimits &limits, double loads, double stores, double flops, bool single);
+// What bounds a call that needs so many loads and stores (of 16 bytes each) and flops, all from the first-level cache:
+// the work that takes longest.
+struct Bound {
+  Limit limit;
+  double amount;  // flops, loads or stores
+};
+Bound find_bound(const CoreLimits &limits, double loads, double stores, double flops, bool single);
 
 }  // namespace qtb::bench

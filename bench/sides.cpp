@@ -56,11 +56,12 @@ void send_report(int channel, const Report &report) {
 }
 
 // The life of a child. It leaves without cleaning up: what runs at the end of a program is the parent's to do.
-[[noreturn]] void serve(const Side &side, const Prepare &prepare, int channel) {
+[[noreturn]] void serve(const Runner &runner, int channel) {
   prctl(PR_SET_PDEATHSIG, SIGKILL);
+  const Side &side = runner.side;
   for (const std::string &setting : side.settings) set_environment(setting);
-  const Library library = load_library(side.path, side.wide);
-  const Prepared prepared = prepare(library);
+  const Library library = side.path.empty() ? Library{} : load_library(side.path, side.wide);
+  const Prepared prepared = runner.prepare(library);
   if (!prepared.calls || !prepared.correct) {
     send_report(channel, {prepared.calls ? Outcome::wrong : Outcome::absent, 0, 0});
     _exit(0);
@@ -86,7 +87,7 @@ void take_report(Child &child) {
   if (!WIFSTOPPED(status)) child.process = gone;  // it had reported that there is nothing to measure
 }
 
-Child start(const Side &side, const Prepare &prepare) {
+Child start(const Runner &runner) {
   int channel[2];
   if (socketpair(AF_UNIX, SOCK_SEQPACKET, 0, channel) != 0) {
     std::perror("socketpair");
@@ -101,7 +102,7 @@ Child start(const Side &side, const Prepare &prepare) {
   }
   if (child.process == 0) {
     close(channel[0]);
-    serve(side, prepare, channel[1]);
+    serve(runner, channel[1]);
   }
   close(channel[1]);
   child.channel = channel[0];
@@ -125,16 +126,15 @@ void end(Child &child) {
 
 }  // namespace
 
-std::vector<Measurement> measure_in_turn(const std::vector<Side> &sides, const Prepare &prepare, int most_turns,
-                                         double budget) {
+std::vector<Measurement> measure_in_turn(const std::vector<Runner> &runners, int most_turns, double budget) {
   std::vector<Child> children;
   double seconds_of_turns = 0;
-  for (const Side &side : sides) {
-    children.push_back(start(side, prepare));
+  for (const Runner &runner : runners) {
+    children.push_back(start(runner));
     seconds_of_turns += children.back().last.seconds;
   }
-  std::vector<Measurement> measurements(sides.size());
-  std::vector<std::vector<double>> cores(sides.size());
+  std::vector<Measurement> measurements(runners.size());
+  std::vector<std::vector<double>> cores(runners.size());
   const double fitting = budget / std::max(seconds_of_turns, turn_seconds);
   const int turns = std::max(least_turns, static_cast<int>(std::min<double>(fitting, most_turns)));
   for (int turn = 0; turn < turns; ++turn)

@@ -15,7 +15,7 @@
 namespace qtb::bench {
 
 struct Side {
-  std::string path;                   // of the shared library
+  std::string path;                   // of the shared library; empty for a side that needs none
   bool wide = true;                   // as in Library
   std::vector<std::string> settings;  // NAME=VALUE for the environment, set before the library is loaded
 };
@@ -28,6 +28,11 @@ struct Prepared {
 // Makes the calls of one case ready in the side's process.
 using Prepare = std::function<Prepared(const Library &)>;
 
+struct Runner {
+  Side side;
+  Prepare prepare;
+};
+
 enum class Outcome : int { measured, absent, wrong, crashed };
 
 struct Measurement {
@@ -36,10 +41,9 @@ struct Measurement {
   double cores = 0;             // processor time over elapsed time, the median of the turns
 };
 
-// Measures the sides in turn, as often as fits the budget of seconds, but not more often than most_turns and not less
-// than a few times. Odd turns go backward through the sides, so that none profits from a drifting clock.
-std::vector<Measurement> measure_in_turn(const std::vector<Side> &sides, const Prepare &prepare, int most_turns,
-                                         double budget);
+// Measures the runners in turn, as often as fits the budget of seconds, but not more often than most_turns and not less
+// than a few times. Odd turns go backward through the runners, so that none profits from a drifting clock.
+std::vector<Measurement> measure_in_turn(const std::vector<Runner> &runners, int most_turns, double budget);
 
 // Sets NAME=VALUE in this process's environment, or ends the program with a message.
 void set_environment(const std::string &assignment);
