@@ -49,6 +49,12 @@ template <class T>
     return v == 1;
 }
 
+// Whether an option character is a letter, named in upper case, in either of its cases.
+[[gnu::always_inline]] constexpr bool is_letter(char option, char letter) {
+  constexpr int case_bit = 'a' ^ 'A';
+  return (option & ~case_bit) == letter;
+}
+
 // Hidden: a name with C linkage that the library's own parts share and that the shared library does not export.
 #if defined(_WIN32)
 #define QTB_HIDDEN

@@ -2,7 +2,6 @@
 
 #include "blas/entry/checks.h"
 
-#include "blas/entry/lsame.h"
 #include "blas/entry/xerbla.h"
 
 // A checker takes all the arguments of its routine and looks at those that have a rule.
@@ -16,7 +15,7 @@ struct Rule {
   bool kept;
 };
 
-bool is(const char *option, char letter) { return same_option(*option, letter); }
+bool is(const char *option, char letter) { return is_letter(*option, letter); }
 
 template <class... Letters>
 Rule option(QtbInt number, const char *value, Letters... letters) {

@@ -9,20 +9,14 @@
 namespace qtb::QTB_TIER {
 namespace {
 
-// ---- Option letters: the first byte, in either case ----
-
-inline bool is_letter(const char *option, char upper_case) {
-  return *option == upper_case || *option == upper_case + ('a' - 'A');
-}
-
 // op(A): A, its transpose or its conjugate transpose.
 enum class Op { none, transpose, conjugate };
 
 // For a real type every letter but N is the transpose; for a complex one every letter but N and T the conjugate.
 template <class T>
 Op read_op(const char *trans) {
-  if (is_letter(trans, 'N')) return Op::none;
-  return is_complex<T> && !is_letter(trans, 'T') ? Op::conjugate : Op::transpose;
+  if (is_letter(*trans, 'N')) return Op::none;
+  return is_complex<T> && !is_letter(*trans, 'T') ? Op::conjugate : Op::transpose;
 }
 
 // ---- Elements ----

@@ -13,7 +13,7 @@ namespace {
 // The elements of C that a routine reads and writes.
 enum class Part { whole, upper, lower };
 
-inline Part read_part(const char *uplo) { return is_letter(uplo, 'U') ? Part::upper : Part::lower; }
+inline Part read_part(const char *uplo) { return is_letter(*uplo, 'U') ? Part::upper : Part::lower; }
 
 // op(A).
 template <class T>

@@ -55,24 +55,24 @@ struct Triangle {
 
 template <class T>
 Triangle<T> triangle(const char *uplo, T *a, QtbInt lda, QtbInt n) {
-  return {a, lda, 0, n, n, is_letter(uplo, 'U'), 0, n};
+  return {a, lda, 0, n, n, is_letter(*uplo, 'U'), 0, n};
 }
 // The main diagonal is the last row of an upper band and the first of a lower one.
 template <class T>
 Triangle<T> triangle_band(const char *uplo, T *a, QtbInt lda, QtbInt n, QtbInt k) {
-  const bool upper = is_letter(uplo, 'U');
+  const bool upper = is_letter(*uplo, 'U');
   return {upper ? a + k : a, lda - 1, 0, n, k, upper, 0, n};
 }
 // Packed columns follow one another: an upper one is one element longer than the last, a lower one shorter.
 template <class T>
 Triangle<T> triangle_packed(const char *uplo, T *ap, QtbInt n) {
-  const bool upper = is_letter(uplo, 'U');
+  const bool upper = is_letter(*uplo, 'U');
   return {ap, upper ? 1 : n - 1, upper ? 1 : -1, n, n, upper, 0, n};
 }
 // len columns of a triangle with a rectangle of other rows above ("U") or below ("L").
 template <class T>
 Triangle<T> triangle_piece(const char *uplo, T *a, QtbInt lda, QtbInt len, QtbInt other) {
-  const bool upper = is_letter(uplo, 'U');
+  const bool upper = is_letter(*uplo, 'U');
   return {a, lda, 0, len + other, len + other, upper, upper ? other : 0, len};
 }
 

@@ -8,9 +8,9 @@ namespace {
 
 template <class T, bool hermitian = false>
 QTB_FUNCTION(symm, T, symm) {
-  const Symmetric<T> symmetric{a, *lda, is_letter(uplo, 'U'), hermitian};
+  const Symmetric<T> symmetric{a, *lda, is_letter(*uplo, 'U'), hermitian};
   const Matrix<T> other{b, *ldb, Op::none};
-  if (is_letter(side, 'L'))
+  if (is_letter(*side, 'L'))
     scaled_product(*m, *n, *m, *alpha, symmetric, other, *beta, c, *ldc);
   else
     scaled_product(*m, *n, *n, *alpha, other, symmetric, *beta, c, *ldc);

@@ -28,12 +28,12 @@ void rank_2k_update(Part part, bool hermitian, bool transposed, QtbInt n, QtbInt
 
 template <class T>
 QTB_FUNCTION(syr2k, T, syr2k) {
-  rank_2k_update(read_part(uplo), false, !is_letter(trans, 'N'), *n, *k, *alpha, a, *lda, b, *ldb, *beta, c, *ldc);
+  rank_2k_update(read_part(uplo), false, !is_letter(*trans, 'N'), *n, *k, *alpha, a, *lda, b, *ldb, *beta, c, *ldc);
 }
 
 template <class T>
 QTB_FUNCTION(her2k, T, her2k) {
-  rank_2k_update(read_part(uplo), true, !is_letter(trans, 'N'), *n, *k, *alpha, a, *lda, b, *ldb, *beta, c, *ldc);
+  rank_2k_update(read_part(uplo), true, !is_letter(*trans, 'N'), *n, *k, *alpha, a, *lda, b, *ldb, *beta, c, *ldc);
 }
 
 }  // namespace

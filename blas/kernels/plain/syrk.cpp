@@ -25,12 +25,12 @@ void rank_k_update(Part part, bool hermitian, bool transposed, QtbInt n, QtbInt 
 
 template <class T>
 QTB_FUNCTION(syrk, T, syrk) {
-  rank_k_update(read_part(uplo), false, !is_letter(trans, 'N'), *n, *k, *alpha, a, *lda, *beta, c, *ldc);
+  rank_k_update(read_part(uplo), false, !is_letter(*trans, 'N'), *n, *k, *alpha, a, *lda, *beta, c, *ldc);
 }
 
 template <class T>
 QTB_FUNCTION(herk, T, herk) {
-  rank_k_update(read_part(uplo), true, !is_letter(trans, 'N'), *n, *k, *alpha, a, *lda, *beta, c, *ldc);
+  rank_k_update(read_part(uplo), true, !is_letter(*trans, 'N'), *n, *k, *alpha, a, *lda, *beta, c, *ldc);
 }
 
 }  // namespace

@@ -38,7 +38,7 @@ QTB_FUNCTION(trmm, T, trmm) {
   if (*m <= 0 || *n <= 0) return;
   scale_part(Part::whole, *m, *n, *alpha, b, *ldb);
   if (is_zero(*alpha)) return;
-  const bool left = is_letter(side, 'L'), unit = is_letter(diag, 'U');
+  const bool left = is_letter(*side, 'L'), unit = is_letter(*diag, 'U');
   const Triangle<const T> t = triangle(uplo, a, *lda, left ? *m : *n);
   if (left)
     for (QtbInt j = 0; j < *n; j++) triangular_product(t, read_op<T>(transa), unit, b + j * *ldb);

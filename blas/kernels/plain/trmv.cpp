@@ -6,18 +6,18 @@ namespace {
 
 template <class T>
 QTB_FUNCTION(trmv, T, trmv) {
-  triangular_product(triangle(uplo, a, *lda, *n), read_op<T>(trans), is_letter(diag, 'U'), vector(x, *n, *incx));
+  triangular_product(triangle(uplo, a, *lda, *n), read_op<T>(trans), is_letter(*diag, 'U'), vector(x, *n, *incx));
 }
 
 template <class T>
 QTB_FUNCTION(tbmv, T, tbmv) {
-  triangular_product(triangle_band(uplo, a, *lda, *n, *k), read_op<T>(trans), is_letter(diag, 'U'),
+  triangular_product(triangle_band(uplo, a, *lda, *n, *k), read_op<T>(trans), is_letter(*diag, 'U'),
                      vector(x, *n, *incx));
 }
 
 template <class T>
 QTB_FUNCTION(tpmv, T, tpmv) {
-  triangular_product(triangle_packed(uplo, ap, *n), read_op<T>(trans), is_letter(diag, 'U'), vector(x, *n, *incx));
+  triangular_product(triangle_packed(uplo, ap, *n), read_op<T>(trans), is_letter(*diag, 'U'), vector(x, *n, *incx));
 }
 
 #if QTB_TIER_AT_LEAST(ssse3)
@@ -31,13 +31,13 @@ template <class T>
 QTB_FUNCTION(trmv_block, T, trmv_block) {
   if (*len <= 0) return;
   const Op op = read_op<T>(trans);
-  const bool by_columns = op == Op::none, leads = is_letter(uplo, 'U') == by_columns;
+  const bool by_columns = op == Op::none, leads = is_letter(*uplo, 'U') == by_columns;
   const QtbInt along = by_columns ? *lda : 1, outside = *extent - *len;
   const T *own = leads ? a : a + outside * along, *beside = leads ? a + *len * along : a;
   const T *old = leads ? work + *len : work;
   const Vector<T> piece = vector(x, *len, *incx);
 
-  triangular_product(triangle(uplo, own, *lda, *len), op, is_letter(diag, 'U'), piece);
+  triangular_product(triangle(uplo, own, *lda, *len), op, is_letter(*diag, 'U'), piece);
   if (by_columns) {
     for (QtbInt j = 0; j < outside; j++)
       for (QtbInt i = 0; i < *len; i++) piece[i] += old[j] * beside[i + j * *lda];

@@ -8,17 +8,18 @@ namespace {
 
 template <class T>
 QTB_FUNCTION(trmv, T, trsv) {
-  triangular_solve(triangle(uplo, a, *lda, *n), read_op<T>(trans), is_letter(diag, 'U'), vector(x, *n, *incx));
+  triangular_solve(triangle(uplo, a, *lda, *n), read_op<T>(trans), is_letter(*diag, 'U'), vector(x, *n, *incx));
 }
 
 template <class T>
 QTB_FUNCTION(tbmv, T, tbsv) {
-  triangular_solve(triangle_band(uplo, a, *lda, *n, *k), read_op<T>(trans), is_letter(diag, 'U'), vector(x, *n, *incx));
+  triangular_solve(triangle_band(uplo, a, *lda, *n, *k), read_op<T>(trans), is_letter(*diag, 'U'),
+                   vector(x, *n, *incx));
 }
 
 template <class T>
 QTB_FUNCTION(tpmv, T, tpsv) {
-  triangular_solve(triangle_packed(uplo, ap, *n), read_op<T>(trans), is_letter(diag, 'U'), vector(x, *n, *incx));
+  triangular_solve(triangle_packed(uplo, ap, *n), read_op<T>(trans), is_letter(*diag, 'U'), vector(x, *n, *incx));
 }
 
 }  // namespace

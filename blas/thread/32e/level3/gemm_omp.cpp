@@ -40,8 +40,6 @@ struct ThisProcessor {
   static bool is_amd_family16() { return qtb_serv_cpu_is_amd_family16() != 0; }
 };
 
-constexpr bool is_letter(char given, char letter) { return given == letter || given == letter + ('a' - 'A'); }
-
 // The panels that threads share, from the memory service; null until one thread has allocated them.
 struct SharedPanels {
   void *a, *b;
