@@ -39,16 +39,28 @@ std::size_t platform_environment(const char *name, char *buffer, std::size_t siz
 
 // ---- Thread-local words ----
 
+// The library's own thread-local storage, at a fixed distance from the thread's pointer: a small product looks twice,
+// and a call of the system for each would be felt. It takes a few bytes of the room that the C library keeps for this.
+namespace {
+
+constexpr std::int32_t most_words = 4;
+std::atomic<std::int32_t> words_created{0};
+[[gnu::tls_model("initial-exec")]] thread_local void *words[most_words];
+
+}  // namespace
+
 std::int32_t platform_tls_create() {
-  pthread_key_t key;
-  return pthread_key_create(&key, nullptr) == 0 ? static_cast<std::int32_t>(key) : -1;
+  const std::int32_t index = words_created.fetch_add(1, std::memory_order_relaxed);
+  if (index < most_words) return index;
+  words_created.store(most_words, std::memory_order_relaxed);
+  return -1;
 }
 
-// An index of -1 is a key beyond the system's last one, which reads as null and takes no value.
-void *platform_tls_get(std::int32_t index) { return pthread_getspecific(static_cast<pthread_key_t>(index)); }
+// An index of -1, of a word that could not be had, reads as null and takes no value.
+void *platform_tls_get(std::int32_t index) { return index < 0 ? nullptr : words[index]; }
 
 void platform_tls_set(std::int32_t index, void *value) {
-  pthread_setspecific(static_cast<pthread_key_t>(index), value);
+  if (index >= 0) words[index] = value;
 }
 
 // ---- Processors and affinity ----

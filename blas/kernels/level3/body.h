@@ -176,9 +176,22 @@ GemmBlocks body_blocks(const Product<T> &p) {
   return blocks;
 }
 
+// Whether one block holds the whole problem.
+template <class T>
+bool fit(const GemmBlocks &blocks, const Product<T> &p) {
+  return p.m <= blocks.mb && p.n <= blocks.nb && p.k <= blocks.kb;
+}
+
+// Where the block after that at first begins. One block that holds all has none after it: compilers see that there is
+// no loop, and small problems, which have one block, are spared what goes ahead of loops.
+template <bool one_block>
+QtbInt next_block(QtbInt first, QtbInt step, QtbInt total) {
+  return one_block ? total : first + step;
+}
+
 // C += alpha*op(A)*op(B), with B packed here or by the caller, and A likewise.
-template <class T, Family family, bool a_given, bool b_given>
-void add_blocks(const Product<T> &p, GemmBlocks blocks, CallersPanel<T> given_a, CallersPanel<T> given_b) {
+template <class T, Family family, bool a_given, bool b_given, bool one_block>
+void walk_blocks(const Product<T> &p, GemmBlocks blocks, CallersPanel<T> given_a, CallersPanel<T> given_b) {
   constexpr GemmRules rules = rules_of<T, family>;
   const Op op_a = read_op<T>(p.transa), op_b = read_op<T>(p.transb);
   const bool a_is_n = op_a == Op::none, b_is_n = op_b == Op::none, aligned = columns_aligned(p.c, p.ldc);
@@ -191,14 +204,14 @@ void add_blocks(const Product<T> &p, GemmBlocks blocks, CallersPanel<T> given_a,
   const GemmBuffers<T> buffers = get_buffers<T, family>(a_given ? 0 : blocks.mb, b_given ? 0 : blocks.nb, blocks.kb,
                                                         InnerKernel<T, family>::stage_bytes(largest_depth));
   if (buffers.allocation == nullptr) return add_small(p, a_is_n, b_is_n, 0, 0, p.n, 0, p.k);
-  for (QtbInt j0 = 0; j0 < p.n; j0 += column_step) {
+  for (QtbInt j0 = 0; j0 < p.n; j0 = next_block<one_block>(j0, column_step, p.n)) {
     const QtbInt n = smaller(column_step, p.n - j0);
-    for (QtbInt l0 = 0; l0 < p.k; l0 += depth_step) {
+    for (QtbInt l0 = 0; l0 < p.k; l0 = next_block<one_block>(l0, depth_step, p.k)) {
       const QtbInt k = smaller(depth_step, p.k - l0), kp = round_up(k, rules.ku);
       const QtbInt step_a = kp * rules.mr, step_b = kp * rules.nr;
       if constexpr (!b_given)
         copy_b(&k, &n, p.b + (b_is_n ? l0 + j0 * p.ldb : j0 + l0 * p.ldb), &p.ldb, buffers.b, &step_b, nullptr);
-      for (QtbInt i0 = 0; i0 < full_m; i0 += row_step) {
+      for (QtbInt i0 = 0; i0 < full_m; i0 = next_block<one_block>(i0, row_step, full_m)) {
         const QtbInt m = smaller(row_step, full_m - i0);
         T *const c = p.c + i0 + j0 * p.ldc;
         if constexpr (!a_given)
@@ -221,10 +234,16 @@ void add_blocks(const Product<T> &p, GemmBlocks blocks, CallersPanel<T> given_a,
   }
   free_buffers(buffers);
 }
+template <class T, Family family, bool a_given, bool b_given>
+void add_blocks(const Product<T> &p, GemmBlocks blocks, CallersPanel<T> given_a, CallersPanel<T> given_b) {
+  if constexpr (!a_given && !b_given)
+    if (fit(blocks, p)) return walk_blocks<T, family, false, false, true>(p, blocks, given_a, given_b);
+  walk_blocks<T, family, a_given, b_given, false>(p, blocks, given_a, given_b);
+}
 
 // C += alpha*op(A)*op(B), with B in place: over blocks of the depth and of rows, A packed and all columns at once.
-template <class T, Family family>
-void add_blocks_in_place(const Product<T> &p, GemmBlocks blocks) {
+template <class T, Family family, bool one_block>
+void walk_blocks_in_place(const Product<T> &p, GemmBlocks blocks) {
   constexpr GemmRules rules = rules_of<T, family>;
   const Op op_a = read_op<T>(p.transa), op_b = read_op<T>(p.transb);
   const bool a_is_n = op_a == Op::none, b_is_n = op_b == Op::none, aligned = columns_aligned(p.c, p.ldc);
@@ -235,10 +254,10 @@ void add_blocks_in_place(const Product<T> &p, GemmBlocks blocks) {
   const GemmBuffers<T> buffers =
       get_buffers<T, family>(blocks.mb, 0, blocks.kb, InPlaceKernel<T, family>::stage_bytes(largest_depth));
   if (buffers.allocation == nullptr) return add_small(p, a_is_n, b_is_n, 0, 0, p.n, 0, p.k);
-  for (QtbInt l0 = 0; l0 < p.k; l0 += blocks.kb) {
+  for (QtbInt l0 = 0; l0 < p.k; l0 = next_block<one_block>(l0, blocks.kb, p.k)) {
     const QtbInt k = smaller(blocks.kb, p.k - l0), step_a = round_up(k, rules.ku) * rules.mr;
     const T *const b = p.b + (b_is_n ? l0 : l0 * p.ldb);
-    for (QtbInt i0 = 0; i0 < full_m; i0 += blocks.mb) {
+    for (QtbInt i0 = 0; i0 < full_m; i0 = next_block<one_block>(i0, blocks.mb, full_m)) {
       const QtbInt m = smaller(blocks.mb, full_m - i0);
       copy_a(&m, &k, p.a + (a_is_n ? i0 + l0 * p.lda : l0 + i0 * p.lda), &p.lda, buffers.a, &step_a, &p.alpha);
       if (aligned)
@@ -250,6 +269,12 @@ void add_blocks_in_place(const Product<T> &p, GemmBlocks blocks) {
     if (full_m < p.m) add_small(p, a_is_n, b_is_n, full_m, 0, p.n, l0, k);
   }
   free_buffers(buffers);
+}
+template <class T, Family family>
+void add_blocks_in_place(const Product<T> &p, GemmBlocks blocks) {
+  blocks.nb = p.n;
+  if (fit(blocks, p)) return walk_blocks_in_place<T, family, true>(p, blocks);
+  walk_blocks_in_place<T, family, false>(p, blocks);
 }
 
 }  // namespace

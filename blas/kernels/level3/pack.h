@@ -178,10 +178,13 @@ template <class T, int width, QtbInt least, bool side_by_side, class Change>
 void pack_panels(QtbInt count, QtbInt depth, QtbInt padded, const T *src, QtbInt ld, T *dst, QtbInt ldp,
                  const Change &change) {
   const QtbInt full = count / width, step = side_by_side ? 1 : ld;
-  pack_full<T, width, side_by_side, panels_per_line<T, width>>(full, depth, padded, src, ld, dst, ldp, change);
-  QtbInt left = count - full * width;
-  src += full * width * step;
-  dst += full * ldp;
+  QtbInt left = count;
+  if (full > 0) {
+    pack_full<T, width, side_by_side, panels_per_line<T, width>>(full, depth, padded, src, ld, dst, ldp, change);
+    left -= full * width;
+    src += full * width * step;
+    dst += full * ldp;
+  }
   for (QtbInt w; left >= least; left -= w, src += w * step, dst += ldp) {
     w = panel_width(width, left);
     if constexpr (width > 8)
