@@ -3,15 +3,16 @@
 # charts and the summary (summary.md) are kept in BUILD_FOLDER/bench-results.
 #
 # Environment:
-#   BENCH_PARTS            what to run (default: slot level1 kernels gemm threads balance)
+#   BENCH_PARTS            what to run (default: slot level1 kernels gemm families threads balance)
 #                            slot     what a dispatch slot costs
 #                            level1   Level 1 on one thread and on all, and beside the peer
 #                            kernels  the inner kernels of matrix products, beside what their instructions allow
 #                            gemm     matrix products on one thread, beside the peer
+#                            families the same by the kernels that this processor does not take
 #                            threads  matrix products on all threads, beside one thread and beside the peer
 #                            balance  how evenly matrix products are cut over up to 64 threads (nothing is timed)
 #   BENCH_TIERS            on which tiers (default: def sse3 ssse3 sse42 avx)
-#   BENCH_LONG             with any value, products of sizes 2000 and 4000 too
+#   BENCH_LONG             with any value, square products of sizes 2000 and 4000 too
 #   BENCH_FILTER           regular expression of the Level-1 cases (default: all)
 #   BENCH_MIN_TIME         seconds per Level-1 case (default 0.005)
 #   PEER                   path of another BLAS shared library to compare with
@@ -20,7 +21,7 @@ set -eu
 build=$1
 results=$build/bench-results
 all_tiers='def sse3 ssse3 sse42 avx' # in the order of their numbers
-parts=${BENCH_PARTS:-slot level1 kernels gemm threads balance}
+parts=${BENCH_PARTS:-slot level1 kernels gemm families threads balance}
 tiers=${BENCH_TIERS:-$all_tiers}
 threads=$(nproc)
 products=sgemm,dgemm,cgemm,zgemm
@@ -45,10 +46,11 @@ heading() { echo "== tier $tier: $1"; }
 
 # compared NAME ARGUMENT...: this library beside what the arguments say, as NAME-<tier>.txt and .csv. A wrong result
 # shows in the file and fails the run at its end.
+library=$build/libqtb.so
 compared() {
   name=$1-$tier
   shift
-  "$build/bench/compare" --library "$build/libqtb.so" "$@" --csv "$results/$name.csv" | tee "$results/$name.txt"
+  "$build/bench/compare" --library "$library" "$@" --csv "$results/$name.csv" | tee "$results/$name.txt"
 }
 
 # The same beside the peer, where there is one.
@@ -87,12 +89,27 @@ part_kernels() {
   "$build/bench/inner_kernels" | tee "$results/kernels-$tier.txt"
 }
 
+square_sizes=4,8,16,32,64,100,200,350,500,1000${BENCH_LONG:+,2000,4000}
+
 part_gemm() {
   heading "products, one thread${PEER:+, beside $PEER}"
-  beside_peer square --threads 1 --routines $products --sizes 4,8,16,32,64,100,200,350,500,1000${BENCH_LONG:+,2000,4000}
+  beside_peer square --threads 1 --routines $products --sizes "$square_sizes"
   beside_peer flat --threads 1 --routines $products \
     --shapes 1000x1000x32,200x200x32,16x1000x1000,16x200x200,1000x16x1000,200x16x200
   beside_peer options --threads 1 --routines $products --options NT,TN,TT --sizes 8,32,200,1000
+}
+
+part_families() {
+  case $tier in
+    def) processor=family16 routines=dgemm ;;
+    ssse3) processor=no_sse41 routines=$products ;;
+    *) return 0 ;;
+  esac
+  library=$build/bench/libqtb_other_processor.so
+  heading "products, one thread, processor $processor${PEER:+, beside $PEER}"
+  beside_peer families --threads 1 --routines "$routines" --sizes "$square_sizes" \
+    --setting QTB_BENCH_PROCESSOR=$processor
+  library=$build/libqtb.so
 }
 
 part_threads() {

@@ -20,7 +20,7 @@ namespace {
 
 constexpr double turn_seconds = 0.001;  // long against the clock, short against a disturbance
 constexpr long warm_share = 4;          // of a turn's calls so many are first made without a look at the clock
-constexpr int least_turns = 5;
+constexpr int least_turns = 5;          // unless fewer are asked for
 
 // What a child sends: once when it is ready, with what a turn will take, and after each turn.
 struct Report {
@@ -66,9 +66,12 @@ void send_report(int channel, const Report &report) {
     send_report(channel, {prepared.calls ? Outcome::wrong : Outcome::absent, 0, 0});
     _exit(0);
   }
-  prepared.calls(1);
-  const long count = calibrate(prepared.calls, turn_seconds);
-  const double seconds = measure_turn(prepared.calls, count).seconds * static_cast<double>(count);
+  long count = 1;
+  double seconds = seconds_per_call(prepared.calls, 1);
+  if (seconds < turn_seconds) {
+    count = calibrate(prepared.calls, turn_seconds);
+    seconds = measure_turn(prepared.calls, count).seconds * static_cast<double>(count);
+  }
   send_report(channel, {Outcome::measured, seconds, 0});
   char turn = 0;
   while (recv(channel, &turn, 1, 0) == 1) send_report(channel, measure_turn(prepared.calls, count));
@@ -136,7 +139,7 @@ std::vector<Measurement> measure_in_turn(const std::vector<Runner> &runners, int
   std::vector<Measurement> measurements(runners.size());
   std::vector<std::vector<double>> cores(runners.size());
   const double fitting = budget / std::max(seconds_of_turns, turn_seconds);
-  const int turns = std::max(least_turns, static_cast<int>(std::min<double>(fitting, most_turns)));
+  const int turns = static_cast<int>(std::min<double>(std::max<double>(fitting, least_turns), most_turns));
   for (int turn = 0; turn < turns; ++turn)
     for (std::size_t i = 0; i < children.size(); ++i) {
       const std::size_t which = turn % 2 == 0 ? i : children.size() - 1 - i;

@@ -41,8 +41,8 @@ struct Measurement {
   double cores = 0;             // processor time over elapsed time, the median of the turns
 };
 
-// Measures the runners in turn, as often as fits the budget of seconds, but not more often than most_turns and not less
-// than a few times. Odd turns go backward through the runners, so that none profits from a drifting clock.
+// Measures the runners in turn, as often as fits the budget of seconds, but not less than a few times, and not more
+// often than most_turns. Odd turns go backward through the runners, so that none profits from a drifting clock.
 std::vector<Measurement> measure_in_turn(const std::vector<Runner> &runners, int most_turns, double budget);
 
 // Sets NAME=VALUE in this process's environment, or ends the program with a message.

@@ -74,6 +74,9 @@ section() {
 section 'Matrix products, one thread' \
   'GFLOP/s / share of the arithmetic peak / ratio to the peer (above 1: this library is faster)' \
   rate square flat options
+section 'Matrix products, one thread, by the kernels that this processor does not take' \
+  'GFLOP/s / share of the arithmetic peak / ratio to the peer' \
+  rate families
 section 'Matrix products, all threads' \
   'Ratio to this library on one thread / ratio to the peer on all threads' \
   ratio threads-serial threads-peer
