@@ -1,9 +1,10 @@
 // inner_kernels: the inner kernels of GEMM alone, beside what their designs allow.
 //
-// Each kernel of the process's tier multiplies panels that lie in the second cache level, over the depth of a block of
-// its family. A row has its rate, the share that this is of the arithmetic rate of a core with the same vectors
-// (CoreLimits), and the most that the instructions of its step leave of that (MixShares). What a whole product has less
-// than its kernel goes to packing, to the small path and to the far caches. QTB_DEBUG_CPU_TYPE chooses the tier.
+// Each kernel of the process's tier multiplies panels with the depth of a block of its family. A row has its rate where
+// the panel of A is a whole block, and the shares of the arithmetic rate of a core with the same vectors (CoreLimits)
+// that it reaches with such a block, that it reaches with few rows, whose panel lies in the second cache level, and
+// that the instructions of its step leave at most (MixShares). What a whole product has less goes to packing, to the
+// small path and to the far caches. QTB_DEBUG_CPU_TYPE chooses the tier.
 
 #include <algorithm>
 #include <cstdio>
@@ -35,37 +36,38 @@ constexpr Step arithmetic{"arithmetic alone", nullptr}, one_shuffle{"a shuffle b
     two_wide_inserts{"two inserts beside 16", &MixShares::two_wide_inserts, true},
     thirteen_loads{"13 loads beside 24", &MixShares::thirteen_loads};
 
-// X(tier, T, kernel, mr, nr, depth, step)
+// X(tier, T, kernel, mr, nr, depth, mb, step); mb is the rows of a block where the second cache level is small and the
+// third is not.
 // clang-format off
 #define QTB_LISTED_KERNELS(X) \
-  X(def,   float,   sgemm_kernel_112,      8, 4,  112, arithmetic) \
-  X(def,   double,  dgemm_kernel_128,      2, 12, 128, thirteen_loads) \
-  X(def,   double,  dgemm_def_kernel,      4, 4,  256, arithmetic) \
-  X(def,   cfloat,  cgemm_kernel_64,       4, 4,  64,  arithmetic) \
-  X(def,   cdouble, zgemm_kernel_64,       2, 4,  64,  arithmetic) \
-  X(sse3,  float,   sgemm_kernel_112,      8, 4,  112, arithmetic) \
-  X(sse3,  cfloat,  cgemm_kernel_64,       4, 4,  64,  arithmetic) \
-  X(sse3,  cdouble, zgemm_kernel_64,       2, 4,  64,  arithmetic) \
-  X(ssse3, float,   sgemm_kernel,          8, 4,  256, arithmetic) \
-  X(ssse3, double,  dgemm_kernel,          4, 4,  256, arithmetic) \
-  X(ssse3, cfloat,  cgemm_kernel,          4, 2,  128, arithmetic) \
-  X(ssse3, cdouble, zgemm_kernel,          2, 2,  128, arithmetic) \
-  X(ssse3, float,   sgemm_kernel_sse41_ca, 8, 4,  256, arithmetic) \
-  X(ssse3, double,  dgemm_kernel_sse41_ca, 4, 4,  256, two_shuffles) \
-  X(ssse3, cfloat,  cgemm_kernel_sse41_ca, 4, 2,  128, arithmetic) \
-  X(ssse3, cdouble, zgemm_kernel_sse41_ca, 2, 2,  128, arithmetic) \
-  X(sse42, float,   sgemm_kernel_ca,       4, 8,  256, one_shuffle) \
-  X(sse42, double,  dgemm_kernel_ca,       2, 8,  256, one_shuffle) \
-  X(sse42, cfloat,  cgemm_kernel_ca,       2, 4,  128, one_shuffle) \
-  X(sse42, cdouble, zgemm_kernel_ca,       1, 4,  128, one_shuffle) \
-  X(avx,   float,   sgemm_kernel_ca,       4, 8,  256, one_shuffle) \
-  X(avx,   double,  dgemm_kernel,          8, 4,  256, two_wide_inserts) \
-  X(avx,   cfloat,  cgemm_kernel_ca,       2, 4,  128, one_shuffle) \
-  X(avx,   cdouble, zgemm_kernel_ca,       1, 4,  128, one_shuffle)
+  X(def,   float,   sgemm_kernel_112,      8, 4,  112,  640,  arithmetic) \
+  X(def,   double,  dgemm_kernel_128,      2, 12, 128,  512,  thirteen_loads) \
+  X(def,   double,  dgemm_def_kernel,      4, 4,  256,  240,  arithmetic) \
+  X(def,   cfloat,  cgemm_kernel_64,       4, 4,  64,   320,  arithmetic) \
+  X(def,   cdouble, zgemm_kernel_64,       2, 4,  64,   320,  arithmetic) \
+  X(sse3,  float,   sgemm_kernel_112,      8, 4,  112,  640,  arithmetic) \
+  X(sse3,  cfloat,  cgemm_kernel_64,       4, 4,  64,   320,  arithmetic) \
+  X(sse3,  cdouble, zgemm_kernel_64,       2, 4,  64,   320,  arithmetic) \
+  X(ssse3, float,   sgemm_kernel,          8, 4,  256,  1024, arithmetic) \
+  X(ssse3, double,  dgemm_kernel,          4, 4,  256,  512,  arithmetic) \
+  X(ssse3, cfloat,  cgemm_kernel,          4, 2,  256,  440,  arithmetic) \
+  X(ssse3, cdouble, zgemm_kernel,          2, 2,  224,  250,  arithmetic) \
+  X(ssse3, float,   sgemm_kernel_sse41_ca, 8, 4,  256,  1024, arithmetic) \
+  X(ssse3, double,  dgemm_kernel_sse41_ca, 4, 4,  256,  448,  two_shuffles) \
+  X(ssse3, cfloat,  cgemm_kernel_sse41_ca, 4, 2,  128,  448,  arithmetic) \
+  X(ssse3, cdouble, zgemm_kernel_sse41_ca, 2, 2,  128,  256,  arithmetic) \
+  X(sse42, float,   sgemm_kernel_ca,       4, 8,  256,  1280, one_shuffle) \
+  X(sse42, double,  dgemm_kernel_ca,       2, 8,  256,  640,  one_shuffle) \
+  X(sse42, cfloat,  cgemm_kernel_ca,       2, 4,  128,  512,  one_shuffle) \
+  X(sse42, cdouble, zgemm_kernel_ca,       1, 4,  128,  256,  one_shuffle) \
+  X(avx,   float,   sgemm_kernel_ca,       4, 8,  256,  1280, one_shuffle) \
+  X(avx,   double,  dgemm_kernel,          8, 4,  256,  512,  two_wide_inserts) \
+  X(avx,   cfloat,  cgemm_kernel_ca,       2, 4,  128,  512,  one_shuffle) \
+  X(avx,   cdouble, zgemm_kernel_ca,       1, 4,  128,  256,  one_shuffle)
 // clang-format on
 
 extern "C" {
-#define QTB_DECLARE(tier, T, name, mr, nr, depth, step) Kernel<T> qtb_blas_##tier##_##name;
+#define QTB_DECLARE(tier, T, name, mr, nr, depth, mb, step) Kernel<T> qtb_blas_##tier##_##name;
 QTB_LISTED_KERNELS(QTB_DECLARE)
 #undef QTB_DECLARE
 EdgeKernel qtb_blas_sse3_dgemm_kernel_a112;
@@ -81,19 +83,21 @@ template <class T>
 struct Listed {
   const char *name;
   Kernel<T> *kernel;
-  QtbInt mr, nr, depth;
+  QtbInt mr, nr, depth, mb;
   const Step &step;
 };
 
-// A multiple of every mr, and one of every nr. Panels of this size have left the first cache level.
-constexpr QtbInt rows = 96, columns = 48;
+// Rows that are a multiple of every mr, of which a panel lies in the second cache level, and columns that are a
+// multiple of every nr.
+constexpr QtbInt few_rows = 96, columns = 48;
 constexpr QtbInt largest_stage_bytes = 64 * 1024;
 
 constexpr double turn_seconds = 0.002;
 constexpr int turns = 100;
 
+// Flops per second at best on so many rows.
 template <class T>
-void measure(const Listed<T> &listed, const CoreLimits &limits, const MixShares &mixes) {
+double best_rate(const Listed<T> &listed, QtbInt rows) {
   using R = Real<T>;
   const auto elements = [](QtbInt count) { return static_cast<std::size_t>(count) * sizeof(T); };
   const std::size_t a_bytes = elements(rows * listed.depth), b_bytes = elements(columns * listed.depth);
@@ -111,15 +115,20 @@ void measure(const Listed<T> &listed, const CoreLimits &limits, const MixShares 
   const long count = calibrate(run, turn_seconds);
   double best = 1e300;
   for (int i = 0; i < turns; ++i) best = std::min(best, seconds_per_call(run, count));
-
   constexpr double flops_per_product = is_complex<T> ? 8 : 2;
-  const double rate = flops_per_product * static_cast<double>(rows * columns * listed.depth) / best;
-  const double peak = std::is_same_v<R, float> ? limits.single_flops
-                      : listed.step.wide       ? limits.wide_double_flops
-                                               : limits.double_flops;
+  return flops_per_product * static_cast<double>(rows * columns * listed.depth) / best;
+}
+
+template <class T>
+void measure(const Listed<T> &listed, const CoreLimits &limits, const MixShares &mixes) {
+  const double peak = std::is_same_v<Real<T>, float> ? limits.single_flops
+                      : listed.step.wide             ? limits.wide_double_flops
+                                                     : limits.double_flops;
   const double most = listed.step.share == nullptr ? 1 : mixes.*listed.step.share;
-  std::printf("%-22s %5lld %9.1f %7.3f %7.3f  %s\n", listed.name, static_cast<long long>(listed.depth), rate * 1e-9,
-              rate / peak, most, listed.step.text);
+  const double rate = best_rate(listed, listed.mb);
+  std::printf("%-22s %5lld %5lld %9.1f %7.3f %7.3f %7.3f  %s\n", listed.name, static_cast<long long>(listed.depth),
+              static_cast<long long>(listed.mb), rate * 1e-9, rate / peak, best_rate(listed, few_rows) / peak, most,
+              listed.step.text);
 }
 
 }  // namespace
@@ -130,11 +139,12 @@ int main() {
   const ProcessorTier tier = qtb_serv_cpu_detect();
   const CoreLimits limits = measure_core_limits();
   const MixShares mixes = measure_mix_shares();
-  std::printf("%-22s %5s %9s %7s %7s  %s\n", "kernel", "depth", "GFLOP/s", "share", "at most", "by its step");
-#define QTB_MEASURE(listed_tier, T, name, mr, nr, depth, step) \
-  if (tier == tier_##listed_tier)                              \
-    measure<T>({#name, qtb_blas_##listed_tier##_##name, mr, nr, depth, step}, limits, mixes);
+  std::printf("%-22s %5s %5s %9s %7s %7s %7s  %s\n", "kernel", "depth", "rows", "GFLOP/s", "share", "few", "at most",
+              "by its step");
+#define QTB_MEASURE(listed_tier, T, name, mr, nr, depth, mb, step) \
+  if (tier == tier_##listed_tier)                                  \
+    measure<T>({#name, qtb_blas_##listed_tier##_##name, mr, nr, depth, mb, step}, limits, mixes);
   QTB_LISTED_KERNELS(QTB_MEASURE)
   if (tier == tier_sse3)
-    measure<double>({"dgemm_kernel_a112", sse3_dgemm_kernel_a112, 4, 4, 112, arithmetic}, limits, mixes);
+    measure<double>({"dgemm_kernel_a112", sse3_dgemm_kernel_a112, 4, 4, 112, 480, arithmetic}, limits, mixes);
 }
