@@ -14,10 +14,17 @@
 #include "bench/limits.h"
 #include "bench/memory.h"
 #include "bench/timing.h"
+#include "service/cache.h"
 #include "service/cpu.h"
+
+// The rules of all tiers stand in the build of each.
+#define QTB_TIER def
+#include "blas/kernels/level3/tiles.h"
 
 namespace qtb::bench {
 namespace {
+
+namespace tables = qtb::QTB_TIER;
 
 template <class T>
 using Kernel = void(QtbInt m, QtbInt n, QtbInt kp, const T *ap, QtbInt ldap, const T *bp, QtbInt ldbp, T *c, QtbInt ldc,
@@ -36,38 +43,37 @@ constexpr Step arithmetic{"arithmetic alone", nullptr}, one_shuffle{"a shuffle b
     two_wide_inserts{"two inserts beside 16", &MixShares::two_wide_inserts, true},
     thirteen_loads{"13 loads beside 24", &MixShares::thirteen_loads};
 
-// X(tier, T, kernel, mr, nr, depth, mb, step); mb is the rows of a block where the second cache level is small and the
-// third is not.
+// X(tier, T, family, kernel, step)
 // clang-format off
 #define QTB_LISTED_KERNELS(X) \
-  X(def,   float,   sgemm_kernel_112,      8, 4,  112,  640,  arithmetic) \
-  X(def,   double,  dgemm_kernel_128,      2, 12, 128,  512,  thirteen_loads) \
-  X(def,   double,  dgemm_def_kernel,      4, 4,  256,  240,  arithmetic) \
-  X(def,   cfloat,  cgemm_kernel_64,       4, 4,  64,   320,  arithmetic) \
-  X(def,   cdouble, zgemm_kernel_64,       2, 4,  64,   320,  arithmetic) \
-  X(sse3,  float,   sgemm_kernel_112,      8, 4,  112,  640,  arithmetic) \
-  X(sse3,  cfloat,  cgemm_kernel_64,       4, 4,  64,   320,  arithmetic) \
-  X(sse3,  cdouble, zgemm_kernel_64,       2, 4,  64,   320,  arithmetic) \
-  X(ssse3, float,   sgemm_kernel,          8, 4,  256,  1024, arithmetic) \
-  X(ssse3, double,  dgemm_kernel,          4, 4,  256,  512,  arithmetic) \
-  X(ssse3, cfloat,  cgemm_kernel,          4, 2,  256,  440,  arithmetic) \
-  X(ssse3, cdouble, zgemm_kernel,          2, 2,  224,  250,  arithmetic) \
-  X(ssse3, float,   sgemm_kernel_sse41_ca, 8, 4,  256,  1024, arithmetic) \
-  X(ssse3, double,  dgemm_kernel_sse41_ca, 4, 4,  256,  448,  two_shuffles) \
-  X(ssse3, cfloat,  cgemm_kernel_sse41_ca, 4, 2,  128,  448,  arithmetic) \
-  X(ssse3, cdouble, zgemm_kernel_sse41_ca, 2, 2,  128,  256,  arithmetic) \
-  X(sse42, float,   sgemm_kernel_ca,       4, 8,  256,  1280, one_shuffle) \
-  X(sse42, double,  dgemm_kernel_ca,       2, 8,  256,  640,  one_shuffle) \
-  X(sse42, cfloat,  cgemm_kernel_ca,       2, 4,  128,  512,  one_shuffle) \
-  X(sse42, cdouble, zgemm_kernel_ca,       1, 4,  128,  256,  one_shuffle) \
-  X(avx,   float,   sgemm_kernel_ca,       4, 8,  256,  1280, one_shuffle) \
-  X(avx,   double,  dgemm_kernel,          8, 4,  256,  512,  two_wide_inserts) \
-  X(avx,   cfloat,  cgemm_kernel_ca,       2, 4,  128,  512,  one_shuffle) \
-  X(avx,   cdouble, zgemm_kernel_ca,       1, 4,  128,  256,  one_shuffle)
+  X(def,   float,   base,  sgemm_kernel_112,      arithmetic) \
+  X(def,   double,  base,  dgemm_kernel_128,      thirteen_loads) \
+  X(def,   double,  def_a, dgemm_def_kernel,      arithmetic) \
+  X(def,   cfloat,  base,  cgemm_kernel_64,       arithmetic) \
+  X(def,   cdouble, base,  zgemm_kernel_64,       arithmetic) \
+  X(sse3,  float,   base,  sgemm_kernel_112,      arithmetic) \
+  X(sse3,  cfloat,  base,  cgemm_kernel_64,       arithmetic) \
+  X(sse3,  cdouble, base,  zgemm_kernel_64,       arithmetic) \
+  X(ssse3, float,   base,  sgemm_kernel,          arithmetic) \
+  X(ssse3, double,  base,  dgemm_kernel,          arithmetic) \
+  X(ssse3, cfloat,  base,  cgemm_kernel,          arithmetic) \
+  X(ssse3, cdouble, base,  zgemm_kernel,          arithmetic) \
+  X(ssse3, float,   sse41, sgemm_kernel_sse41_ca, arithmetic) \
+  X(ssse3, double,  sse41, dgemm_kernel_sse41_ca, two_shuffles) \
+  X(ssse3, cfloat,  sse41, cgemm_kernel_sse41_ca, arithmetic) \
+  X(ssse3, cdouble, sse41, zgemm_kernel_sse41_ca, arithmetic) \
+  X(sse42, float,   base,  sgemm_kernel_ca,       one_shuffle) \
+  X(sse42, double,  base,  dgemm_kernel_ca,       one_shuffle) \
+  X(sse42, cfloat,  base,  cgemm_kernel_ca,       one_shuffle) \
+  X(sse42, cdouble, base,  zgemm_kernel_ca,       one_shuffle) \
+  X(avx,   float,   base,  sgemm_kernel_ca,       one_shuffle) \
+  X(avx,   double,  base,  dgemm_kernel,          two_wide_inserts) \
+  X(avx,   cfloat,  base,  cgemm_kernel_ca,       one_shuffle) \
+  X(avx,   cdouble, base,  zgemm_kernel_ca,       one_shuffle)
 // clang-format on
 
 extern "C" {
-#define QTB_DECLARE(tier, T, name, mr, nr, depth, mb, step) Kernel<T> qtb_blas_##tier##_##name;
+#define QTB_DECLARE(tier, T, family, name, step) Kernel<T> qtb_blas_##tier##_##name;
 QTB_LISTED_KERNELS(QTB_DECLARE)
 #undef QTB_DECLARE
 EdgeKernel qtb_blas_sse3_dgemm_kernel_a112;
@@ -83,9 +89,19 @@ template <class T>
 struct Listed {
   const char *name;
   Kernel<T> *kernel;
-  QtbInt mr, nr, depth, mb;
+  tables::GemmBlocks blocks;
   const Step &step;
 };
+
+// The blocks of a large problem on this processor.
+tables::GemmBlocks large_blocks(const tables::GemmRules &rules) {
+  constexpr QtbInt size = 1000;
+  std::uint32_t caches[cache_size_entries];
+  qtb_serv_get_cache_sizes(caches);
+  tables::GemmBlocks blocks{};
+  fill_blocks(rules, size, size, size, caches, blocks);
+  return blocks;
+}
 
 // Rows that are a multiple of every mr, of which a panel lies in the second cache level, and columns that are a
 // multiple of every nr.
@@ -99,8 +115,9 @@ constexpr int turns = 100;
 template <class T>
 double best_rate(const Listed<T> &listed, QtbInt rows) {
   using R = Real<T>;
+  const QtbInt depth = listed.blocks.kb, mr = listed.blocks.mr, nr = listed.blocks.nr;
   const auto elements = [](QtbInt count) { return static_cast<std::size_t>(count) * sizeof(T); };
-  const std::size_t a_bytes = elements(rows * listed.depth), b_bytes = elements(columns * listed.depth);
+  const std::size_t a_bytes = elements(rows * depth), b_bytes = elements(columns * depth);
   const Memory a = allocate(a_bytes), b = allocate(b_bytes), c = allocate(elements(rows * columns)),
                stage = allocate(largest_stage_bytes);
   fill<R>(a.get(), a_bytes);
@@ -108,15 +125,14 @@ double best_rate(const Listed<T> &listed, QtbInt rows) {
   std::memset(c.get(), 0, elements(rows * columns));
   const auto run = [&](long count) {
     for (long i = 0; i < count; ++i)
-      listed.kernel(rows, columns, listed.depth, static_cast<const T *>(a.get()), listed.mr * listed.depth,
-                    static_cast<const T *>(b.get()), listed.nr * listed.depth, static_cast<T *>(c.get()), rows,
-                    static_cast<T *>(stage.get()));
+      listed.kernel(rows, columns, depth, static_cast<const T *>(a.get()), mr * depth, static_cast<const T *>(b.get()),
+                    nr * depth, static_cast<T *>(c.get()), rows, static_cast<T *>(stage.get()));
   };
   const long count = calibrate(run, turn_seconds);
   double best = 1e300;
   for (int i = 0; i < turns; ++i) best = std::min(best, seconds_per_call(run, count));
   constexpr double flops_per_product = is_complex<T> ? 8 : 2;
-  return flops_per_product * static_cast<double>(rows * columns * listed.depth) / best;
+  return flops_per_product * static_cast<double>(rows * columns * depth) / best;
 }
 
 template <class T>
@@ -125,10 +141,10 @@ void measure(const Listed<T> &listed, const CoreLimits &limits, const MixShares 
                       : listed.step.wide             ? limits.wide_double_flops
                                                      : limits.double_flops;
   const double most = listed.step.share == nullptr ? 1 : mixes.*listed.step.share;
-  const double rate = best_rate(listed, listed.mb);
-  std::printf("%-22s %5lld %5lld %9.1f %7.3f %7.3f %7.3f  %s\n", listed.name, static_cast<long long>(listed.depth),
-              static_cast<long long>(listed.mb), rate * 1e-9, rate / peak, best_rate(listed, few_rows) / peak, most,
-              listed.step.text);
+  const double rate = best_rate(listed, listed.blocks.mb);
+  std::printf("%-22s %5lld %5lld %9.1f %7.3f %7.3f %7.3f  %s\n", listed.name, static_cast<long long>(listed.blocks.kb),
+              static_cast<long long>(listed.blocks.mb), rate * 1e-9, rate / peak, best_rate(listed, few_rows) / peak,
+              most, listed.step.text);
 }
 
 }  // namespace
@@ -141,10 +157,13 @@ int main() {
   const MixShares mixes = measure_mix_shares();
   std::printf("%-22s %5s %5s %9s %7s %7s %7s  %s\n", "kernel", "depth", "rows", "GFLOP/s", "share", "few", "at most",
               "by its step");
-#define QTB_MEASURE(listed_tier, T, name, mr, nr, depth, mb, step) \
-  if (tier == tier_##listed_tier)                                  \
-    measure<T>({#name, qtb_blas_##listed_tier##_##name, mr, nr, depth, mb, step}, limits, mixes);
+#define QTB_BLOCKS(tier, T, family) \
+  large_blocks(tables::find_rules(tables::kind_of<T>, tier_##tier, tables::Family::family))
+#define QTB_MEASURE(listed_tier, T, family, name, step) \
+  if (tier == tier_##listed_tier)                       \
+    measure<T>({#name, qtb_blas_##listed_tier##_##name, QTB_BLOCKS(listed_tier, T, family), step}, limits, mixes);
   QTB_LISTED_KERNELS(QTB_MEASURE)
   if (tier == tier_sse3)
-    measure<double>({"dgemm_kernel_a112", sse3_dgemm_kernel_a112, 4, 4, 112, 480, arithmetic}, limits, mixes);
+    measure<double>({"dgemm_kernel_a112", sse3_dgemm_kernel_a112, QTB_BLOCKS(sse3, double, base), arithmetic}, limits,
+                    mixes);
 }

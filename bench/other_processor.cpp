@@ -11,8 +11,7 @@
 #include "service/cpuid.h"
 #include "service/platform/platform.h"
 
-#define QTB_CPUID_SYMBOL "_Z14platform_cpuidjj"  // of platform_cpuid; the linker wraps it
-
+// QTB_CPUID_SYMBOL is the symbol of platform_cpuid, which the linker wraps.
 CpuidRegisters real_cpuid(std::uint32_t leaf, std::uint32_t subleaf) __asm__("__real_" QTB_CPUID_SYMBOL);
 CpuidRegisters other_cpuid(std::uint32_t leaf, std::uint32_t subleaf) __asm__("__wrap_" QTB_CPUID_SYMBOL);
 

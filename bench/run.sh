@@ -44,9 +44,10 @@ instruction_set() {
 
 heading() { echo "== tier $tier: $1"; }
 
+library=$build/libqtb.so
+
 # compared NAME ARGUMENT...: this library beside what the arguments say, as NAME-<tier>.txt and .csv. A wrong result
 # shows in the file and fails the run at its end.
-library=$build/libqtb.so
 compared() {
   name=$1-$tier
   shift

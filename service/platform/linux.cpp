@@ -43,7 +43,7 @@ std::size_t platform_environment(const char *name, char *buffer, std::size_t siz
 // and a call of the system for each would be felt. It takes a few bytes of the room that the C library keeps for this.
 namespace {
 
-constexpr std::int32_t most_words = 4;
+constexpr std::int32_t most_words = 4;  // the library creates one
 std::atomic<std::int32_t> words_created{0};
 [[gnu::tls_model("initial-exec")]] thread_local void *words[most_words];
 

@@ -69,13 +69,15 @@ struct StagedKernel {
   static void run_staged(QTB_IN_PLACE_KERNEL_PARAMS(T)) {
     constexpr GemmRules rules = rules_of<T, family>;
     const QtbInt kp = round_up(depth, rules.ku), ldbp = kp * rules.nr;
+    T *const inner_stage = stage + ldbp;
     const auto multiply = [&](QtbInt j0, QtbInt w) __attribute__((always_inline)) {
       copies_of<T, family>.b[transb ? 1 : 0](&depth, &w, transb ? b + j0 : b + j0 * ldb, &ldb, stage, &ldbp, nullptr);
       if constexpr (aligned)
-        InnerKernel<T, family>::run_aligned(m, w, kp, ap, ldap, stage, ldbp, c + j0 * ldc, ldc, stage + ldbp);
+        InnerKernel<T, family>::run_aligned(m, w, kp, ap, ldap, stage, ldbp, c + j0 * ldc, ldc, inner_stage);
       else
-        InnerKernel<T, family>::run(m, w, kp, ap, ldap, stage, ldbp, c + j0 * ldc, ldc, stage + ldbp);
+        InnerKernel<T, family>::run(m, w, kp, ap, ldap, stage, ldbp, c + j0 * ldc, ldc, inner_stage);
     };
+    // A single micro-panel, as small products have it, is spared what goes ahead of the loop.
     if (n == panel_width(rules.nr, n)) return multiply(0, n);
     for (QtbInt j0 = 0, w; j0 < n; j0 += w) {
       w = panel_width(rules.nr, n - j0);

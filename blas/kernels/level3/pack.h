@@ -179,6 +179,7 @@ void pack_panels(QtbInt count, QtbInt depth, QtbInt padded, const T *src, QtbInt
                  const Change &change) {
   const QtbInt full = count / width, step = side_by_side ? 1 : ld;
   QtbInt left = count;
+  // Small products have edges only, and feel the steps that would come to nothing.
   if (full > 0) {
     pack_full<T, width, side_by_side, panels_per_line<T, width>>(full, depth, padded, src, ld, dst, ldp, change);
     left -= full * width;
