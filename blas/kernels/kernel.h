@@ -31,14 +31,23 @@ QTB_FOR_EACH_TIER(QTB_CHECK_RANK)
 #undef QTB_CHECK_RANK
 
 namespace qtb::QTB_TIER {
+
+// What the dispatch slots call of this tier. Kernels call each other by these declarations. They stand in the namespace
+// of the definitions, so that one whose shape or element type is not its slot's is an error.
+extern "C" {
+#define QTB_SLOT(name, shape, T, tiers) QTB_HIDDEN QTB_FUNCTION(shape, T, QTB_TIER_NAME(x##name));
+#include "blas/dispatch/slots.def"
+#undef QTB_SLOT
+}
+
 namespace {
 // The tier of this build, for if constexpr.
 constexpr ProcessorTier this_tier = QTB_TIER_EXPAND(tier_, QTB_TIER, );
 }  // namespace
 }  // namespace qtb::QTB_TIER
 
-// The procedure qtb_blas_<tier>_x<name> of a shape and type, whose body is a call of body with the same arguments.
-// In parentheses a body may hold commas: QTB_KERNEL(daxpy, axpy, double, (update<double, 4>)).
+// Defines the procedure qtb_blas_<tier>_x<name> of a shape and type; its body is a call of body with the same
+// arguments. In parentheses a body may hold commas: QTB_KERNEL(daxpy, axpy, double, (update<double, 4>)).
 #define QTB_KERNEL(name, shape, T, body)                                \
   extern "C" QTB_HIDDEN QTB_FUNCTION(shape, T, QTB_TIER_NAME(x##name)); \
   extern "C" QTB_FUNCTION(shape, T, QTB_TIER_NAME(x##name)) { return body(QTB_ARGS(shape)); }

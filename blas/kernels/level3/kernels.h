@@ -12,7 +12,7 @@
 #pragma once
 
 #include "blas/kernels/level3/copies.h"
-#include "blas/kernels/plain/plain.h"
+#include "blas/kernels/element.h"
 
 // The parameters of a tuned kernel, and of one that reads B in place.
 #define QTB_INNER_KERNEL_PARAMS(T) \

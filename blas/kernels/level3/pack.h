@@ -9,7 +9,7 @@
 #pragma once
 
 #include "blas/kernels/level3/tiles.h"
-#include "blas/kernels/plain/plain.h"
+#include "blas/kernels/element.h"
 #include "blas/kernels/simd/repeat.h"
 
 namespace qtb::QTB_TIER {

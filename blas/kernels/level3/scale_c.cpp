@@ -3,7 +3,7 @@
 // A beta of 0 stores zeros without reading C, a beta of 1 does nothing. Columns are walked in vectors, from a vector
 // boundary on where the column is long enough for the step to pay; each complex element is one full complex product.
 // No alignment is asked for. Fewer than one row or column: nothing is written.
-#include "blas/kernels/plain/plain.h"
+#include "blas/kernels/element.h"
 
 namespace qtb::QTB_TIER {
 namespace {

@@ -7,7 +7,7 @@
 // elements is formed as dot products. Every element is scaled and added once: beta*C + alpha*sum. A beta of 0 stores
 // without reading C. No alignment is asked for, and nothing outside the operands is read.
 #include "blas/kernels/level3/parts.h"
-#include "blas/kernels/plain/plain.h"
+#include "blas/kernels/element.h"
 #include "blas/kernels/simd/repeat.h"
 
 namespace qtb::QTB_TIER {

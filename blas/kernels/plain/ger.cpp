@@ -2,7 +2,7 @@
 //
 // A column whose element of y is zero is skipped: it is not read, and a NaN in x does not reach it. x and y do not
 // overlap A.
-#include "blas/kernels/plain/plain.h"
+#include "blas/kernels/element.h"
 
 namespace qtb::QTB_TIER {
 namespace {

@@ -5,7 +5,7 @@
 // is; the columns of C take multiples of the block's columns.
 #pragma once
 
-#include "blas/kernels/plain/plain.h"
+#include "blas/kernels/element.h"
 
 namespace qtb::QTB_TIER {
 namespace {

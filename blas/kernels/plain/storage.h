@@ -4,7 +4,7 @@
 // else of a column may be touched.
 #pragma once
 
-#include "blas/kernels/plain/plain.h"
+#include "blas/kernels/element.h"
 
 namespace qtb::QTB_TIER {
 namespace {

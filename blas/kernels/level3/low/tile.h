@@ -11,7 +11,7 @@
 #pragma once
 
 #include "blas/kernels/level3/low/step.h"
-#include "blas/kernels/plain/plain.h"
+#include "blas/kernels/element.h"
 #include "blas/kernels/simd/repeat.h"
 
 namespace qtb::QTB_TIER {

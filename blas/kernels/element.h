@@ -1,7 +1,7 @@
-// What the plain kernels share: option letters, the arithmetic of one element, strided vectors.
+// Elements as the kernels see them: option letters, the arithmetic of one element, strided vectors.
 //
-// The plain kernels are the published loops, one template for the four element types and all tiers. They need no
-// alignment and no workspace, and read and write the elements that the routine names and no others.
+// One template for the four element types and all tiers. Nothing here needs alignment or workspace, and nothing reads
+// or writes an element that its caller does not name.
 #pragma once
 
 #include "blas/kernels/simd/vec.h"
