@@ -3,7 +3,7 @@
 
 #include <memory>
 
-#include "tests/kernels/vector_routines.h"
+#include "tests/kernels/level1/vector_routines.h"
 #include "tests/support/guarded.h"
 
 namespace qtb::test {

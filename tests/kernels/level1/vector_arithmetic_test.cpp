@@ -6,7 +6,7 @@
 
 #include <limits>
 
-#include "tests/kernels/vector_routines.h"
+#include "tests/kernels/level1/vector_routines.h"
 
 namespace qtb::test {
 namespace {

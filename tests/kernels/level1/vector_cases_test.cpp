@@ -5,7 +5,7 @@
 #include <cmath>
 #include <limits>
 
-#include "tests/kernels/vector_routines.h"
+#include "tests/kernels/level1/vector_routines.h"
 #include "tests/support/address.h"
 
 namespace qtb::test {

@@ -3,7 +3,7 @@
 
 #include <algorithm>
 
-#include "tests/kernels/vector_routines.h"
+#include "tests/kernels/level1/vector_routines.h"
 
 namespace qtb::test {
 namespace {

@@ -1,0 +1,11 @@
+# Level 1 and the sparse vectors, tier by tier.
+qtb_add_test(extended_dot_test SOURCES kernels/level1/extended_dot_test.cpp LIBRARIES qtb_static)
+qtb_add_test(generated_rotations_test SOURCES kernels/level1/generated_rotations_test.cpp LIBRARIES qtb_static)
+qtb_add_test(norms_test SOURCES kernels/level1/norms_test.cpp LIBRARIES qtb_static)
+qtb_add_test(rotations_test SOURCES kernels/level1/rotations_test.cpp LIBRARIES qtb_static)
+qtb_add_test(searches_test SOURCES kernels/level1/searches_test.cpp LIBRARIES qtb_static)
+qtb_add_test(sparse_test SOURCES kernels/level1/sparse_test.cpp LIBRARIES qtb_static)
+qtb_add_test(vector_arithmetic_test SOURCES kernels/level1/vector_arithmetic_test.cpp LIBRARIES qtb_static SHARDS 2)
+qtb_add_test(vector_cases_test SOURCES kernels/level1/vector_cases_test.cpp LIBRARIES qtb_static)
+qtb_add_test(vector_memory_test SOURCES kernels/level1/vector_memory_test.cpp LIBRARIES qtb_static)
+qtb_add_test(vector_sweep_test SOURCES kernels/level1/vector_sweep_test.cpp LIBRARIES qtb_static SHARDS 2)
