@@ -19,7 +19,7 @@
 
 // The rules of all tiers stand in the build of each.
 #define QTB_TIER def
-#include "blas/kernels/level3/tiles.h"
+#include "blas/kernels/level3/gemm/tiles.h"
 
 namespace qtb::bench {
 namespace {

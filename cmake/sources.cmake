@@ -19,11 +19,11 @@ set(QTB_KERNEL_SOURCES
   blas/kernels/level1/sparse.cpp
   blas/kernels/level1/swap.cpp
   # level3
-  blas/kernels/level3/blocks.cpp
-  blas/kernels/level3/gemm.cpp
-  blas/kernels/level3/pack.cpp
-  blas/kernels/level3/scale_c.cpp
-  blas/kernels/level3/small.cpp
+  blas/kernels/level3/gemm/blocks.cpp
+  blas/kernels/level3/gemm/gemm.cpp
+  blas/kernels/level3/gemm/pack.cpp
+  blas/kernels/level3/gemm/scale_c.cpp
+  blas/kernels/level3/gemm/small.cpp
   # plain
   blas/kernels/plain/gemv.cpp
   blas/kernels/plain/ger.cpp
@@ -41,32 +41,32 @@ set(QTB_KERNEL_SOURCES
 
 # Compiled for some tiers only.
 set(QTB_KERNEL_SOURCES_def
-  blas/kernels/level3/low/def_kernels.cpp
-  blas/kernels/level3/low/dgemm_def.cpp
-  blas/kernels/level3/low/folding_gemm.cpp
-  blas/kernels/level3/low/folding_kernels.cpp
+  blas/kernels/level3/gemm/def/dgemm_kernel.cpp
+  blas/kernels/level3/gemm/def/dgemm.cpp
+  blas/kernels/level3/gemm/def/folding_gemm.cpp
+  blas/kernels/level3/gemm/def/folding_kernels.cpp
 )
 set(QTB_KERNEL_SOURCES_sse3
-  blas/kernels/level3/low/dgemm_sse3.cpp
-  blas/kernels/level3/low/folding_gemm.cpp
-  blas/kernels/level3/low/folding_kernels.cpp
-  blas/kernels/level3/low/sse3_kernels.cpp
+  blas/kernels/level3/gemm/sse3/dgemm.cpp
+  blas/kernels/level3/gemm/def/folding_gemm.cpp
+  blas/kernels/level3/gemm/def/folding_kernels.cpp
+  blas/kernels/level3/gemm/sse3/dgemm_kernel.cpp
 )
 set(QTB_KERNEL_SOURCES_ssse3
-  blas/kernels/level3/ssse3/gemm_kernel.cpp
+  blas/kernels/level3/gemm/ssse3/gemm_kernel.cpp
 )
 set(QTB_KERNEL_SOURCES_sse42
-  blas/kernels/level3/sse42/gemm_kernel.cpp
+  blas/kernels/level3/gemm/sse42/gemm_kernel.cpp
 )
 set(QTB_KERNEL_SOURCES_avx
-  blas/kernels/level3/avx/dgemm_kernel.cpp
-  blas/kernels/level3/sse42/gemm_kernel.cpp
+  blas/kernels/level3/gemm/avx/dgemm_kernel.cpp
+  blas/kernels/level3/gemm/sse42/gemm_kernel.cpp
 )
 set(qtb_tier_sources ${QTB_KERNEL_SOURCES_def} ${QTB_KERNEL_SOURCES_sse3} ${QTB_KERNEL_SOURCES_ssse3}
   ${QTB_KERNEL_SOURCES_sse42} ${QTB_KERNEL_SOURCES_avx})
 # Of these, the ones in the wider encoding: tests/product/mnemonics/vex_objects.txt has the same list.
 set(QTB_WIDE_KERNEL_SOURCES
-  blas/kernels/level3/avx/dgemm_kernel.cpp
+  blas/kernels/level3/gemm/avx/dgemm_kernel.cpp
 )
 
 # Vectorised by hand: what the compiler's own vectoriser adds is code that makes short and strided vectors slower, whose

@@ -1,0 +1,35 @@
+// What surrounds the blocked loops of this tier's GEMM bodies, by type: the small path and the scaling of C.
+//
+// small_path<T>: C := alpha*op(A)*op(B) + beta*C with the arguments of gemm, without packing (small.cpp).
+// scale_columns<T>: C := beta*C (scale_c.cpp).
+#pragma once
+
+#include "blas/kernels/level3/gemm/tiles.h"
+
+namespace qtb::QTB_TIER {
+
+#define QTB_PARTS(X) X(s, float) X(d, double) X(c, cfloat) X(z, cdouble)
+#define QTB_DECLARE_PARTS(t, T)                                                 \
+  extern "C" QTB_HIDDEN QTB_FUNCTION(gemm, T, QTB_TIER_NAME(x##t##gemm_small)); \
+  extern "C" QTB_HIDDEN QTB_FUNCTION(scale_c, T, QTB_TIER_NAME(x##t##gemm_scale_c));
+QTB_PARTS(QTB_DECLARE_PARTS)
+
+namespace {
+
+template <class T>
+using GemmProcedure = QTB_FUNCTION_TYPE(gemm, T);
+template <class T>
+using ScaleProcedure = QTB_FUNCTION_TYPE(scale_c, T);
+template <class T>
+constexpr GemmProcedure<T> *small_path = nullptr;
+template <class T>
+constexpr ScaleProcedure<T> *scale_columns = nullptr;
+#define QTB_NAME_PARTS(t, T)                                                   \
+  template <>                                                                  \
+  constexpr GemmProcedure<T> *small_path<T> = QTB_TIER_NAME(x##t##gemm_small); \
+  template <>                                                                  \
+  constexpr ScaleProcedure<T> *scale_columns<T> = QTB_TIER_NAME(x##t##gemm_scale_c);
+QTB_PARTS(QTB_NAME_PARTS)
+
+}  // namespace
+}  // namespace qtb::QTB_TIER

@@ -1,0 +1,212 @@
+// The inner kernels of the sse42 tier, which the avx tier shares in all types but double precision.
+//
+// C(0:m, 0:n) += Ap*Bp, m a multiple of mr, kp of 4, n any: packed panels in the format of tiles.h, their micro-panels
+// ldap and ldbp elements apart and on 16-byte boundaries. C is at any address, or, in the aligned form, on a 16-byte
+// boundary with ldc a multiple of 16 bytes. stage is on a 16-byte boundary.
+//
+// A vector of A holds the mr rows of one k, and a vector of B two columns, both without replication: its product with
+// the rows in order holds (a0*b0, a1*b1), the one with the rows exchanged in pairs (a1*b0, a0*b1). The two kinds are
+// summed apart over the whole depth, in a direct and a crossed accumulator, and sorted into columns only then. So the
+// depth loop holds one shuffle per k. With four lanes, rows 2 and 3 take part as rows 0 and 1 do, and two columns of B
+// come twice from an 8-byte load.
+//
+// The same loop makes the complex product: with real and imaginary parts in the place of the rows and with one column
+// of B in the place of two, the direct accumulator holds (ar*br, ai*bi) and the crossed one (ai*br, ar*bi). For this
+// the micro-panel of B is first copied to the stage, every element filling a vector.
+#pragma once
+
+#include <smmintrin.h>
+
+#include "blas/kernels/level3/gemm/kernels.h"
+#include "blas/kernels/simd/repeat.h"
+#include "blas/kernels/simd/vec.h"
+
+namespace qtb::QTB_TIER {
+namespace {
+
+// Depth of one turn of the depth loop, and of a panel's unit of depth, which one shorter turn may complete.
+constexpr QtbInt turn_depth = 8, unit_depth = 4;
+
+// Lanes 0 and 1 exchanged, and lanes 2 and 3. The integer shuffle writes another register than it reads.
+inline __m128 exchanged(__m128 v) { return _mm_castsi128_ps(_mm_shuffle_epi32(_mm_castps_si128(v), 0xB1)); }
+inline __m128d exchanged(__m128d v) { return _mm_castsi128_pd(_mm_shuffle_epi32(_mm_castpd_si128(v), 0x4E)); }
+
+// Even lanes of the first, odd lanes of the second.
+inline __m128 even_odd(__m128 even, __m128 odd) { return _mm_blend_ps(even, odd, 0b1010); }
+inline __m128d even_odd(__m128d even, __m128d odd) { return _mm_blend_pd(even, odd, 0b10); }
+
+// The real parts of two vectors of direct sums, and the imaginary parts of two of crossed sums.
+inline __m128 pairwise_differences(__m128 a, __m128 b) { return _mm_hsub_ps(a, b); }
+inline __m128d pairwise_differences(__m128d a, __m128d b) { return _mm_hsub_pd(a, b); }
+inline __m128 pairwise_sums(__m128 a, __m128 b) { return _mm_hadd_ps(a, b); }
+inline __m128d pairwise_sums(__m128d a, __m128d b) { return _mm_hadd_pd(a, b); }
+inline __m128 interleaved_low(__m128 a, __m128 b) { return _mm_unpacklo_ps(a, b); }
+inline __m128d interleaved_low(__m128d a, __m128d b) { return _mm_unpacklo_pd(a, b); }
+inline __m128 interleaved_high(__m128 a, __m128 b) { return _mm_unpackhi_ps(a, b); }
+inline __m128d interleaved_high(__m128d a, __m128d b) { return _mm_unpackhi_pd(a, b); }
+
+// direct += rows*b, crossed += exchanged*b, b a vector of B: two columns of real elements, or one staged element of a
+// complex column. The last pair of a step may overwrite the rows, and loads b once.
+//
+// In assembly, because compilers make one load and a copy of the two loads, and copies of registers are what slows this
+// loop down, not loads; and because they let sums wander from register to register, to meet the loop's end in memory.
+#define QTB_PAIR_OF_PRODUCTS(T, Loaded, load, mul, add)                                                            \
+  [[gnu::always_inline]] inline void add_pair(Vec<T> &direct, Vec<T> &crossed, Vec<T> rows, Vec<T> exchanged_rows, \
+                                              const T *b) {                                                        \
+    Vec<T> product;                                                                                                \
+    __asm__ volatile(load " %[b], %[p]\n\t" mul " %[r], %[p]\n\t" add " %[p], %[d]\n\t" load " %[b], %[p]\n\t" mul \
+                          " %[e], %[p]\n\t" add " %[p], %[c]"                                                      \
+                     : [d] "+&x"(direct), [c] "+&x"(crossed), [p] "=&x"(product)                                   \
+                     : [r] "x"(rows), [e] "x"(exchanged_rows), [b] "m"(*reinterpret_cast<const Loaded *>(b)));     \
+  }                                                                                                                \
+  [[gnu::always_inline]] inline void add_last_pair(Vec<T> &direct, Vec<T> &crossed, Vec<T> rows,                   \
+                                                   Vec<T> exchanged_rows, const T *b) {                            \
+    Vec<T> product;                                                                                                \
+    __asm__ volatile(load " %[b], %[p]\n\t" mul " %[p], %[r]\n\t" add " %[r], %[d]\n\t" mul " %[e], %[p]\n\t" add  \
+                          " %[p], %[c]"                                                                            \
+                     : [d] "+&x"(direct), [c] "+&x"(crossed), [r] "+&x"(rows), [p] "=&x"(product)                  \
+                     : [e] "x"(exchanged_rows), [b] "m"(*reinterpret_cast<const Loaded *>(b)));                    \
+  }
+QTB_PAIR_OF_PRODUCTS(float, AnyAddress<double>, "movddup", "mulps", "addps")
+QTB_PAIR_OF_PRODUCTS(double, __m128d_u, "movupd", "mulpd", "addpd")
+QTB_PAIR_OF_PRODUCTS(cfloat, __m128_u, "movups", "mulps", "addps")
+QTB_PAIR_OF_PRODUCTS(cdouble, __m128d_u, "movupd", "mulpd", "addpd")
+#undef QTB_PAIR_OF_PRODUCTS
+
+// A tile of C, mr rows and width columns, as sums: of each two real columns or each complex column one of either kind;
+// of a real column without a neighbour the direct one alone, which is the column as it stands. All of it is inlined,
+// the lambdas first, so that compilers see a tile in registers from their earliest passes on.
+template <class T, int width>
+struct Tile {
+  using V = Vec<T>;
+  static constexpr int columns_per_pair = is_complex<T> ? 1 : 2;
+  static constexpr int pairs = width / columns_per_pair, singles = width % columns_per_pair;
+  // What B holds of a pair, and what one k takes of A and of B, in elements: a staged column fills a vector.
+  static constexpr QtbInt pair_step = is_complex<T> ? lanes<T> : 2;
+  static constexpr QtbInt a_step = rules_of<T>.mr, b_step = pairs * pair_step + singles;
+
+  V direct[pairs + singles], crossed[pairs + singles];
+
+  [[gnu::always_inline]] void clear() {
+    repeat<pairs + singles>([&](auto q) __attribute__((always_inline)) {
+      direct[q.value] = zero<T>();
+      crossed[q.value] = zero<T>();
+    });
+  }
+
+  // += depth steps of k. The rows of a step are loaded and exchanged early in the step before.
+  template <int depth>
+  [[gnu::always_inline]] void add_turn(const T *a, const T *b) {
+    V rows = load_aligned(a), exchanged_rows = exchanged(rows);
+    repeat<depth>([&](auto k) __attribute__((always_inline)) {
+      V next_rows = rows, next_exchanged = exchanged_rows;
+      if constexpr (k.value + 1 < depth) {
+        a += a_step;
+        next_rows = load_aligned(a);
+        keep_in_place(next_rows);
+        next_exchanged = exchanged(next_rows);
+      }
+      repeat<pairs>([&](auto q) __attribute__((always_inline)) {
+        if constexpr (q.value + 1 < pairs + singles)
+          add_pair(direct[q.value], crossed[q.value], rows, exchanged_rows, b + q.value * pair_step);
+        else
+          add_last_pair(direct[q.value], crossed[q.value], rows, exchanged_rows, b + q.value * pair_step);
+      });
+      if constexpr (singles != 0) {
+        direct[pairs] = add(direct[pairs], mul(broadcast(b[width - 1]), rows));
+        keep_in_place(direct[pairs]);
+      }
+      rows = next_rows;
+      exchanged_rows = next_exchanged;
+      b += b_step;
+    });
+  }
+
+  // C += the tile, column by column.
+  template <bool aligned>
+  [[gnu::always_inline]] void update(T *c, QtbInt ldc) const {
+    if constexpr (is_complex<T>) {
+      repeat<(width + 1) / 2>([&](auto q) __attribute__((always_inline)) {
+        constexpr int left = 2 * q.value, right = left + 1 < width ? left + 1 : left;
+        const V re = pairwise_differences(direct[left], direct[right]);
+        const V im = pairwise_sums(crossed[left], crossed[right]);
+        update_column<aligned>(c + left * ldc, interleaved_low(re, im));
+        if constexpr (right != left) update_column<aligned>(c + right * ldc, interleaved_high(re, im));
+      });
+    } else {
+      repeat<pairs>([&](auto q) __attribute__((always_inline)) {
+        const V other = exchanged(crossed[q.value]);
+        update_column<aligned>(c + 2 * q.value * ldc, even_odd(direct[q.value], other));
+        update_column<aligned>(c + (2 * q.value + 1) * ldc, even_odd(other, direct[q.value]));
+      });
+      if constexpr (singles != 0) update_column<aligned>(c + (width - 1) * ldc, direct[pairs]);
+    }
+  }
+
+  template <bool aligned>
+  [[gnu::always_inline]] static void update_column(T *c, V sum) {
+    if constexpr (!aligned)
+      store_unaligned(c, add(sum, load_unaligned(c)));
+    else if constexpr (is_complex<T>)
+      store_unaligned(c, add(sum, load_aligned(c)));
+    else
+      store_aligned(c, add(sum, load_aligned(c)));
+  }
+};
+
+// The rows of A against one micro-panel of B.
+template <class T, int width, bool aligned>
+[[gnu::noinline]] void multiply_columns(QtbInt m, QtbInt kp, const T *ap, QtbInt ldap, const T *b, T *c, QtbInt ldc) {
+  using Block = Tile<T, width>;
+  constexpr QtbInt mr = rules_of<T>.mr;
+  for (; m > 0; m -= mr, ap += ldap, c += mr) {
+    // The rows of the next tile: a tile has 16 bytes of each column.
+    for (int j = 0; j < width; j++) _mm_prefetch(reinterpret_cast<const char *>(c + mr + j * ldc), _MM_HINT_T0);
+    Block tile;
+    tile.clear();
+    const T *a = ap, *bk = b;
+    for (QtbInt turns = kp / turn_depth; turns > 0; turns--) {
+      tile.template add_turn<turn_depth>(a, bk);
+      a += turn_depth * Block::a_step;
+      bk += turn_depth * Block::b_step;
+    }
+    if (kp % turn_depth != 0) tile.template add_turn<unit_depth>(a, bk);
+    tile.template update<aligned>(c, ldc);
+  }
+}
+
+// Every element of a micro-panel of B in a vector of its own: what fills one already, as it is. elements is a multiple
+// of unit_depth.
+template <class T>
+void stage_columns(QtbInt elements, const T *bp, T *stage) {
+  for (; elements > 0; elements -= unit_depth, bp += unit_depth, stage += unit_depth * lanes<T>)
+    repeat<unit_depth>([&](auto e) { store_aligned(stage + e.value * lanes<T>, load_repeated(bp + e.value)); });
+}
+
+template <class T, int width, bool aligned>
+void multiply_micro_panel(QtbInt m, QtbInt kp, const T *ap, QtbInt ldap, const T *bp, T *c, QtbInt ldc, T *stage) {
+  if constexpr (is_complex<T>) {
+    stage_columns(kp * width, bp, stage);
+    multiply_columns<T, width, aligned>(m, kp, ap, ldap, stage, c, ldc);
+  } else {
+    multiply_columns<T, width, aligned>(m, kp, ap, ldap, bp, c, ldc);
+  }
+}
+
+template <class T, bool aligned>
+void diagonal_kernel(QTB_INNER_KERNEL_PARAMS(T)) {
+  constexpr int nr = rules_of<T>.nr;
+  for (QtbInt width; n > 0; n -= width, bp += ldbp, c += width * ldc) {
+    width = panel_width(nr, n);
+    switch (width) {
+      case 1: multiply_micro_panel<T, 1, aligned>(m, kp, ap, ldap, bp, c, ldc, stage); break;
+      case 2: multiply_micro_panel<T, 2, aligned>(m, kp, ap, ldap, bp, c, ldc, stage); break;
+      case 3: multiply_micro_panel<T, 3, aligned>(m, kp, ap, ldap, bp, c, ldc, stage); break;
+      case 4: multiply_micro_panel<T, 4, aligned>(m, kp, ap, ldap, bp, c, ldc, stage); break;
+      default: multiply_micro_panel<T, nr, aligned>(m, kp, ap, ldap, bp, c, ldc, stage); break;
+    }
+  }
+}
+
+}  // namespace
+}  // namespace qtb::QTB_TIER
