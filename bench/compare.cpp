@@ -1,32 +1,39 @@
 // compare: this library beside another BLAS shared library, or beside itself under other settings, on the same calls.
 //
 //   compare --library LIBRARY [--tier 0..4] [--setting NAME=VALUE]...
-//           [--peer LIBRARY|self] [--peer-setting NAME=VALUE]... [--threads 1]
-//           [--routines ddot,dgemm] [--sizes 8,4000] [--increment 1]
-//           [--shapes 1000x1000x32] [--options NN,NT] [--alpha 1[,0]] [--beta 0[,0]]
-//           [--turns 21] [--seconds 0.5] [--csv FILE]
+//           [--peer LIBRARY|self] [--baseline LIBRARY] [--peer-setting NAME=VALUE]... [--threads 1]
+//           [--routines ddot,gemv,level2] [--options N,UNN|all]
+//           [--sizes 8,4000] [--shapes 1000x1000x32] [--bands 16] [--increments 1,2] [--spare 0]
+//           [--alpha 1[,0]] [--beta 0[,0]] [--turns 21] [--seconds 0.5] [--csv FILE]
 //
-// Vector routines run once per size. Matrix products run once per option letters and size (square) or shape, m x n x k.
-// Each case is measured in turns of at most so many seconds in all, each side in a process of its own (sides.h), which
-// reads the settings afresh: --threads holds for both sides, --setting for the first and --peer-setting for the second.
+// A routine is named in full, without its type letter, or as a level; without names all of Level 1 is run. Each case is
+// measured in turns of at most so many seconds in all, each side in a process of its own (sides.h), which reads the
+// settings afresh: --threads holds for both sides, --setting for the first and --peer-setting for the second.
+// --baseline is a peer with this library's conventions, such as a former build of it.
+//
+// A size is that of all dimensions, a shape one number for each dimension of a routine (m x n of gemv, n x k of syrk).
+// The options of a routine are its letters in the order of its arguments: N or T of gemv, UNN of trmv, LU of symm. Each
+// routine takes the ones of --options that it knows, or, without that, the first of each: left, upper, as it is, not
+// unit. Bands have so many diagonals on each side, arrays leading dimensions so many beyond their rows.
 //
 // A row: routine, options, case, this library's time per call and rate, the peer's rate, the ratio of the rates pair by
 // pair (median, lowest, highest; above 1 this library is faster), the share of what the core's own load, store and
-// arithmetic rates allow on that number of threads (vector routines: in cache; products: the arithmetic alone), and the
+// arithmetic rates allow on that number of threads (Levels 1 and 2: in cache; Level 3: the arithmetic alone), and the
 // cores that each side kept busy. The share is a median of pairs too: a loop of nothing but the work that bounds the
-// call takes its turns beside the sides. A product is first checked; where it is wrong, the row says so, nothing is
-// timed, and the exit status is 1. The file has the same as numbers, and the rate at the limit.
+// call takes its turns beside the sides. Levels 2 and 3 are first checked; where a result is wrong, the row says so,
+// nothing is timed, and the exit status is 1. The file has the same as numbers, and the rate at the limit.
 
 #include <algorithm>
 #include <cstdio>
 #include <cstdlib>
-#include <memory>
+#include <cstring>
+#include <optional>
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include "bench/calls.h"
 #include "bench/limits.h"
-#include "bench/products.h"
 #include "bench/sides.h"
 #include "bench/timing.h"
 #include "blas/tiers.h"
@@ -34,18 +41,17 @@
 namespace qtb::bench {
 namespace {
 
-struct Shape {
-  long m, n, k;
-};
+using calls::Problem;
+using calls::Scalar;
 
 struct Options {
   Side ours, peer;
   std::string csv;
-  std::vector<std::string> routines, letters{"NN"};
-  std::vector<long> sizes;
-  std::vector<Shape> shapes;
-  std::complex<double> alpha = 1, beta = 0;
-  long increment = 1, threads = 1;
+  std::vector<std::string> routines{"level1"}, letters;
+  std::vector<long> sizes, bands{16}, increments{1};
+  std::vector<std::vector<long>> shapes;
+  std::optional<Scalar> alpha, beta;  // the routine's own where not given
+  long spare = 0, threads = 1;
   int turns = 21;
   double seconds = 0.5;
   bool avx = false;  // the tier of this library's side
@@ -53,7 +59,7 @@ struct Options {
 
 struct Case {
   std::string routine, letters, label;
-  std::string numbers;  // m,n,k,increment for the file, empty where the routine has none
+  std::string numbers;  // m,n,k,band,increment for the file, empty where the routine has none
   double work;          // of a call: flops where there are any, bytes elsewhere
   Bound bound;          // of the busiest thread's part of a call
   const char *unit;
@@ -62,7 +68,8 @@ struct Case {
 
 // The first row of the file; `compare` writes the others in this order.
 constexpr const char *header =
-    "routine,options,m,n,k,increment,threads,ns,rate,peer_ns,peer_rate,unit,ratio,ratio_low,ratio_high,limit,share,"
+    "routine,options,m,n,k,band,increment,threads,ns,rate,peer_ns,peer_rate,unit,ratio,ratio_low,ratio_high,limit,"
+    "share,"
     "cores,peer_cores,outcome,peer_outcome";
 
 const char *name(Outcome outcome) {
@@ -137,47 +144,48 @@ bool compare(const Options &options, const CoreLimits &limits, const Case &item,
   return !failed(ours.outcome) && !failed(peer.outcome);
 }
 
-Case vector_case(const Options &options, const CoreLimits &limits, const Routine &routine, long n) {
-  const long increment = options.increment;
-  const double flops = call_flops(routine, n);
-  const double vectors = static_cast<double>(n) * static_cast<double>(type_bytes(routine.type)) / 16;
+// The avx tier's only kernel with 32-byte vectors is that of dgemm, which the other real products in double precision
+// are made of.
+Limit product_limit(const Options &options, const Routine &routine) {
+  if (options.avx && !routine.is_single && !routine.kind.complex) return &CoreLimits::wide_double_flops;
+  return routine.is_single ? &CoreLimits::single_flops : &CoreLimits::double_flops;
+}
+
+// What bounds a call: the arithmetic of Level 3, and the moves as well of the others.
+Bound find_call_bound(const Options &options, const CoreLimits &limits, const Routine &routine,
+                      const calls::Description &d) {
+  const double flops = d.work.flops(routine.kind.complex);
+  if (routine.level == 3) return {product_limit(options, routine), flops};
+  const double vectors_of_element = static_cast<double>(routine.element_bytes()) / 16;
+  return find_bound(limits, d.read() * vectors_of_element, d.written() * vectors_of_element, flops, routine.is_single);
+}
+
+bool has_axis(const Routine &routine, const char *axes) {
+  return routine.axes.find_first_of(axes) != routine.axes.npos;
+}
+
+Case make_case(const Options &options, const CoreLimits &limits, const Routine &routine, const std::string &letters,
+               const Problem &problem) {
+  const calls::Description d = routine.describe(problem, routine.kind);
   Case item;
   item.routine = routine.name;
-  item.label = std::to_string(n);
-  item.numbers = "," + std::to_string(n) + ",," + std::to_string(increment);
-  item.work = flops > 0 ? flops : call_bytes(routine, n);
+  item.letters = letters;
+  const auto number = [&](const char *axis, QtbInt value) {
+    if (!has_axis(routine, axis)) return std::string();
+    if (std::strchr("mnk", *axis) != nullptr) item.label += (item.label.empty() ? "" : "x") + std::to_string(value);
+    return std::to_string(value);
+  };
+  item.numbers = number("m", problem.m) + ',' + number("n", problem.n) + ',' + number("k", problem.k) + ',' +
+                 number("lb", problem.kl) + ',' + number("xy", problem.incx);
+  if (has_axis(routine, "lb")) item.label += " b" + std::to_string(problem.kl);
+  if (has_axis(routine, "xy") && problem.incx != 1) item.label += " inc " + std::to_string(problem.incx);
+  const double flops = d.work.flops(routine.kind.complex);
+  item.work = flops > 0 ? flops : call_bytes(routine, problem);
   item.unit = flops > 0 ? "GFLOP/s" : "GB/s";
-  item.bound = find_bound(limits, vectors * routine.read, vectors * routine.written, flops, routine.is_single());
+  item.bound = find_call_bound(options, limits, routine, d);
   item.bound.amount /= static_cast<double>(options.threads);
-  item.prepare = [&routine, n, increment](const Library &library) {
-    const auto operands = std::make_shared<Operands>(make_operands(routine, n, increment));
-    const Calls calls = bind(library, routine, n, increment, *operands);
-    if (!calls) return Prepared{};
-    return Prepared{[operands, calls](long count) { calls(count); }, true};
-  };
-  return item;
-}
-
-// The avx tier's only kernel with 32-byte vectors is that of dgemm.
-Limit limit_of(const Options &options, const Product &product) {
-  if (options.avx && product.routine == "dgemm") return &CoreLimits::wide_double_flops;
-  return product.is_single() ? &CoreLimits::single_flops : &CoreLimits::double_flops;
-}
-
-Case product_case(const Options &options, const Product &product) {
-  const auto numbers = [&](char separator) {
-    return std::to_string(product.m) + separator + std::to_string(product.n) + separator + std::to_string(product.k);
-  };
-  Case item;
-  item.routine = product.routine;
-  item.letters = {product.op_a, product.op_b};
-  item.label = numbers('x');
-  item.numbers = numbers(',') + ',';
-  item.work = product_flops(product);
-  item.unit = "GFLOP/s";
-  item.bound = {limit_of(options, product), item.work / static_cast<double>(options.threads)};
-  item.prepare = [product](const Library &library) {
-    const BoundProduct bound = bind_product(library, product);
+  item.prepare = [&routine, problem](const Library &library) {
+    const BoundCall bound = bind(library, routine, problem);
     return Prepared{bound.calls, bound.correct};
   };
   return item;
@@ -199,13 +207,13 @@ std::vector<std::string> split(const std::string &text, char separator) {
   return parts;
 }
 
-Shape parse_shape(const std::string &text) {
-  const std::vector<std::string> parts = split(text, 'x');
-  if (parts.size() != 3) fail("a shape is MxNxK: " + text);
-  return {std::stol(parts[0]), std::stol(parts[1]), std::stol(parts[2])};
+std::vector<long> parse_numbers(const std::string &text, char separator) {
+  std::vector<long> numbers;
+  for (const std::string &part : split(text, separator)) numbers.push_back(std::stol(part));
+  return numbers;
 }
 
-std::complex<double> parse_scalar(const std::string &text) {
+Scalar parse_scalar(const std::string &text) {
   const std::vector<std::string> parts = split(text, ',');
   if (parts.empty() || parts.size() > 2) fail("a scalar is REAL or REAL,IMAGINARY: " + text);
   return {std::stod(parts[0]), parts.size() == 2 ? std::stod(parts[1]) : 0};
@@ -222,6 +230,8 @@ Options parse(int argc, char **argv) {
     if (key == "--library")
       options.ours.path = value;
     else if (key == "--peer")
+      options.peer.path = value, options.peer.wide = value == "self";
+    else if (key == "--baseline")
       options.peer.path = value;
     else if (key == "--setting")
       options.ours.settings.push_back(value);
@@ -234,17 +244,21 @@ Options parse(int argc, char **argv) {
     else if (key == "--routines")
       options.routines = split(value, ',');
     else if (key == "--sizes")
-      for (const std::string &size : split(value, ',')) options.sizes.push_back(std::stol(size));
+      options.sizes = parse_numbers(value, ',');
     else if (key == "--shapes")
-      for (const std::string &shape : split(value, ',')) options.shapes.push_back(parse_shape(shape));
+      for (const std::string &shape : split(value, ',')) options.shapes.push_back(parse_numbers(shape, 'x'));
     else if (key == "--options")
       options.letters = split(value, ',');
     else if (key == "--alpha")
       options.alpha = parse_scalar(value);
     else if (key == "--beta")
       options.beta = parse_scalar(value);
-    else if (key == "--increment")
-      options.increment = std::stol(value);
+    else if (key == "--bands")
+      options.bands = parse_numbers(value, ',');
+    else if (key == "--increments")
+      options.increments = parse_numbers(value, ',');
+    else if (key == "--spare")
+      options.spare = std::stol(value);
     else if (key == "--turns")
       options.turns = std::stoi(value);
     else if (key == "--seconds")
@@ -255,13 +269,8 @@ Options parse(int argc, char **argv) {
       fail("unknown option " + key);
   }
   if (options.ours.path.empty()) fail("--library is needed");
-  for (const std::string &letters : options.letters)
-    if (letters.size() != 2 || letters.find_first_not_of("NTC") != letters.npos) fail("no such options: " + letters);
   if (options.sizes.empty() && options.shapes.empty()) options.sizes = {4000};
-  if (options.peer.path == "self")
-    options.peer.path = options.ours.path;
-  else
-    options.peer.wide = false;
+  if (options.peer.path == "self") options.peer.path = options.ours.path;
   // What both sides have in common comes first, so that the settings of a side go before it.
   if (!tier.empty()) set_environment("QTB_DEBUG_CPU_TYPE=" + tier);
   options.avx = tier == std::to_string(tier_avx);
@@ -270,24 +279,76 @@ Options parse(int argc, char **argv) {
   return options;
 }
 
+// ---- routines and options by name ----
+
+bool is_named(const Routine &routine, const std::string &name) {
+  return routine.name == name || routine.name.substr(1) == name || "level" + std::to_string(routine.level) == name;
+}
+
+// Every combination of a routine's letters that differs from the others.
+std::vector<std::string> all_letters(const Routine &routine) {
+  std::vector<std::string> words{""};
+  for (const char axis : routine.options()) {
+    std::vector<std::string> longer;
+    for (const std::string &word : words)
+      for (const char letter : calls::legal_letters(axis))
+        if (routine.knows(axis, letter)) longer.push_back(word + letter);
+    words = longer;
+  }
+  return words;
+}
+
+std::vector<std::string> letters_of(const Options &options, const Routine &routine) {
+  const std::vector<std::string> all = all_letters(routine);
+  if (options.letters.empty()) return {all.front()};
+  if (options.letters.front() == "all" || routine.options().empty()) return all;
+  std::vector<std::string> known;
+  for (const std::string &word : options.letters)
+    if (std::find(all.begin(), all.end(), word) != all.end()) known.push_back(word);
+  return known;
+}
+
+void set_letters(const Routine &routine, const std::string &letters, Problem &problem) {
+  for (std::size_t i = 0; i < letters.size(); ++i) problem.option(routine.options()[i]) = letters[i];
+}
+
+// The problems of one routine: every size and shape with every band and increment.
+std::vector<Problem> list_problems(const Options &options, const Routine &routine) {
+  std::vector<std::vector<long>> shapes = options.shapes;
+  std::string_view dimensions = routine.axes.substr(0, routine.axes.find_first_not_of(calls::size_axes));
+  for (const long size : options.sizes) shapes.emplace_back(dimensions.size(), size);
+  std::vector<Problem> problems;
+  for (const std::vector<long> &shape : shapes) {
+    if (shape.size() != dimensions.size()) continue;
+    for (const long band : has_axis(routine, "lb") ? options.bands : std::vector<long>{0})
+      for (const long increment : has_axis(routine, "xy") ? options.increments : std::vector<long>{1}) {
+        Problem problem;
+        for (std::size_t i = 0; i < shape.size(); ++i) problem.size(dimensions[i]) = shape[i];
+        problem.kl = problem.ku = band;
+        problem.incx = problem.incy = increment;
+        for (QtbInt &spare : problem.spare) spare = options.spare;
+        problem.alpha = options.alpha.value_or(routine.steady_alpha);
+        problem.beta = options.beta.value_or(routine.steady_beta);
+        problems.push_back(problem);
+      }
+  }
+  return problems;
+}
+
 std::vector<Case> list_cases(const Options &options, const CoreLimits &limits) {
   std::vector<Case> cases;
-  for (const Routine &routine : routines) {
-    const auto named = std::find(options.routines.begin(), options.routines.end(), routine.name);
-    if (!options.routines.empty() && named == options.routines.end()) continue;
-    for (const long size : options.sizes) cases.push_back(vector_case(options, limits, routine, size));
-  }
-  for (const std::string &routine : options.routines) {
-    if (!is_product(routine)) continue;
-    for (const std::string &letters : options.letters) {
-      const auto add = [&](long m, long n, long k) {
-        Product product{routine, letters[0], letters[1], m, n, k, options.alpha, options.beta};
-        if (!product.is_complex()) product.alpha = product.alpha.real(), product.beta = product.beta.real();
-        cases.push_back(product_case(options, product));
-      };
-      for (const long size : options.sizes) add(size, size, size);
-      for (const Shape &shape : options.shapes) add(shape.m, shape.n, shape.k);
+  for (const std::string &name : options.routines) {
+    bool found = false;
+    for (const Routine &routine : routines) {
+      if (!is_named(routine, name)) continue;
+      for (const std::string &letters : letters_of(options, routine))
+        for (Problem problem : list_problems(options, routine)) {
+          set_letters(routine, letters, problem);
+          cases.push_back(make_case(options, limits, routine, letters, problem));
+          found = true;
+        }
     }
+    if (!found) fail("no case of " + name);
   }
   return cases;
 }

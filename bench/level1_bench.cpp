@@ -21,27 +21,23 @@ constexpr long increments[] = {1, 3};
 constexpr long longest_strided = 1000000;                 // beyond that a stride only measures the memory again
 constexpr std::size_t copy_bytes = std::size_t{1} << 28;  // 256 MiB: far beyond any cache
 
-void run_case(benchmark::State &state, const Library &library, const Routine &routine, long n, long increment) {
-  Operands operands = make_operands(routine, n, increment);
-  const Calls calls = bind(library, routine, n, increment, operands);
+void run_case(benchmark::State &state, const Library &library, const Routine &routine,
+              const qtb::calls::Problem &problem) {
+  const BoundCall bound = bind(library, routine, problem);
   constexpr long batch = 16;  // calls per iteration, so that short calls are not lost in the loop of the harness
-  calls(1);
+  bound.calls(1);
   for (auto step : state) {
     static_cast<void>(step);
-    calls(batch);
+    bound.calls(batch);
   }
   using benchmark::Counter;
   const double made = static_cast<double>(state.iterations() * batch);
-  state.counters["GB/s"] = Counter(made * call_bytes(routine, n) / 1e9, Counter::kIsRate);
-  state.counters["GFLOP/s"] = Counter(made * call_flops(routine, n) / 1e9, Counter::kIsRate);
+  state.counters["GB/s"] = Counter(made * call_bytes(routine, problem) / 1e9, Counter::kIsRate);
+  state.counters["GFLOP/s"] = Counter(made * call_flops(routine, problem) / 1e9, Counter::kIsRate);
   state.counters["ns/call"] = Counter(made / 1e9, Counter::kIsRate | Counter::kInvert);
 }
 
-bool has_vector(const Routine &routine) { return routine.read + routine.written > 0; }
-bool is_sparse(const Routine &routine) {
-  const std::string kind = routine.kind;
-  return kind == "axpyi" || kind == "doti" || kind == "cdoti" || kind == "gthr" || kind == "sctr" || kind == "roti";
-}
+bool has_axis(const Routine &routine, char axis) { return routine.axes.find(axis) != routine.axes.npos; }
 
 std::string rate_text(double rate, const char *unit) {
   char text[64];
@@ -54,14 +50,19 @@ std::string rate_text(double rate, const char *unit) {
 int main(int argc, char **argv) {
   static const Library library = load_library(QTB_LIBRARY_PATH, true);
   for (const Routine &routine : routines) {
+    if (routine.level != 1) continue;
     for (const long increment : increments) {
-      if (increment != 1 && (is_sparse(routine) || !has_vector(routine))) continue;
+      if (increment != 1 && !has_axis(routine, 'x')) continue;
       for (const long n : sizes) {
-        if (!has_vector(routine) && n != sizes[0]) continue;
+        if (!has_axis(routine, 'n') && n != sizes[0]) continue;
         if (increment != 1 && n > longest_strided) continue;
+        qtb::calls::Problem problem;
+        problem.n = n;
+        problem.incx = problem.incy = increment;
+        problem.alpha = routine.steady_alpha, problem.beta = routine.steady_beta;
         const std::string name = std::string(routine.name) + "/" + std::to_string(n) + "/" + std::to_string(increment);
-        benchmark::RegisterBenchmark(name.c_str(), [&routine, n, increment](benchmark::State &state) {
-          run_case(state, library, routine, n, increment);
+        benchmark::RegisterBenchmark(name.c_str(), [&routine, problem](benchmark::State &state) {
+          run_case(state, library, routine, problem);
         })->UseRealTime();
       }
     }

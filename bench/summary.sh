@@ -24,11 +24,18 @@ table() {
       next
     }
     {
-      shape = $column["n"]
-      if ($column["m"] != "") {
-        shape = $column["m"] " x " $column["n"] " x " $column["k"]
-        if ($column["m"] == $column["n"] && $column["n"] == $column["k"]) shape = $column["n"]
+      shape = ""
+      is_square = 1
+      for (i = 1; i <= 3; i++) {
+        size = $column[substr("mnk", i, 1)]
+        if (size == "") continue
+        if (shape != "" && size != last) is_square = 0
+        shape = shape (shape == "" ? "" : " x ") size
+        last = size
       }
+      if (is_square) shape = last
+      if ($column["band"] != "") shape = shape ", band " $column["band"]
+      if ($column["increment"] != "" && $column["increment"] != 1) shape = shape ", increment " $column["increment"]
       row = $column["routine"] " | " $column["options"] " | " shape
       if (!(row in known)) { known[row] = 1; rows[++count] = row }
       ratio = $column["ratio"] > 0 ? sprintf("%.2f", $column["ratio"]) : "-"
