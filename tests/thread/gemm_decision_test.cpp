@@ -12,7 +12,7 @@
 #include <vector>
 
 #include "blas/thread/32e/level3/gemm_class.h"
-#include "blas/thread/32e/level3/gemm_worth.h"
+#include "blas/thread/32e/level3/gemm_decision.h"
 #include "tests/thread/gemm_rules.h"
 
 namespace {

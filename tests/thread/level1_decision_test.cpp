@@ -41,8 +41,8 @@ struct FakeProcess {
   const Answers &answers;
   Asked &asked;
   ProcessorTier tier() { return asked.note(ask_tier), answers.tier; }
-  std::int32_t max_threads() { return asked.note(ask_threads), answers.max_threads; }
-  std::int32_t dynamic() { return asked.note(ask_dynamic), answers.dynamic; }
+  QtbInt max_threads() { return asked.note(ask_threads), answers.max_threads; }
+  bool dynamic() { return asked.note(ask_dynamic), answers.dynamic == 1; }
   void cache_sizes(std::uint32_t *table) {
     asked.note(ask_cache);
     std::copy(std::begin(answers.cache), std::end(answers.cache), table);

@@ -5,23 +5,7 @@
 #include "blas/thread/32e/level1/xf_l1_decision.h"
 #include "blas/thread/32e/level1/xf_l1_omp.h"
 #include "blas/thread/drivers.h"
-#include "service/cache.h"
-#include "service/cpu.h"
-#include "service/threads.h"
-
-namespace qtb {
-namespace {
-
-// This process's answers to the decision's questions.
-struct ThisProcess {
-  static ProcessorTier tier() { return qtb_serv_cpu_detect(); }
-  static std::int32_t max_threads() { return qtb_serv_get_max_threads(domain_blas); }
-  static std::int32_t dynamic() { return qtb_serv_get_dynamic(); }
-  static void cache_sizes(std::uint32_t *table) { qtb_serv_get_cache_sizes(table); }
-};
-
-}  // namespace
-}  // namespace qtb
+#include "blas/thread/process.h"
 
 extern "C" {
 // The decision stands in a procedure of its own, so that a short vector goes to its slot by a load, a test and a jump.

@@ -1,19 +1,12 @@
 // How many threads a Level-1 call gets: a pure function of the routine's limits, the length, the increments and what
-// the process answers to four questions.
+// the process answers to four questions. process.h has the answers of this process.
 //
-// The questions are put one by one and only when their answers count, so that a short vector asks nothing at all: a
-// Process is any object with
-//   ProcessorTier tier()             the processor tier
-//   std::int32_t max_threads()       the largest number of threads that this call may use
-//   std::int32_t dynamic()           1 in dynamic mode
-//   void cache_sizes(std::uint32_t *table)   the cache table, cache_size_entries numbers
+// Asked in this order, and only when the answer counts: tier, max_threads, dynamic, cache_sizes.
 #pragma once
 
 #include <cstdint>
 
-#include "blas/tiers.h"
-#include "blas/types.h"
-#include "service/cache.h"
+#include "blas/thread/process.h"
 
 namespace qtb {
 
@@ -81,20 +74,17 @@ inline QtbInt level1_threads_large_cache(const Level1Limits &limits, QtbInt n, Q
   return threads;
 }
 
-// Only these two tiers have a parallel path at this level.
-inline bool tier_has_parallel_level1(ProcessorTier tier) { return tier == tier_ssse3 || tier == tier_sse42; }
-
 // The number of threads for a call, level1_serial or more. With dynamic mode off the user's count holds as it is.
 template <class Process>
 QtbInt level1_threads(const Level1Limits &limits, QtbInt n, QtbInt incx, QtbInt incy, Process &&process) {
   if (n < limits.min_n) return level1_serial;
   const ProcessorTier tier = process.tier();
-  if (!tier_has_parallel_level1(tier)) return level1_serial;
+  if (!tier_has_parallel_vectors(tier)) return level1_serial;
   if (tier == tier_ssse3 && n < limits.min_n_ssse3) return level1_serial;
   if (incx == 0 || incy == 0) return level1_serial;
   const QtbInt threads = process.max_threads();
   if (threads < 2) return level1_serial;
-  if (process.dynamic() != 1) return threads;
+  if (!process.dynamic()) return threads;
   if (tier == tier_sse42) return level1_threads_sse42(limits, n, threads);
   std::uint32_t cache_table[cache_size_entries];
   process.cache_sizes(cache_table);
@@ -106,10 +96,10 @@ QtbInt level1_threads(const Level1Limits &limits, QtbInt n, QtbInt incx, QtbInt 
 template <class Process>
 QtbInt level1_threads(const Level1PairLimits &limits, QtbInt n, QtbInt incx, QtbInt incy, Process &&process) {
   if (n < limits.min_n) return level1_serial;
-  if (!tier_has_parallel_level1(process.tier())) return level1_serial;
+  if (!tier_has_parallel_vectors(process.tier())) return level1_serial;
   if (incx == 0 || incy == 0) return level1_serial;
   if (process.max_threads() < 2) return level1_serial;
-  if (process.dynamic() != 1) return level1_serial;
+  if (!process.dynamic()) return level1_serial;
   return 2;
 }
 

@@ -7,11 +7,9 @@
 
 #include "blas/thread/32e/level1/xf_l1_omp.h"
 
-#include <omp.h>
-
 #include "blas/dispatch/slots.h"
 #include "blas/thread/32e/level1/xf_l1_share.h"
-#include "blas/thread/floating_state.h"
+#include "blas/thread/team.h"
 #include "service/memory.h"
 
 namespace qtb {
@@ -20,7 +18,7 @@ namespace {
 // What one thread of a team works on.
 template <class X, class Y>
 struct Piece {
-  QtbInt team, rank;
+  Team team;
   QtbInt len;
   X *x;
   Y *y;
@@ -29,17 +27,10 @@ struct Piece {
 // Calls body on every thread's piece, on a team of nthreads or of what the runtime gives, down to the caller alone.
 template <class X, class Y, class Body>
 void for_each_piece(QtbInt nthreads, QtbInt n, X *x, QtbInt incx, Y *y, QtbInt incy, Body body) {
-  const int requested = static_cast<int>(nthreads);
-  const unsigned callers_choice = floating_choice();
-#pragma omp parallel num_threads(requested)
-  {
-    const unsigned own_choice = take_floating_choice(callers_choice);
-    const QtbInt team = omp_get_num_threads();
-    const QtbInt rank = omp_get_thread_num();
-    const Level1Share share = level1_share(n, team, rank);
-    body(Piece<X, Y>{team, rank, share.len, x + level1_offset(share, n, incx), y + level1_offset(share, n, incy)});
-    take_floating_choice(own_choice);
-  }
+  run_team(nthreads, [&](const Team &team) {
+    const Level1Share share = level1_share(n, team.size, team.rank);
+    body(Piece<X, Y>{team, share.len, x + level1_offset(share, n, incx), y + level1_offset(share, n, incy)});
+  });
 }
 
 template <class T, auto slot>
@@ -82,8 +73,8 @@ T joined_dot(QTB_OMP_PARAMS_dot(T), PieceDot piece_dot) {
   T *const partial = allocated != nullptr ? allocated : local;
   QtbInt team = 1;
   for_each_piece(nthreads, *n, x, *incx, y, *incy, [=, &team](const auto &piece) {
-    if (piece.rank == 0) team = piece.team;
-    partial[piece.rank] = piece_dot(piece);
+    if (piece.team.rank == 0) team = piece.team.size;
+    partial[piece.team.rank] = piece_dot(piece);
   });
   // The result of a team of one stands as it is, a negative zero included.
   const T sum = team == 1 ? partial[0] : level1_sum(partial, team);

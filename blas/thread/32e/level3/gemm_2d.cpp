@@ -1,15 +1,14 @@
 // The strategies that cut C in both dimensions, or whose threads share packed panels. See gemm_strategies.h.
 //
-// A thread beyond the plan's nthreads has no iteration of any loop and passes the barriers. All threads compute the
+// A thread beyond the plan's nthreads has no share in any loop and passes the barriers. All threads compute the
 // same bounds, and so meet at the same barriers. Panels are written between one barrier and the next and read behind
 // it.
-
-#include <omp.h>
 
 #include "blas/thread/32e/level3/gemm_operands.h"
 #include "blas/thread/32e/level3/gemm_share.h"
 #include "blas/thread/32e/level3/gemm_slots.h"
 #include "blas/thread/32e/level3/gemm_strategies.h"
+#include "blas/thread/team.h"
 #include "service/memory.h"
 
 namespace qtb {
@@ -19,7 +18,7 @@ namespace {
 template <class T>
 void gemm_2d_grid(QTB_PARAMS_GEMM_STRATEGY(T)) {
   const GemmOperands<T> at = gemm_operands(plan, a, lda, b, ldb, c, ldc);
-  const QtbInt i = omp_get_thread_num();
+  const QtbInt i = this_team().rank;
   if (i >= plan->nthreads) return;
   const GemmTile tile = gemm_grid_tile(*m, *n, plan->grid_rows, plan->grid_cols, panel_set->mu, gemm_grid_columns, i);
   plan->kernel.gemm(transa, transb, &tile.rows, &tile.columns, k, alpha, at.a_at(tile.row, 0), lda,
@@ -31,8 +30,7 @@ template <class T>
 void gemm_2d_xgemm_p(QTB_PARAMS_GEMM_STRATEGY(T)) {
   (void)beta;
   const GemmOperands<T> at = gemm_operands(plan, a, lda, b, ldb, c, ldc);
-#pragma omp for schedule(static, 1) nowait
-  for (QtbInt i = 0; i < plan->nthreads; ++i) {
+  for (const QtbInt i : this_team().shares(plan->nthreads)) {
     const GemmTile tile = gemm_grid_tile(*m, *n, plan->grid_rows, plan->grid_cols, panel_set->mu, 1, i);
     for (QtbInt j = 0; j < tile.columns; j += plan->nb) {
       const QtbInt nc = at_most(plan->nb, tile.columns - j), column = tile.column + j;
@@ -68,6 +66,7 @@ constexpr QtbInt acopy_columns = 10000000;
 void dgemm_2d_acopy_n(QTB_PARAMS_GEMM_STRATEGY(double)) {
   (void)beta;
   const GemmOperands<double> at = gemm_operands(plan, a, lda, b, ldb, c, ldc);
+  const Team team = this_team();
   const QtbInt t = plan->nthreads, groups = plan->grid_rows, places = plan->grid_cols;
   const QtbInt mu = panel_set->mu, nu = panel_set->nu, ku = panel_set->ku;
   const QtbInt group_rows = multiple_below(*m / groups, mu), last_rows = *m - (t / places - 1) * group_rows;
@@ -78,8 +77,7 @@ void dgemm_2d_acopy_n(QTB_PARAMS_GEMM_STRATEGY(double)) {
       const bool by_rows = *k / places <= acopy_depth_by_rows;
       const QtbInt share =
           by_rows ? gemm_place_share(rows, places, acopy_row_unit) : gemm_place_share(kc, places, acopy_depth_unit);
-#pragma omp for schedule(static, 1)
-      for (QtbInt i = 0; i < t; ++i) {
+      for (const QtbInt i : team.shares(t)) {
         const QtbInt group = i / places, place = i % places, row = group * group_rows + ii;
         const QtbInt own_rows = group < groups - 1 ? rows : rows_of_last;
         double *const panel = shared_panel(plan->a_shared, group, panel_set->a_panel_bytes);
@@ -92,11 +90,11 @@ void dgemm_2d_acopy_n(QTB_PARAMS_GEMM_STRATEGY(double)) {
                       alpha);
         }
       }
+      team.meet();
       const QtbInt widest = at_most(acopy_columns, *n);
       for (QtbInt jj = 0; jj < *n; jj += widest) {
         const QtbInt nc = at_most(widest, *n - jj), column_share = gemm_place_share(nc, places, nu);
-#pragma omp for schedule(static, 1)
-        for (QtbInt i = 0; i < t; ++i) {
+        for (const QtbInt i : team.shares(t)) {
           const QtbInt group = i / places, row = group * group_rows + ii;
           const QtbInt own_rows = group < groups - 1 ? rows : rows_of_last;
           const GemmRange columns = gemm_place(nc, column_share, places, i % places);
@@ -105,6 +103,7 @@ void dgemm_2d_acopy_n(QTB_PARAMS_GEMM_STRATEGY(double)) {
                                &ld_a, at.b_at(kk, jj + columns.first), ldb, &gemm_one<double>,
                                at.c_at(row, jj + columns.first), ldc);
         }
+        team.meet();
       }
     }
   }
@@ -115,6 +114,7 @@ template <class T>
 void gemm_2d_bcopy(QTB_PARAMS_GEMM_STRATEGY(T)) {
   (void)beta;
   const GemmOperands<T> at = gemm_operands(plan, a, lda, b, ldb, c, ldc);
+  const Team team = this_team();
   const QtbInt t = plan->nthreads, mu = panel_set->mu, nu = panel_set->nu, ku = panel_set->ku;
   const GemmPairs pairs = gemm_pairs(*m, *n, t / 2, mu, nu);
   const QtbInt width = pairs.share > pairs.last ? pairs.share : pairs.last;
@@ -123,21 +123,21 @@ void gemm_2d_bcopy(QTB_PARAMS_GEMM_STRATEGY(T)) {
     const QtbInt columns = at_most(widest, pairs.share - jj), columns_of_last = at_most(widest, pairs.last - jj);
     for (QtbInt kk = 0; kk < *k; kk += plan->kb) {
       const QtbInt kc = at_most(plan->kb, *k - kk), kr = multiple_above(kc, ku), ld_b = nu * kr;
-#pragma omp for schedule(static, 1)
-      for (QtbInt i = 0; i < t; ++i) {
+      for (const QtbInt i : team.shares(t)) {
         if (i % 2 != 0) continue;
         const QtbInt nc = i < t - 2 ? columns : columns_of_last;
         plan->bcopy(&kc, &nc, at.b_at(kk, i / 2 * pairs.share + jj), ldb, shared_panel(plan->b_shared, i / 2, bytes),
                     &ld_b, nullptr);
       }
-#pragma omp for schedule(static, 1)
-      for (QtbInt i = 0; i < t; ++i) {
+      team.meet();
+      for (const QtbInt i : team.shares(t)) {
         const QtbInt row = i % 2 * pairs.rows, rows = i % 2 == 0 ? pairs.rows : at_least_0(*m - pairs.rows);
         const QtbInt nc = i < t - 2 ? columns : columns_of_last, column = i / 2 * pairs.share + jj;
         plan->kernel.bpacked(transa, transb, &rows, &nc, &kc, alpha, at.a_at(row, kk), lda, at.b_at(kk, column), ldb,
                              shared_panel(plan->b_shared, i / 2, bytes), &ld_b, &gemm_one<T>, at.c_at(row, column),
                              ldc);
       }
+      team.meet();
     }
   }
 }
@@ -180,8 +180,7 @@ void gemm_2d_abcopy(QTB_PARAMS_GEMM_STRATEGY(T)) {
   const QtbInt t = plan->nthreads, mu = panel_set->mu, nu = panel_set->nu, ku = panel_set->ku;
   const QtbInt mb = plan->mb, nb = plan->nb, kb = plan->kb;
   const QtbInt share = gemm_rows(*m, t, mu, 0).count, super_slabs = multiple_below(*n, t * nb);
-#pragma omp for schedule(static, 1) nowait
-  for (QtbInt i = 0; i < t; ++i) {
+  for (const QtbInt i : this_team().shares(t)) {
     if (share < 1) continue;
     const GemmRange own = gemm_rows(*m, t, mu, i);
     const QtbInt more_rows = own.count - share;

@@ -12,7 +12,7 @@ constexpr std::uint32_t gemm_small_l2_bytes = 3145728;
 // process answers has_sse41() and is_amd_family16(), which cost a query of the processor and are asked only where the
 // class depends on them. cache is the table of service/cache.h.
 template <class Process>
-GemmMachineClass gemm_machine_class(ProcessorTier tier, const std::uint32_t *cache, Process process) {
+GemmMachineClass gemm_machine_class(ProcessorTier tier, const std::uint32_t *cache, Process &&process) {
   switch (tier) {
     case tier_def: return process.is_amd_family16() ? machine_family16 : machine_plain;
     case tier_ssse3:

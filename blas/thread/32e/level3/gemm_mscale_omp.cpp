@@ -2,26 +2,19 @@
 
 #include "blas/thread/32e/level3/gemm_mscale_omp.h"
 
-#include <omp.h>
-
 #include "blas/thread/32e/level3/gemm_share.h"
 #include "blas/thread/32e/level3/gemm_slots.h"
-#include "blas/thread/floating_state.h"
+#include "blas/thread/team.h"
 
 namespace qtb {
 namespace {
 
 template <class T>
 void gemm_mscale(QtbInt nthreads, QTB_PARAMS_scale_c(T)) {
-  const int requested = static_cast<int>(nthreads);
-  const unsigned callers_choice = floating_choice();
-#pragma omp parallel num_threads(requested)
-  {
-    const unsigned own_choice = take_floating_choice(callers_choice);
-    const GemmRange columns = gemm_range(*n, omp_get_num_threads(), omp_get_thread_num());
+  run_team(nthreads, [&](const Team &team) {
+    const GemmRange columns = gemm_range(*n, team.size, team.rank);
     GemmSlots<T>::scale_c(m, &columns.count, beta, c + columns.first * *ldc, ldc);
-    take_floating_choice(own_choice);
-  }
+  });
 }
 
 }  // namespace

@@ -1,7 +1,12 @@
-// Whether threads pay for a GEMM, on the machine classes with a tuned set of strategies. On the others they always do.
+// Whether a GEMM takes threads, and how many: a pure function of the shape and of what the process answers. process.h
+// has the answers of this process.
+//
+// Asked in this order, and only of a problem that is not tiny: max_threads, tier, cache_sizes, what the machine class
+// depends on, and in_parallel where a single thread's problem may be cut.
 #pragma once
 
-#include "blas/types.h"
+#include "blas/thread/32e/level3/gemm_class.h"
+#include "blas/thread/process.h"
 
 namespace qtb {
 
@@ -13,8 +18,9 @@ constexpr bool gemm_is_tiny(QtbInt m, QtbInt n, QtbInt k) {
          (m <= gemm_serial_size && n <= gemm_serial_size && k <= gemm_serial_size);
 }
 
-// The worth test of one type: a measure of the work and one of the traffic of a pair of threads, and the depth, each
-// with its limit. Where the limits are shared, they are divided by half the number of threads.
+// The worth test of one type, on the machine classes with a tuned set of strategies: a measure of the work and one of
+// the traffic of a pair of threads, and the depth, each with its limit. Where the limits are shared, they are divided
+// by half the number of threads.
 struct GemmWorth {
   QtbInt least_half_m;  // of rows, below which threads do not pay; 0 for no such test
   bool least_columns;   // whether a column for each pair of threads is not enough
@@ -55,6 +61,41 @@ constexpr bool gemm_threads_pay(QtbInt m, QtbInt n, QtbInt k, QtbInt threads) {
 
   const QtbInt share = worth.limits_shared ? pairs : 1;
   return work > worth.work_limit / share || traffic > worth.traffic_limit / share || k > worth.depth_limit / share;
+}
+
+enum GemmRoad {
+  gemm_serial,     // one call of the dispatch slot, with the caller's own arguments
+  gemm_in_slices,  // the same in slices of rows
+  gemm_parallel
+};
+
+struct GemmDecision {
+  GemmRoad road;
+  QtbInt threads;  // to ask for; at least 2 on the parallel road
+  GemmMachineClass machine_class;
+  bool tuned;  // the class has tuned strategies, which add to C: it is scaled ahead of them
+  std::uint32_t cache[cache_size_entries];
+};
+
+// For m and n of at least 1 and a problem that is not tiny.
+template <class T, class Process>
+GemmDecision gemm_decision(QtbInt m, QtbInt n, QtbInt k, Process &&process) {
+  GemmDecision decision{};
+  decision.threads = process.max_threads();
+  const ProcessorTier tier = process.tier();
+  process.cache_sizes(decision.cache);
+  decision.machine_class = gemm_machine_class(tier, decision.cache, process);
+  if (decision.threads <= 1) {
+    // Only in real arithmetic, inside a parallel region of the caller's, on the one class that gains by it.
+    if constexpr (!is_complex<T>)
+      if (decision.machine_class == machine_sse41_small_l2 && process.in_parallel()) decision.road = gemm_in_slices;
+    return decision;
+  }
+  const GemmMachineClass machine = decision.machine_class;
+  decision.tuned = machine != machine_plain && machine != machine_avx && machine != machine_family16;
+  // Where strategies are not tuned, threads always pay.
+  if (!decision.tuned || gemm_threads_pay<T>(m, n, k, decision.threads)) decision.road = gemm_parallel;
+  return decision;
 }
 
 }  // namespace qtb
