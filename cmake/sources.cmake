@@ -73,7 +73,7 @@ set(QTB_WIDE_KERNEL_SOURCES
 # spare lanes can raise exceptions that the elements do not, and that moves tiles out of registers.
 set(qtb_hand_vectorised ${QTB_KERNEL_SOURCES} ${qtb_tier_sources})
 list(REMOVE_DUPLICATES qtb_hand_vectorised)
-list(FILTER qtb_hand_vectorised INCLUDE REGEX "^blas/kernels/level[13]/")
+list(FILTER qtb_hand_vectorised INCLUDE REGEX "^blas/kernels/level[1-3]/")
 set_property(SOURCE ${qtb_hand_vectorised} APPEND PROPERTY COMPILE_OPTIONS -fno-tree-vectorize)
 
 # The order of a pass that computes is that of its source: moved together, its loads and its counters make these loops

@@ -13,46 +13,15 @@
 #pragma once
 
 #include "blas/kernels/level1/tuning.h"
+#include "blas/kernels/simd/cursors.h"
 #include "blas/kernels/simd/repeat.h"
-#include "blas/kernels/simd/vec.h"
 
 namespace qtb::QTB_TIER {
 namespace {
 
 // ---- Cursors ----
 //
-// An operand of a pass, and how its vectors are reached; T is const for an operand that is only read. beyond is the
-// number of elements that a load takes from behind its own vector. Where a vector's elements lie side by side, at(k) is
-// the first.
-
-template <class T>
-struct Aligned {
-  static constexpr QtbInt beyond = 0;
-  T *p;
-  T *at(int k) const { return p + k * lanes<T>; }
-  auto load(int k) const { return load_aligned(at(k)); }
-  void store(int k, Vec<T> v) const { store_aligned(at(k), v); }
-  void advance(QtbInt elements) { p += elements; }
-};
-
-template <class T>
-struct Unaligned {
-  static constexpr QtbInt beyond = 0;
-  T *p;
-  T *at(int k) const { return p + k * lanes<T>; }
-  auto load(int k) const { return load_unaligned(at(k)); }
-  void store(int k, Vec<T> v) const { store_unaligned(at(k), v); }
-  void advance(QtbInt elements) { p += elements; }
-};
-
-template <class T>
-struct Halves {
-  static constexpr QtbInt beyond = 0;
-  T *p;
-  auto load(int k) const { return load_halves(p + k * lanes<T>); }
-  void store(int k, Vec<T> v) const { store_halves(p + k * lanes<T>, v); }
-  void advance(QtbInt elements) { p += elements; }
-};
+// beyond is the number of elements that a load takes from behind its own vector.
 
 template <class T>
 struct Strided {

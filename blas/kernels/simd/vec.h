@@ -202,8 +202,8 @@ inline __m128d swap_parts(__m128d v) { return _mm_castsi128_pd(_mm_shuffle_epi32
 inline __m128 alternate(float even, float odd) { return _mm_set_ps(odd, even, odd, even); }
 inline __m128d alternate(double even, double odd) { return _mm_set_pd(odd, even); }
 
-#if defined(__SSE3__)
 // The real and the imaginary parts of each element, twice.
+#if defined(__SSE3__)
 inline __m128 real_parts(__m128 v) { return _mm_moveldup_ps(v); }
 inline __m128d real_parts(__m128d v) { return _mm_movedup_pd(v); }
 inline __m128 imaginary_parts(__m128 v) { return _mm_movehdup_ps(v); }
@@ -213,6 +213,11 @@ inline __m128d load_imaginary_parts(const cdouble *p) { return _mm_loaddup_pd(pa
 // Even lanes subtracted, odd lanes added.
 inline __m128 add_subtract(__m128 a, __m128 b) { return _mm_addsub_ps(a, b); }
 inline __m128d add_subtract(__m128d a, __m128d b) { return _mm_addsub_pd(a, b); }
+#else
+inline __m128 real_parts(__m128 v) { return _mm_shuffle_ps(v, v, 0xA0); }
+inline __m128d real_parts(__m128d v) { return _mm_unpacklo_pd(v, v); }
+inline __m128 imaginary_parts(__m128 v) { return _mm_shuffle_ps(v, v, 0xF5); }
+inline __m128d imaginary_parts(__m128d v) { return _mm_unpackhi_pd(v, v); }
 #endif
 
 // The first parts of an operand in the highest count lanes, zeros below.
