@@ -153,14 +153,28 @@ void platform_yield() { sched_yield(); }
 
 namespace {
 
+// This library, or the program that it is linked into, as the loader knows it.
+void *own_handle() {
+  static const char inside = 0;
+  Dl_info information;
+  void *handle = nullptr;
+  return dladdr1(&inside, &information, &handle, RTLD_DL_LINKMAP) != 0 ? handle : nullptr;
+}
+
+// The folders are the loader's own list, with everything in it that may come from elsewhere than the environment of the
+// moment: run paths, what the variables held when the program started, and what became of their placeholders.
 bool search_path_is_absolute() {
-  const char *entry = std::getenv("LD_LIBRARY_PATH");
-  if (entry == nullptr || *entry == '\0') return true;
-  for (;; ++entry) {
-    if (*entry != '/' && *entry != '$') return false;  // $ORIGIN and its kin stand for absolute paths
-    entry += std::strcspn(entry, ":;");
-    if (*entry == '\0') return true;
-  }
+  void *const self = own_handle();
+  Dl_serinfo extent;
+  if (self == nullptr || dlinfo(self, RTLD_DI_SERINFOSIZE, &extent) != 0) return false;
+  auto *const list = static_cast<Dl_serinfo *>(std::malloc(extent.dls_size));
+  if (list == nullptr) return false;
+  list->dls_size = extent.dls_size;
+  list->dls_cnt = extent.dls_cnt;
+  bool absolute = dlinfo(self, RTLD_DI_SERINFO, list) == 0;
+  for (unsigned i = 0; absolute && i < list->dls_cnt; ++i) absolute = list->dls_serpath[i].dls_name[0] == '/';
+  std::free(list);
+  return absolute;
 }
 
 }  // namespace

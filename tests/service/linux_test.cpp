@@ -8,6 +8,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <filesystem>
+#include <sstream>
 #include <thread>
 
 #include "service/cache.h"
@@ -191,11 +192,13 @@ TEST(RealProbe, CountsAndGivesTheThreadTheProcessMask) {
   });
 }
 
-std::string facts(const char *what, const RunOptions &options) {
-  const Run run = run_program({QTB_TEST_FACTS, what}, options);
+std::string output_of(const std::vector<std::string> &command, const RunOptions &options) {
+  const Run run = run_program(command, options);
   EXPECT_EQ(run.status, 0) << run.output;
   return run.output;
 }
+
+std::string facts(const char *what, const RunOptions &options) { return output_of({QTB_TEST_FACTS, what}, options); }
 
 // What may bind or count threads in the environment that the tests are started in.
 const std::map<std::string, std::string> plain = {
@@ -228,16 +231,21 @@ TEST(ThreadBinding, OfTheWholeProcessLeavesOneThread) {
 
 const std::string none = "libqmalloc.so is absent\n";
 
-std::string allocator_facts(const std::string &search_path, const std::string &directory) {
+const std::string planted = QTB_TEST_QMALLOC "/complete";
+
+RunOptions in_directory(const std::string &directory, const std::string &search_path) {
   RunOptions options;
   options.environment["LD_LIBRARY_PATH"] = search_path;
   options.directory = directory;
-  return facts("allocator", options);
+  return options;
+}
+
+std::string allocator_facts(const std::string &search_path, const std::string &directory) {
+  return facts("allocator", in_directory(directory, search_path));
 }
 
 TEST(AllocatorLibrary, OnTheSearchPathServesIfItIsComplete) {
-  EXPECT_EQ(allocator_facts(QTB_TEST_QMALLOC "/complete", "/"),
-            "qmalloc is loaded\nlibqmalloc.so gave 3, took back 1\n");
+  EXPECT_EQ(allocator_facts(planted, "/"), "qmalloc is loaded\nlibqmalloc.so gave 3, took back 1\n");
 }
 
 TEST(AllocatorLibrary, ThatIsIncompleteIsLetGo) {
@@ -246,17 +254,87 @@ TEST(AllocatorLibrary, ThatIsIncompleteIsLetGo) {
 }
 
 TEST(AllocatorLibrary, PlantedInTheWorkingDirectoryIsNotLoaded) {
-  const std::string planted = QTB_TEST_QMALLOC "/complete";
   ASSERT_TRUE(std::filesystem::exists(planted + "/libqmalloc.so"));
   EXPECT_EQ(allocator_facts("", planted), none);
   EXPECT_EQ(allocator_facts("/nonexistent", planted), none);
 }
 
 TEST(AllocatorLibrary, PlantedInTheWorkingDirectoryIsNotLoadedThroughAnEmptyOrRelativeEntry) {
-  const std::string planted = QTB_TEST_QMALLOC "/complete";
   for (const char *path : {":", ";", ":/nonexistent", "/nonexistent:", "/nonexistent::/usr/lib", ".", "./",
                            "/usr/lib:.", "../complete", "/usr/lib;../complete"})
     EXPECT_EQ(allocator_facts(path, planted), none) << path;
+}
+
+// The loader knows some words behind a dollar sign, of which $ORIGIN alone stands for an absolute path; any other word
+// is the name of a folder as it stands.
+TEST(AllocatorLibrary, PlantedBelowTheWorkingDirectoryIsNotLoadedThroughAPlaceholder) {
+  namespace fs = std::filesystem;
+  char root[] = "/tmp/qtb_planted_XXXXXX";
+  ASSERT_NE(mkdtemp(root), nullptr);
+  for (const char *path : {"$LIB", "${LIB}", "$PLATFORM", "${PLATFORM}", "$X", "$HOME/lib", "/usr/lib:$LIB"}) {
+    std::istringstream folders(facts("folders", in_directory(root, path)));
+    int planted_in = 0;
+    for (std::string folder; std::getline(folders, folder);) {
+      if (folder[0] == '/') continue;
+      fs::create_directories(root / fs::path(folder));
+      fs::copy_file(planted + "/libqmalloc.so", root / fs::path(folder) / "libqmalloc.so",
+                    fs::copy_options::overwrite_existing);
+      ++planted_in;
+    }
+    EXPECT_EQ(planted_in, 1) << path;
+    EXPECT_EQ(allocator_facts(path, root), none) << path;
+  }
+  fs::remove_all(root);
+}
+
+TEST(AllocatorLibrary, BesideTheProgramServesThroughThePlaceholderForItsFolder) {
+  namespace fs = std::filesystem;
+  const std::string folder = fs::relative(planted, fs::path(QTB_TEST_FACTS).parent_path());
+  EXPECT_EQ(allocator_facts("$ORIGIN/" + folder, "/"), "qmalloc is loaded\nlibqmalloc.so gave 3, took back 1\n");
+}
+
+// The loader reads the variable when the program starts.
+TEST(AllocatorLibrary, IsLookedForWhereTheLoaderSearchesAndNotWhereTheVariableSaysByNow) {
+  for (const char *path : {".", ":", "../complete"})
+    EXPECT_EQ(facts("allocator-after-unset", in_directory(planted, path)), none) << path;
+  EXPECT_EQ(facts("allocator-after-unset", in_directory("/", planted)),
+            "qmalloc is loaded\nlibqmalloc.so gave 3, took back 1\n");
+}
+
+TEST(AllocatorLibrary, PlantedInTheWorkingDirectoryIsNotLoadedThroughARunPathOfTheProgram) {
+  for (const char *program : {QTB_TEST_FACTS_RPATH, QTB_TEST_FACTS_RUNPATH})
+    EXPECT_EQ(output_of({program, "allocator"}, in_directory(planted, "")), none) << program;
+}
+
+// ---- The product beside an allocator library ----
+
+const std::string right = "the product is right\n";
+
+std::string product_facts(const std::string &program, const RunOptions &options) {
+  return output_of({program, "product", QTB_TEST_LIBRARY}, options);
+}
+
+TEST(Product, TakesItsWorkBuffersFromTheAllocatorLibrary) {
+  const std::string output = product_facts(QTB_TEST_FACTS, in_directory("/", planted));
+  int given = 0, taken_back = -1;
+  ASSERT_EQ(
+      std::sscanf(output.c_str(), "qmalloc is loaded\nthe product is right\nlibqmalloc.so gave %d, took back %d\n",
+                  &given, &taken_back),
+      2)
+      << output;
+  EXPECT_GE(given, 2) << "a list and a buffer";
+  EXPECT_LT(taken_back, given);
+}
+
+TEST(Product, TakesNoneFromAPlantedOne) {
+  EXPECT_EQ(product_facts(QTB_TEST_FACTS, in_directory(planted, "")), right + none);
+  EXPECT_EQ(product_facts(QTB_TEST_FACTS, in_directory(planted, "$X:.")), right + none);
+  EXPECT_EQ(product_facts(QTB_TEST_FACTS_RPATH, in_directory(planted, "")), right + none);
+}
+
+TEST(Product, LetsAnIncompleteOneGo) {
+  EXPECT_EQ(product_facts(QTB_TEST_FACTS, in_directory("/", QTB_TEST_QMALLOC "/null_hook")),
+            "qmalloc is loaded\n" + right + none);
 }
 
 TEST(Libraries, AreFoundByNameAndTellTheirSymbols) {
