@@ -72,21 +72,26 @@ void create_thread_word() {
 
 MemThreadList *own_list() { return static_cast<MemThreadList *>(platform_tls_get(mm_tls_index.load(acquire))); }
 
-// A new list for this thread, in its word and in the table. Null where the table is full or memory is out.
+// A new list for this thread, in its word and in the table. Null where the table is full or memory is out. The
+// allocator is called outside the lock: it may take locks of its own, also ahead of a fork, which takes the service
+// lock as well.
 MemThreadList *create_list() {
   if (mm_list_count.load(relaxed) > list_limit) return nullptr;
+  void *memory = malloc_hook(sizeof(MemThreadList));
+  if (memory == nullptr) return nullptr;
+  MemThreadList *list = new (memory) MemThreadList{};
   qtb_serv_lock();
-  MemThreadList *list = nullptr;
   const std::int32_t index = mm_list_count.load(relaxed) + 1;
-  void *memory = index <= list_limit + 1 ? malloc_hook(sizeof(MemThreadList)) : nullptr;
-  if (memory != nullptr) {
-    list = new (memory) MemThreadList{};
+  const bool room = index <= list_limit + 1;  // others may have taken the last places meanwhile
+  if (room) {
     platform_tls_set(mm_tls_index.load(relaxed), list);
     mm_lists[index] = list;
     mm_list_count.store(index, relaxed);
   }
   qtb_serv_unlock();
-  return list;
+  if (room) return list;
+  free_hook(memory);
+  return nullptr;
 }
 
 // Memory for an entry. A failure is recorded like a success: the entry then holds null, for good.

@@ -286,6 +286,23 @@ TEST(Free, OfABufferWhoseThreadHasEnded) {
   });
 }
 
+// The allocator may give the memory to another thread as soon as it has it, and that thread may release it at once.
+TEST(Free, OfMemoryThatAListHasJustGivenUpGoesToTheAllocator) {
+  in_child([] {
+    fill_list({100, 200, 300, 400, 500});
+    allocator.on_release = [](void *given_up) {
+      allocator.on_release = nullptr;
+      allocator.live[given_up] = 100;
+      std::thread([=] { qtb_serv_free(given_up); }).join();
+    };
+    void *p = qtb_serv_malloc(600, 0);
+    ASSERT_EQ(allocator.releases.size(), 2U) << "a list took the other thread's release for its own buffer's";
+    EXPECT_EQ(allocator.releases[0], allocator.releases[1]);
+    EXPECT_EQ(allocator.live[p], 600U);
+    EXPECT_EQ(allocator.bad_releases, 0);
+  });
+}
+
 // ---- The switches ----
 
 TEST(Switches, AnyValueOfEitherTurnsTheListsOff) {
@@ -450,6 +467,22 @@ TEST(Lists, OneThreadWordServesAllThreads) {
   });
 }
 
+TEST(Lists, WhoeverFindsTheLastPlaceTakenGetsPlainMemory) {
+  with_service([] {
+    fake.no_thread_words = true;
+    for (std::size_t i = 1; i < most_lists; ++i) qtb_serv_malloc(1000, 128);
+    void *of_the_other = nullptr;
+    allocator.on_request = [&](std::size_t) {  // that of the list for the last place
+      allocator.on_request = nullptr;
+      std::thread([&] { of_the_other = qtb_serv_malloc(1000, 128); }).join();
+    };
+    void *plain = qtb_serv_malloc(1000, 128);
+    EXPECT_EQ(address(of_the_other) % 128, 0U);
+    EXPECT_EQ(address(plain) % 128, 16U);
+    EXPECT_EQ(allocator.releases.size(), 1U) << "the list without a place";
+  });
+}
+
 // ---- Threads ----
 
 // A buffer on its way between threads, with what its writer put in.
@@ -512,6 +545,27 @@ TEST(Lock, IsTakenAheadOfAForkAndReleasedBehindIt) {
     qtb_serv_prepare_fork();
     EXPECT_EQ(fake.before_fork, &qtb_serv_lock);
     EXPECT_EQ(fake.after_fork, &qtb_serv_unlock);
+  });
+}
+
+// An allocator with locks and fork handlers of its own would otherwise wait for the service lock, and a thread inside
+// the service for the allocator.
+TEST(Lock, IsFreeWheneverTheAllocatorIsCalled) {
+  with_service([] {
+    const auto take_the_lock = [] {  // not re-entrant: an alarm ends a case that holds it
+      qtb_serv_lock();
+      qtb_serv_unlock();
+    };
+    int requests = 0, releases = 0;
+    allocator.on_request = [&](std::size_t) { take_the_lock(), ++requests; };
+    allocator.on_release = [&](void *) { take_the_lock(), ++releases; };
+    std::vector<void *> held;
+    for (const std::uint64_t size : {1000, 2000, 3000, 4000, 5000, 6000, 50'000'000})
+      held.push_back(qtb_serv_malloc(size, 128));
+    for (void *buffer : held) qtb_serv_free(buffer);
+    qtb_serv_malloc(9000, 128);
+    EXPECT_EQ(requests, 9) << "the list, five buffers, two beyond the list, a replacement";
+    EXPECT_EQ(releases, 3);
   });
 }
 

@@ -4,6 +4,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <cstdlib>
+#include <functional>
 #include <map>
 #include <mutex>
 #include <vector>
@@ -23,11 +24,13 @@ struct RecordingAllocator {
   std::size_t failing_call = SIZE_MAX;  // the call, counted from 0, that returns null
   std::size_t failing_size = SIZE_MAX;  // every call for this size returns null
   int bad_releases = 0;                 // releases of what was not out
+  std::function<void(std::size_t)> on_request;  // called at the end of every request, with its size
+  std::function<void(void *)> on_release;       // called at the end of every release
   std::mutex mutex;
 };
 inline RecordingAllocator allocator;
 
-inline void *recording_malloc(std::size_t size) {
+inline void *recorded_request(std::size_t size) {
   const std::lock_guard guard(allocator.mutex);
   allocator.requests.push_back(size);
   if (allocator.requests.size() - 1 == allocator.failing_call || size == allocator.failing_size) return nullptr;
@@ -38,10 +41,19 @@ inline void *recording_malloc(std::size_t size) {
   return result;
 }
 
+inline void *recording_malloc(std::size_t size) {
+  void *const result = recorded_request(size);
+  if (allocator.on_request) allocator.on_request(size);
+  return result;
+}
+
 inline void recording_free(void *pointer) {
-  const std::lock_guard guard(allocator.mutex);
-  allocator.releases.push_back(pointer);
-  if (allocator.live.erase(pointer) == 0) ++allocator.bad_releases;
+  {
+    const std::lock_guard guard(allocator.mutex);
+    allocator.releases.push_back(pointer);
+    if (allocator.live.erase(pointer) == 0) ++allocator.bad_releases;
+  }
+  if (allocator.on_release) allocator.on_release(pointer);
 }
 
 inline void *unused_calloc(std::size_t, std::size_t) { std::abort(); }
