@@ -30,6 +30,7 @@ using namespace qtb::test;
 
 CpuidRegisters platform_cpuid(std::uint32_t leaf, std::uint32_t subleaf) {
   ++fake.cpuid_calls;
+  if (fake.on_cpuid) fake.on_cpuid();
   const FakeProcessor &processor = fake.processors[std::min(current_processor, fake.processors.size() - 1)];
   CpuidRegisters r = {};
   switch (leaf) {

@@ -6,6 +6,7 @@
 
 #include <atomic>
 #include <cstdint>
+#include <functional>
 #include <map>
 #include <mutex>
 #include <set>
@@ -43,6 +44,7 @@ struct FakeSystem {
 
   std::vector<FakeProcessor> processors{1};  // a processor beyond the list is like its last one
   std::atomic<int> cpuid_calls{0};
+  std::function<void()> on_cpuid;  // called by each of them, where it is set
 
   ProcessorSet process = {}, online = {};
   bool masks_known = true;

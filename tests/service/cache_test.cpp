@@ -139,6 +139,32 @@ TEST(CacheSizes, RacingReadersSeeAWholeTableThatOneOfThemFilled) {
   });
 }
 
+TEST(CacheSizes, AReaderDuringTheFirstFillWaitsForItsEnd) {
+  for (const int call : {1, 3, 5}) {
+    in_child([&] {
+      fake.processors[0].caches = {first_data, first_code, second, third};
+      Table found = {};
+      std::atomic<bool> reading{false}, done{false};
+      std::thread reader;
+      fake.on_cpuid = [&] {
+        if (fake.cpuid_calls != call) return;
+        reader = std::thread([&] {
+          reading = true;
+          qtb_serv_get_cache_sizes(found.data());
+          done = true;
+        });
+        while (!reading) std::this_thread::yield();
+        for (int ms = 0; ms < 50 && !done; ++ms) std::this_thread::sleep_for(std::chrono::milliseconds(1));
+        EXPECT_FALSE(done) << "the table is not whole yet";
+      };
+      qtb_serv_get_cache_sizes(nullptr);
+      reader.join();
+      EXPECT_EQ(found, (Table{3, 32768, 262144, 8388608, 0}));
+      EXPECT_EQ(fake.cpuid_calls, 5);
+    });
+  }
+}
+
 TEST(CacheSizes, TheServiceLockIsFreeAgainAfterTheFill) {
   in_child([] {
     qtb_serv_get_cache_sizes(nullptr);
