@@ -10,34 +10,88 @@
 namespace qtb {
 namespace {
 
-struct Rule {
-  QtbInt number;
-  bool kept;
-};
+// A rule holds the addresses of what it tests and reads them when its turn comes, so that nothing behind the first
+// illegal argument is read: a caller that got one wrong may have passed nothing usable for the others.
 
 bool is(const char *option, char letter) { return is_letter(*option, letter); }
 
-template <class... Letters>
-Rule option(QtbInt number, const char *value, Letters... letters) {
-  return {number, (is(value, letters) || ...)};
+struct Option {
+  QtbInt number;
+  const char *value;
+  char first, second, third;
+  // Either of two letters is three of them with the second twice.
+  bool kept() const { return is(value, first) || is(value, second) || is(value, third); }
+};
+Option option(QtbInt number, const char *value, char first, char second) {
+  return {number, value, first, second, second};
 }
-Rule dimension(QtbInt number, const QtbInt *value) { return {number, *value >= 0}; }
-Rule leading(QtbInt number, const QtbInt *value, const QtbInt *extent) {
-  return {number, *value >= (*extent > 1 ? *extent : 1)};
-}
-Rule band(QtbInt number, const QtbInt *value, QtbInt diagonals) { return {number, *value >= diagonals}; }
-Rule increment(QtbInt number, const QtbInt *value) { return {number, *value != 0}; }
-
-// Rows of band storage: the diagonals below and above and the main one. The sum wraps around in 64 bits.
-QtbInt diagonals(QtbInt below, QtbInt above) {
-  return static_cast<QtbInt>(static_cast<std::uint64_t>(below) + static_cast<std::uint64_t>(above) + 1);
+Option option(QtbInt number, const char *value, char first, char second, char third) {
+  return {number, value, first, second, third};
 }
 
-// The number of the first rule that is not kept, 0 if all are.
+struct Dimension {
+  QtbInt number;
+  const QtbInt *value;
+  bool kept() const { return *value >= 0; }
+};
+Dimension dimension(QtbInt number, const QtbInt *value) { return {number, value}; }
+
+// One of two extents, by whether an option is a letter.
+struct Extent {
+  const char *option;
+  char letter;
+  const QtbInt *where_it_is, *otherwise;
+};
+QtbInt read(const QtbInt *extent) { return *extent; }
+QtbInt read(const Extent &extent) { return is(extent.option, extent.letter) ? *extent.where_it_is : *extent.otherwise; }
+Extent by(const char *option, char letter, const QtbInt *where_it_is, const QtbInt *otherwise) {
+  return {option, letter, where_it_is, otherwise};
+}
+
+template <class AnyExtent>
+struct Leading {
+  QtbInt number;
+  const QtbInt *value;
+  AnyExtent extent;
+  bool kept() const {
+    const QtbInt least = read(extent);
+    return *value >= (least > 1 ? least : 1);
+  }
+};
+Leading<const QtbInt *> leading(QtbInt number, const QtbInt *value, const QtbInt *extent) {
+  return {number, value, extent};
+}
+Leading<Extent> leading(QtbInt number, const QtbInt *value, Extent extent) { return {number, value, extent}; }
+
+// Band storage has a row for every diagonal: those of the bandwidths and the main one. The sum wraps around in 64 bits.
+template <int bandwidths>
+struct Band {
+  QtbInt number;
+  const QtbInt *value;
+  const QtbInt *bandwidth[bandwidths];
+  bool kept() const {
+    std::uint64_t diagonals = 1;
+    for (const QtbInt *width : bandwidth) diagonals += static_cast<std::uint64_t>(*width);
+    return *value >= static_cast<QtbInt>(diagonals);
+  }
+};
+Band<1> band(QtbInt number, const QtbInt *value, const QtbInt *width) { return {number, value, {width}}; }
+Band<2> band(QtbInt number, const QtbInt *value, const QtbInt *below, const QtbInt *above) {
+  return {number, value, {below, above}};
+}
+
+struct Increment {
+  QtbInt number;
+  const QtbInt *value;
+  bool kept() const { return *value != 0; }
+};
+Increment increment(QtbInt number, const QtbInt *value) { return {number, value}; }
+
+// The number of the first rule that is not kept, 0 if all are. No rule behind it is looked at.
 template <class... Rules>
 QtbInt first_broken(Rules... rules) {
   QtbInt number = 0;
-  static_cast<void>(((rules.kept || (number = rules.number, false)) && ...));
+  static_cast<void>(((rules.kept() || (number = rules.number, false)) && ...));
   return number;
 }
 

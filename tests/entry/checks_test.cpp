@@ -9,6 +9,7 @@
 #include <cstring>
 #include <map>
 #include <random>
+#include <set>
 #include <sstream>
 #include <string>
 #include <utility>
@@ -176,14 +177,16 @@ class Arguments {
   explicit Arguments(const FamilyRules &family)
       : parameters_(words(family.parameters)), integers_(parameters_.size()), options_(4), nothing_(0) {}
 
-  // Calls the checker and returns the number that it reported, 0 for none.
-  QtbInt check(const Checker &checker, const Call &call) {
+  // Calls the checker and returns the number that it reported, 0 for none. The parameters of beyond are null.
+  QtbInt check(const Checker &checker, const Call &call, const std::set<std::string> &beyond = {}) {
     integers_.writable();
     options_.writable();
     std::vector<void *> pointers;
     std::size_t option = options_.size() - call.options.size();  // the last one ends at a trapping page
     for (std::size_t i = 0; i < parameters_.size(); ++i) {
-      if (const auto found = call.options.find(parameters_[i]); found != call.options.end()) {
+      if (beyond.count(parameters_[i]) != 0) {
+        pointers.push_back(nullptr);
+      } else if (const auto found = call.options.find(parameters_[i]); found != call.options.end()) {
         options_[option] = found->second;
         pointers.push_back(&options_[option++]);
       } else if (const auto integer = call.integers.find(parameters_[i]); integer != call.integers.end()) {
@@ -325,6 +328,38 @@ TEST(Checks, the_lowest_illegal_parameter_of_many) {
         words(family.options).size() + words(family.dimensions).size() + words(family.others).size();
     EXPECT_EQ(seen.size(), rules + 1) << checker.name << ": every rule must have been the first broken one";
   }
+}
+
+// Each rule broken alone, and nothing behind it: whoever got one argument wrong may have passed nothing for the others.
+TEST(Checks, nothing_behind_the_first_illegal_parameter_is_read) {
+  for (const Checker &checker : checkers) {
+    const FamilyRules &family = *rules_of(checker.name);
+    Arguments arguments(family);
+    std::vector<std::string> order;  // of the tests
+    for (const std::string &rule : words(family.options)) order.push_back(rule.substr(0, rule.find(':')));
+    for (const std::string &dimension : words(family.dimensions)) order.push_back(dimension);
+    for (const std::string &rule : words(family.others)) order.push_back(rule.substr(0, rule.find_first_of(">!")));
+    for (unsigned letter = 0; letter < 6; ++letter)
+      for (std::size_t broken = 0; broken < order.size(); ++broken) {
+        Call call = legal_call(family, letter, 4);
+        const bool is_increment = order[broken].rfind("inc", 0) == 0;
+        if (call.options.count(order[broken]) != 0)
+          call.options[order[broken]] = 'X';
+        else
+          call.integers[order[broken]] = is_increment ? 0 : -1;
+        const auto behind = order.begin() + static_cast<std::ptrdiff_t>(broken) + 1;
+        ASSERT_EQ(arguments.check(checker, call, {behind, order.end()}), position(family, order[broken]))
+            << checker.name << " " << order[broken];
+      }
+  }
+}
+
+TEST(Checks, dgemm_with_an_unknown_option_reports_parameter_1_also_without_any_other_argument) {
+  reported = {};
+  EXPECT_EQ(qtb_blas_errchk_dgemm("X", nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr,
+                                  nullptr, nullptr, nullptr),
+            1);
+  EXPECT_EQ(reported.info, 1);
 }
 
 TEST(Checks, dgemm_with_an_unknown_option_reports_parameter_1) {
