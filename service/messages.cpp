@@ -42,6 +42,7 @@ constexpr std::size_t path_size = 64;
 // The longest text of a catalogue that can be printed as it stands, with its terminator.
 constexpr std::size_t catalog_text_size = qtb::message_length_limit + 2;
 
+// Room for any text with its arguments and a terminator or a line end.
 constexpr std::size_t formatted_text_size = 1024;
 
 std::atomic<bool> msg_file_pending{true};
@@ -82,18 +83,26 @@ char next_conversion(const char **text) {
   return '\0';
 }
 
-void print_collapsed(const char *text) {
+// Writes a text that fits its buffer here, pairs of percent signs as one, and a line end: in one piece, so that the
+// lines of threads that print at once stay whole. Only standard output is flushed: another stream may be locked for as
+// long as its reader waits for input.
+void print_line(const char *text) {
+  char line[formatted_text_size];
+  std::size_t length = 0;
   for (; *text != '\0'; ++text) {
     if (text[0] == '%' && text[1] == '%') ++text;
-    std::putchar(*text);
+    line[length++] = *text;
   }
+  line[length++] = '\n';
+  std::fwrite(line, 1, length, stdout);
+  std::fflush(stdout);
 }
 
 [[noreturn]] void end_on_overflow(std::int32_t number, int length) {
   std::printf("\nQTB INTERNAL ERROR: message buffer overflow.");
-  std::fflush(nullptr);
+  std::fflush(stdout);
   std::printf("\n       Message N %d   Lenght: %d   Buffer size: %d\n", number, length, qtb::message_length_limit);
-  std::fflush(nullptr);
+  std::fflush(stdout);
   std::exit(qtb::message_overflow_status);
 }
 
@@ -133,9 +142,7 @@ void qtb_serv_print(std::int32_t, std::int32_t number, std::int32_t argument_cou
     text = formatted_text;
   }
   if (length - 1 > qtb::message_length_limit) end_on_overflow(number, length - 1);
-  print_collapsed(text);
-  std::putchar('\n');
-  std::fflush(nullptr);
+  print_line(text);
 }
 
 }  // extern "C"

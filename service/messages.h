@@ -28,11 +28,12 @@ inline constexpr int message_overflow_status = 8;
 
 extern "C" {
 
-// Prints message number with its arguments and a line end on standard output, and flushes. Number 0 is a line end
+// Prints message number with its arguments and a line end on standard output, and flushes it. Number 0 is a line end
 // alone. argument_count tells how many arguments follow, which must be of the types that the comment of the number
 // says; destination is accepted and has no effect. The text is the built-in one of the number, or that of the catalogue
 // qtb_msg.cat in the folder of the numeric locale, below the working directory, if there is one; it is looked for once
-// per process. An unknown number has an empty text. Threads that print at once may mix their lines, nothing else.
+// per process. An unknown number has an empty text. Threads that print at once mix whole lines, never their parts, and
+// no other stream than standard output is touched.
 QTB_HIDDEN void qtb_serv_print(std::int32_t destination, std::int32_t number, std::int32_t argument_count, ...);
 
 // Whether text asks for exactly the arguments that pattern asks for: the same plain conversions (a percent sign and a

@@ -3,10 +3,14 @@
 #include "service/messages.h"
 
 #include <gtest/gtest.h>
+#include <poll.h>
 #include <printf.h>
+#include <sys/socket.h>
 
 #include <csignal>
+#include <map>
 #include <random>
+#include <sstream>
 #include <string>
 #include <thread>
 #include <vector>
@@ -19,6 +23,7 @@ namespace {
 using qtb::test::capture_child;
 using qtb::test::fake_messages;
 using qtb::test::FakeMessages;
+using qtb::test::in_child;
 
 constexpr char name[] = "DGEMM ";
 const std::string builtin_6 = "QTB ERROR: Parameter 3 was incorrect on entry to DGEMM \n";
@@ -213,20 +218,96 @@ TEST(Messages, percent_signs_of_an_argument_stand_as_they_are_but_for_pairs) {
             "QTB FATAL ERROR: Cannot load %s%n%%d%\n");
 }
 
-TEST(Messages, threads_that_print_at_once_lose_nothing) {
+// Each write of standard output is a packet of its own here. However the stream is buffered, a message is one.
+TEST(Messages, a_message_is_one_write) {
+  for (const int buffering : {_IONBF, _IOLBF, _IOFBF}) {
+    int ends[2];
+    ASSERT_EQ(socketpair(AF_UNIX, SOCK_SEQPACKET, 0, ends), 0);
+    fake_messages = {};
+    in_child([&] {
+      std::setvbuf(stdout, nullptr, buffering, buffering == _IONBF ? 0 : BUFSIZ);
+      const int console = dup(STDOUT_FILENO);
+      dup2(ends[1], STDOUT_FILENO);
+      for (int i = 0; i < 3; ++i) qtb_serv_print(1, 6, 2, 3, name);
+      dup2(console, STDOUT_FILENO);
+    });
+    close(ends[1]);
+    char packet[1024];
+    for (int i = 0; i < 3; ++i) {
+      const ssize_t size = read(ends[0], packet, sizeof packet);
+      ASSERT_GE(size, 0);
+      EXPECT_EQ(std::string(packet, static_cast<std::size_t>(size)), builtin_6);
+    }
+    EXPECT_EQ(read(ends[0], packet, sizeof packet), 0) << "nothing is left";
+    close(ends[0]);
+  }
+}
+
+TEST(Messages, lines_of_threads_that_print_at_once_stay_whole) {
   fake_messages = {};
-  constexpr int thread_count = 8, prints = 50;
+  constexpr int thread_count = 8, prints = 200;
   const auto result = capture_child([] {
     std::vector<std::thread> threads;
     for (int t = 0; t < thread_count; ++t)
-      threads.emplace_back([] {
-        for (int i = 0; i < prints; ++i) qtb_serv_print(1, 6, 2, 3, name);
+      threads.emplace_back([t] {
+        const std::string own_name(static_cast<std::size_t>(t + 1), static_cast<char>('A' + t));
+        for (int i = 0; i < prints; ++i) qtb_serv_print(1, 6, 2, t, own_name.c_str());
       });
     for (std::thread &thread : threads) thread.join();
     _exit(fake_messages.opened);
   });
   EXPECT_EQ(result.exit_status, 1);
-  EXPECT_EQ(result.output.size(), thread_count * prints * builtin_6.size());
+  std::map<std::string, int> lines;
+  std::istringstream output(result.output);
+  for (std::string line; std::getline(output, line);) ++lines[line];
+  EXPECT_EQ(lines.size(), static_cast<std::size_t>(thread_count));
+  for (int t = 0; t < thread_count; ++t) {
+    const std::string own_name(static_cast<std::size_t>(t + 1), static_cast<char>('A' + t));
+    EXPECT_EQ(lines["QTB ERROR: Parameter " + std::to_string(t) + " was incorrect on entry to " + own_name], prints);
+  }
+}
+
+// Whoever reads holds the lock of the stream until input comes, which here it never does.
+TEST(Messages, a_message_goes_out_while_another_thread_waits_for_input) {
+  fake_messages = {};
+  int ends[2];
+  ASSERT_EQ(pipe(ends), 0);
+  const auto result = capture_child([&] {
+    dup2(ends[0], STDIN_FILENO);
+    std::thread([] {
+      char line[80];
+      if (std::fgets(line, sizeof line, stdin) != nullptr) std::abort();
+    }).detach();
+    while (ftrylockfile(stdin) == 0) {
+      funlockfile(stdin);
+      std::this_thread::yield();
+    }
+    qtb_serv_print(1, 0, 0);
+    qtb_serv_print(1, 6, 2, 3, name);
+    _exit(77);
+  });
+  EXPECT_EQ(result.exit_status, 77) << "an alarm ended the report";
+  EXPECT_EQ(result.output, "\n" + builtin_6);
+  close(ends[0]);
+  close(ends[1]);
+}
+
+TEST(Messages, other_streams_keep_what_they_hold) {
+  fake_messages = {};
+  int ends[2];
+  ASSERT_EQ(pipe(ends), 0);
+  in_child([&] {
+    std::FILE *const other = fdopen(ends[1], "w");
+    std::fputs("unfinished", other);
+    std::FILE *const console = stdout;
+    stdout = std::tmpfile();
+    qtb_serv_print(1, 6, 2, 3, name);
+    stdout = console;
+    pollfd ready = {ends[0], POLLIN, 0};
+    EXPECT_EQ(poll(&ready, 1, 0), 0);
+  });
+  close(ends[0]);
+  close(ends[1]);
 }
 
 // The arguments that the system's own printf would take for a text.
