@@ -121,6 +121,7 @@ set(QTB_CORE_SOURCES
 
 # The operating system behind service/platform/platform.h.
 set(QTB_PLATFORM_SOURCES
+  service/platform/catalog_file.cpp
   service/platform/linux.cpp
   service/platform/linux_messages.cpp
 )

@@ -1,13 +1,15 @@
-// Localised messages: POSIX message catalogues, and the locale as a published numeric language identifier.
+// Localised messages: the files of catalogues, and the locale as a published numeric language identifier.
 
 #include <fcntl.h>
-#include <nl_types.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <cerrno>
 #include <cstdlib>
 #include <cstring>
+#include <new>
 
+#include "service/platform/catalog_file.h"
 #include "service/platform/platform.h"
 
 namespace {
@@ -40,35 +42,22 @@ bool begins_with(const char *locale, const char *name) {
   return std::strncmp(locale, name, length) == 0 && !is_letter(locale[length]);
 }
 
-// How a catalogue of the GNU C library begins: behind it stand two tables, one per byte order, of size x depth entries
-// of three words.
-struct CatalogHeader {
-  std::uint32_t magic, size, depth;
-};
-constexpr std::uint32_t catalog_magic = 0x960408de;
-constexpr std::uint32_t swapped_magic = 0xde080496;
-constexpr std::uint64_t bytes_per_entry = 2 * 3 * sizeof(std::uint32_t);
+// A catalogue with a text of the greatest length for every message takes less than 1 MiB.
+constexpr std::size_t largest_catalog = std::size_t{4} << 20;
 
-// Whether a path is a plain file whose tables lie inside it. The system's reader believes the sizes in the header, and
-// a damaged one would end the process. Opened without waiting: the path may be a pipe.
-bool may_be_catalog(const char *path) {
-  const int file = open(path, O_RDONLY | O_NONBLOCK | O_CLOEXEC);
-  if (file < 0) return false;
-  struct stat status;
-  CatalogHeader header;
-  const bool plain = fstat(file, &status) == 0 && S_ISREG(status.st_mode);
-  const bool read_header = plain && read(file, &header, sizeof header) == sizeof header;
-  close(file);
-  if (!read_header) return false;
-  if (header.magic == swapped_magic) {
-    header.size = __builtin_bswap32(header.size);
-    header.depth = __builtin_bswap32(header.depth);
-  } else if (header.magic != catalog_magic) {
-    return false;
+// An open catalogue: the record, and behind it the bytes of the file that it points to.
+constexpr std::size_t record_size = sizeof(qtb::CatalogFile);
+
+// Reads up to size bytes from the start of a file. Fewer come where it ends early or cannot be read further.
+std::size_t read_bytes(int file, unsigned char *bytes, std::size_t size) {
+  std::size_t got = 0;
+  while (got < size) {
+    const ssize_t n = read(file, bytes + got, size - got);
+    if (n < 0 && errno == EINTR) continue;
+    if (n <= 0) break;
+    got += static_cast<std::size_t>(n);
   }
-  const std::uint64_t room = (static_cast<std::uint64_t>(status.st_size) - sizeof header) / bytes_per_entry;
-  const std::uint64_t entries = static_cast<std::uint64_t>(header.size) * header.depth;
-  return entries != 0 && entries <= room;
+  return got;
 }
 
 }  // namespace
@@ -85,17 +74,34 @@ unsigned long platform_message_locale() {
   return default_locale;
 }
 
+// Opened without waiting: the path may be a pipe. The file is read once, here, and only these bytes are used: whoever
+// may write to it cannot change what was found to be in order.
 void *platform_open_catalog(const char *path) {
-  if (!may_be_catalog(path)) return nullptr;
-  const nl_catd catalog = catopen(path, 0);
-  return catalog == reinterpret_cast<nl_catd>(-1) ? nullptr : catalog;
+  const int file = open(path, O_RDONLY | O_NONBLOCK | O_CLOEXEC);
+  if (file < 0) return nullptr;
+  struct stat status;
+  const bool plain = fstat(file, &status) == 0 && S_ISREG(status.st_mode);
+  unsigned char *memory = nullptr;
+  std::size_t size = 0;
+  if (plain && static_cast<std::uint64_t>(status.st_size) <= largest_catalog) {
+    size = static_cast<std::size_t>(status.st_size);
+    memory = static_cast<unsigned char *>(std::malloc(record_size + size));
+  }
+  if (memory != nullptr) size = read_bytes(file, memory + record_size, size);
+  close(file);
+  qtb::CatalogFile catalog;
+  if (memory == nullptr || !qtb::read_catalog(memory + record_size, size, &catalog)) {
+    std::free(memory);
+    return nullptr;
+  }
+  return new (memory) qtb::CatalogFile(catalog);
 }
 
 bool platform_catalog_message(void *catalog, std::int32_t number, char *buffer, std::size_t size) {
-  const char absent[] = "";
-  const char *text = catgets(catalog, NL_SETD, number, absent);
+  const char *text = qtb::catalog_text(*static_cast<const qtb::CatalogFile *>(catalog), number);
+  if (text == nullptr) return false;
   const std::size_t length = std::strlen(text);
-  if (text == absent || length >= size) return false;
+  if (length >= size) return false;
   std::memcpy(buffer, text, length + 1);
   return true;
 }

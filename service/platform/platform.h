@@ -59,9 +59,9 @@ void platform_yield();
 
 // ---- Libraries ----
 
-// Loads a library by plain file name from the system's search path. Null if absent, and also, with nothing looked for,
-// while an entry of that path is empty or relative: such an entry stands for the working directory of the moment, and
-// whoever may write there could plant a library.
+// Loads a library by plain file name from the folders that the system's loader searches for this library. Null if
+// absent, and also, with nothing looked for, where one of them is not an absolute path or the loader does not tell:
+// such an entry stands for the working directory of the moment, and whoever may write there could plant a library.
 void *platform_load_library(const char *name);
 void *platform_library_symbol(void *library, const char *name);
 void platform_unload_library(void *library);
@@ -71,7 +71,7 @@ void platform_unload_library(void *library);
 // The numeric identifier of the user's message locale, 1033 (United States English) where it has no number.
 unsigned long platform_message_locale();
 
-// Opens a message catalogue at a path, as a handle for the life of the process. Null if there is none.
+// Reads a message catalogue at a path, as a handle for the life of the process. Null if there is none.
 void *platform_open_catalog(const char *path);
 
 // Copies message number of a catalogue into buffer, zero-terminated, and returns true. Returns false where the

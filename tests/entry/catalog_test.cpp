@@ -14,6 +14,7 @@
 
 #include "service/messages.h"
 #include "service/platform/platform.h"
+#include "tests/service/catalog_bytes.h"
 #include "tests/support/child.h"
 
 namespace {
@@ -159,6 +160,55 @@ TEST_F(Catalog, a_damaged_catalogue_passes_no_other_conversions) {
       const std::string output = message_6();
       EXPECT_TRUE(output == builtin_6 || (output.find('3') < output.find("DGEMM") && output.back() == '\n')) << i;
     }
+}
+
+// Sizes of whole pages, behind which there may be anything or nothing, and offsets that lead there.
+TEST_F(Catalog, a_text_that_begins_or_ends_outside_the_file_is_not_used) {
+  using qtb::test::catalog_with_message_6;
+  const std::size_t tables = catalog_with_message_6(0, "").size();
+  const std::string text = "last %d %s", zero_byte(1, '\0');
+  for (const std::size_t file_size : {std::size_t{4096}, std::size_t{8192}, std::size_t{2} << 20}) {
+    const auto size = static_cast<std::uint32_t>(file_size - tables);
+    const std::string before(size - text.size() - 1, 'x');
+    const auto begin = static_cast<std::uint32_t>(before.size());
+    write("1033", catalog_with_message_6(begin, before + text + zero_byte));
+    EXPECT_EQ(message_6(), "last 3 DGEMM \n") << file_size << ": a text up to the end";
+    write("1033", catalog_with_message_6(begin + 1, before + 'x' + text));
+    EXPECT_EQ(message_6(), builtin_6) << file_size << ": no zero byte";
+    for (const std::uint32_t beyond : {size, size + 1, size + 12, size + 4096, 1U << 30, UINT32_MAX}) {
+      write("1033", catalog_with_message_6(beyond, before + text + zero_byte));
+      EXPECT_EQ(message_6(), builtin_6) << file_size << ": begins at " << beyond;
+    }
+  }
+}
+
+TEST_F(Catalog, a_file_larger_than_all_messages_need_is_not_used) {
+  const std::string text = "large %d %s" + std::string(1, '\0');
+  const auto with_size = [&](std::size_t size) {
+    std::string bytes = qtb::test::catalog_with_message_6(0, text);
+    bytes.resize(size);
+    write("1033", bytes);
+  };
+  with_size(std::size_t{4} << 20);
+  EXPECT_EQ(message_6(), "large 3 DGEMM \n");
+  with_size((std::size_t{4} << 20) + 1);
+  EXPECT_EQ(message_6(), builtin_6);
+}
+
+// What was read at the first message is what is used to the end, whatever becomes of the file.
+TEST_F(Catalog, a_file_that_changes_after_it_was_read_changes_nothing) {
+  make("1033", "6 parameter %d of %s is bad\n7 " + std::string(6000, 'x') + "\n8 later %s\n");
+  const auto result = qtb::test::capture_child([&] {
+    setenv("LC_ALL", "C", 1);
+    if (chdir(directory_.c_str()) != 0) _exit(1);
+    qtb_serv_print(1, 6, 2, 3, "DGEMM ");
+    fs::resize_file(directory_ / "1033" / "qtb_msg.cat", 0);
+    qtb_serv_print(1, 8, 1, "DGEMM ");
+    write("1033", std::string(20000, '%'));
+    qtb_serv_print(1, 6, 2, 3, "DGEMM ");
+  });
+  EXPECT_EQ(result.exit_status, 0);
+  EXPECT_EQ(result.output, "parameter 3 of DGEMM  is bad\nlater DGEMM \nparameter 3 of DGEMM  is bad\n");
 }
 
 TEST_F(Catalog, a_folder_or_a_pipe_in_its_place_is_not_used) {

@@ -14,3 +14,7 @@ foreach(name catalog_text xerbla)
   target_compile_definitions(${name}_corpus_test PRIVATE
     QTB_TEST_CORPUS="${PROJECT_SOURCE_DIR}/tests/fuzz/corpus/${name}")
 endforeach()
+qtb_add_test(catalog_file_corpus_test SOURCES fuzz/replay_test.cpp fuzz/catalog_file_fuzz.cpp
+  LIBRARIES qtb_platform_static)
+target_compile_definitions(catalog_file_corpus_test PRIVATE
+  QTB_TEST_CORPUS="${PROJECT_SOURCE_DIR}/tests/fuzz/corpus/catalog_file")

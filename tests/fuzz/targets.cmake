@@ -26,6 +26,7 @@ function(qtb_add_fuzz name)
   set_tests_properties(${name}_fuzz.search PROPERTIES LABELS long TIMEOUT ${limit})
 endfunction()
 
+qtb_add_fuzz(catalog_file SOURCES fuzz/catalog_file_fuzz.cpp LIBRARIES qtb_platform_static)
 qtb_add_fuzz(catalog_text SOURCES fuzz/catalog_text_fuzz.cpp platform/fake_messages.cpp LIBRARIES qtb_static)
 qtb_add_fuzz(environment SOURCES fuzz/environment_fuzz.cpp LIBRARIES qtb_static qtb_platform_fake)
 qtb_add_fuzz(xerbla SOURCES fuzz/xerbla_fuzz.cpp platform/fake_messages.cpp LIBRARIES qtb_static)

@@ -7,6 +7,7 @@ qtb_add_test(cores_test SOURCES service/cores_test.cpp LIBRARIES qtb_static qtb_
 qtb_add_test(threads_test SOURCES service/threads_test.cpp LIBRARIES qtb_static qtb_platform_fake)
 qtb_add_test(override_test SOURCES service/override_test.cpp LIBRARIES qtb_static qtb_platform_fake)
 qtb_add_test(memory_test SOURCES service/memory_test.cpp LIBRARIES qtb_static qtb_platform_fake)
+qtb_add_test(catalog_file_test SOURCES service/catalog_file_test.cpp LIBRARIES qtb_platform_static)
 
 # On the real operating system: a program that is started under different circumstances, and an allocator library.
 function(add_service_facts name)
