@@ -1,7 +1,7 @@
 /*
  * QTB: dense linear-algebra kernels for 64-bit x86. The Basic Linear Algebra Subprograms of levels 1, 2 and 3 and the
- * sparse ones of level 1, in lower and upper case, for C and C++. One comment stands above all the types of a family;
- * the file is long because every routine has its prototype.
+ * sparse ones of level 1, in lower and upper case, for C from C99 on and C++ from C++98 on. One comment stands above
+ * all the types of a family; the file is long because every routine has its prototype.
  *
  * Calling convention
  *   Every argument is a pointer to the caller's variable, also scalars, dimensions and options; QTBGetVersionString
@@ -641,9 +641,9 @@ void QTBGetVersionString(char *buffer, int32_t length);
 
 /* ---- The upper-case names, each the same routine ---- */
 
-#ifdef __cplusplus
+#if defined(__cplusplus) && (__cplusplus >= 201103L || defined(_MSC_VER))
 #define QTB_UPPER_CASE(name, NAME) extern decltype(name) NAME;
-#else
+#else /* what compilers have of it in C, and in C++ before it was standard */
 #define QTB_UPPER_CASE(name, NAME) extern __typeof__(name) NAME;
 #endif
 
