@@ -30,7 +30,8 @@ foreach(variant complete three_hooks null_hook)
 endforeach()
 qtb_add_test(linux_test SOURCES service/linux_test.cpp LIBRARIES qtb_static qtb_platform_static)
 target_compile_definitions(linux_test PRIVATE QTB_TEST_FACTS="$<TARGET_FILE:service_facts>"
-  QTB_TEST_FACTS_RPATH="$<TARGET_FILE:service_facts_rpath>" QTB_TEST_FACTS_RUNPATH="$<TARGET_FILE:service_facts_runpath>"
+  QTB_TEST_FACTS_RPATH="$<TARGET_FILE:service_facts_rpath>"
+  QTB_TEST_FACTS_RUNPATH="$<TARGET_FILE:service_facts_runpath>"
   QTB_TEST_LIBRARY="$<TARGET_FILE:qtb>" QTB_TEST_QMALLOC="${CMAKE_CURRENT_BINARY_DIR}/qmalloc")
 add_dependencies(linux_test qtb service_facts service_facts_rpath service_facts_runpath
   qmalloc_complete qmalloc_three_hooks qmalloc_null_hook)

@@ -12,6 +12,14 @@
 
 namespace qtb::test {
 
+// What a limit in seconds is multiplied with where every load and store is watched: such code is several times slower,
+// and threads that spin for a lock on a busy machine keep the one that holds it waiting all the longer.
+#if defined(QTB_WATCHED)
+inline constexpr unsigned patience = 10;
+#else
+inline constexpr unsigned patience = 1;
+#endif
+
 // Runs body in a forked child, ended by an alarm after so many seconds, and fails if the child fails or dies. What the
 // child expects is reported by the child itself.
 template <class Body>
@@ -20,7 +28,7 @@ void in_child(Body body, unsigned seconds = 20) {
   const pid_t child = fork();
   ASSERT_NE(child, -1);
   if (child == 0) {
-    alarm(seconds);
+    alarm(seconds * patience);
     body();
     std::fflush(nullptr);
     _exit(::testing::Test::HasFailure() ? 1 : 0);
@@ -46,7 +54,7 @@ ChildResult capture_child(Body body, unsigned seconds = 20) {
   const pid_t child = fork();
   if (child < 0) std::abort();
   if (child == 0) {
-    alarm(seconds);
+    alarm(seconds * patience);
     dup2(fileno(captured), STDOUT_FILENO);
     body();
     _exit(0);
