@@ -161,8 +161,8 @@ void *own_handle() {
   return dladdr1(&inside, &information, &handle, RTLD_DL_LINKMAP) != 0 ? handle : nullptr;
 }
 
-// The folders are the loader's own list, with everything in it that may come from elsewhere than the environment of the
-// moment: run paths, what the variables held when the program started, and what became of their placeholders.
+// Whether the folders of the loader's own list are absolute paths. The environment of the moment does not tell: the
+// list has run paths too, it was made when the program started, and placeholders were replaced in it.
 bool search_path_is_absolute() {
   void *const self = own_handle();
   Dl_serinfo extent;

@@ -1,4 +1,5 @@
 // The memory service by its rules, over an allocator that records what is asked of it. Each case has its own process.
+// One file, although a long one: the cases share that allocator and few lines each.
 
 #include "service/memory.h"
 
