@@ -1,15 +1,14 @@
 // Vectors for kernel tests: n elements inc apart, at any byte offset from a trapping page, with signalling NaNs in
 // every gap and around. A kernel that reads further than it may ends the test there and then: at the page, or, where
-// the gaps are, at the arithmetic, once FiniteOnly has unmasked the invalid operation.
+// the gaps are, at the arithmetic, under FiniteOnly.
 #pragma once
-
-#include <fenv.h>
 
 #include <algorithm>
 #include <cstring>
 #include <vector>
 
 #include "blas/types.h"
+#include "tests/support/finite_only.h"
 #include "tests/support/guarded.h"
 
 namespace qtb::test {
@@ -17,18 +16,6 @@ namespace qtb::test {
 // Memory between two trapping pages, for one placed vector at a time.
 using Arena = Guarded<unsigned char>;
 constexpr std::size_t arena_bytes = std::size_t{1} << 18;
-
-// While one of these lives, an invalid operation is a SIGFPE.
-class FiniteOnly {
- public:
-  FiniteOnly() {
-    feclearexcept(FE_ALL_EXCEPT);
-    feenableexcept(FE_INVALID);
-  }
-  ~FiniteOnly() { fedisableexcept(FE_INVALID); }
-  FiniteOnly(const FiniteOnly &) = delete;
-  FiniteOnly &operator=(const FiniteOnly &) = delete;
-};
 
 template <class T>
 void store_signalling_nan(void *p) {

@@ -112,8 +112,8 @@ T sum_strided(QtbInt n, const T *x, QtbInt inc) {
 
 template <class T>
 T sum_real(const QtbInt *n, const T *x, const QtbInt *incx) {
-  const QtbInt inc = *incx;
   if (*n < 1) return 0;
+  const QtbInt inc = *incx;
   if (inc != 1 && inc != -1) return sum_strided(*n, x, inc);
   return takes_vectors(x) ? sum_contiguous(*n, x) : sum_strided(*n, x, 1);
 }
@@ -122,8 +122,8 @@ template <class T>
 Real<T> sum_complex(const QtbInt *n, const T *x, const QtbInt *incx) {
   using R = Real<T>;
   QtbInt count = *n;
-  const QtbInt inc = *incx;
   if (count < 1) return 0;
+  const QtbInt inc = *incx;
   if (inc == 1) {
     const QtbInt reals = 2 * count;
     return sum_real(&reals, parts(x), incx);

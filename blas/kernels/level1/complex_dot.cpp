@@ -56,8 +56,8 @@ struct LaneProducts {
   void single(const T *x, const T *y) { add_products<0>(load_lowest(x), load_lowest(y)); }
 };
 
-// The sum of a vector's elements, in its lowest lanes.
-inline __m128 sum_elements(__m128 v) { return _mm_add_ps(v, _mm_movehl_ps(v, v)); }
+// The sum of a vector's elements, in its lowest lanes; above, zeros.
+inline __m128 sum_elements(__m128 v) { return sum_halves(v); }
 inline __m128d sum_elements(__m128d v) { return v; }
 
 // (a0 + a1, b0 + b1) in the lowest lanes.

@@ -26,12 +26,12 @@ void copy(const QtbInt *n, const T *x, const QtbInt *incx, T *y, const QtbInt *i
 
 template <auto real_copy, class T>
 void complex_copy(const QtbInt *n, const T *x, const QtbInt *incx, T *y, const QtbInt *incy) {
+  if (*n < 1) return;
   if (both_one(*incx, *incy)) {
     const QtbInt part_count = 2 * *n, one = 1;
     real_copy(&part_count, parts(x), &one, parts(y), &one);
     return;
   }
-  if (*n < 1) return;
   Walk<const T, T> walk{*n, walk_start(x, *n, *incx), *incx, walk_start(y, *n, *incy), *incy};
   Move<T> move;
   single_passes<1>(walk, move);

@@ -12,9 +12,12 @@ inline double product(const float *x, const float *y) {
   return static_cast<double>(load_single(x)) * static_cast<double>(load_single(y));
 }
 
-// start + the sum of n products, in two chains of additions.
-inline double sum_of_products(double start, QtbInt n, const float *x, QtbInt incx, const float *y, QtbInt incy) {
+// start + the sum of *count products, in two chains of additions. Without any, nothing else is read.
+inline double sum_of_products(double start, const QtbInt *count, const float *x, const QtbInt *step_x, const float *y,
+                              const QtbInt *step_y) {
+  QtbInt n = *count;
   if (n < 1) return start;
+  const QtbInt incx = *step_x, incy = *step_y;
   x = walk_start(x, n, incx);
   y = walk_start(y, n, incy);
   double first = start, second = 0.0;
@@ -27,12 +30,12 @@ inline double sum_of_products(double start, QtbInt n, const float *x, QtbInt inc
 }
 
 inline double dot_to_double(const QtbInt *n, const float *x, const QtbInt *incx, const float *y, const QtbInt *incy) {
-  return sum_of_products(0.0, *n, x, *incx, y, *incy);
+  return sum_of_products(0.0, n, x, incx, y, incy);
 }
 
 inline float dot_to_single(const QtbInt *n, const float *sb, const float *x, const QtbInt *incx, const float *y,
                            const QtbInt *incy) {
-  return static_cast<float>(sum_of_products(static_cast<double>(*sb), *n, x, *incx, y, *incy));
+  return static_cast<float>(sum_of_products(static_cast<double>(*sb), n, x, incx, y, incy));
 }
 
 }  // namespace

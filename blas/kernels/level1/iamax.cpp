@@ -53,8 +53,10 @@ template <class T, Extreme extreme>
 
 template <class T, Extreme extreme>
 QtbInt find(const QtbInt *n, const T *x, const QtbInt *incx) {
-  const QtbInt count = *n, inc = *incx;
-  if (count < 1 || inc < 1) return 0;
+  const QtbInt count = *n;
+  if (count < 1) return 0;
+  const QtbInt inc = *incx;
+  if (inc < 1) return 0;
   if (count == 1) return 1;
   if (inc == 1) return search_walk<T, extreme>(count, x, 1);
   return search_walk<T, extreme>(count, x, inc);

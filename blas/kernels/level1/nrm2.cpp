@@ -107,8 +107,8 @@ inline bool contiguous(QtbInt inc) { return inc == 1 || inc == -1; }
 inline float norm_wide_real(const QtbInt *n, const float *x, const QtbInt *incx) {
   constexpr int pairs_of_pass = 16;
   QtbInt count = *n;
-  const QtbInt inc = *incx;
   if (count < 1) return 0.0F;
+  const QtbInt inc = *incx;
   WideSum sum = {};
   if (contiguous(inc)) {
     if (element_aligned(x))
@@ -129,8 +129,8 @@ inline float norm_wide_real(const QtbInt *n, const float *x, const QtbInt *incx)
 inline float norm_wide_complex(const QtbInt *n, const cfloat *x, const QtbInt *incx) {
   constexpr int pairs_of_pass = 32;
   QtbInt count = *n;
-  const QtbInt inc = *incx;
   if (count < 1) return 0.0F;
+  const QtbInt inc = *incx;
   WideSum sum = {};
   if (contiguous(inc)) {
     add_contiguous<pairs_of_pass>(sum, 2 * count, parts(x));

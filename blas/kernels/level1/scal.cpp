@@ -50,12 +50,12 @@ struct PartScaling {
 
 template <auto real_scal, class T>
 void scal_by_real(const QtbInt *n, const Real<T> *alpha, T *x, const QtbInt *incx) {
+  if (*n < 1) return;
   if (*incx == 1) {
     const QtbInt part_count = 2 * *n;
     real_scal(&part_count, alpha, parts(x), incx);
     return;
   }
-  if (*n < 1) return;
   const QtbInt inc = *incx < 0 ? -*incx : *incx;
   Walk<T, T> walk{*n, x, inc, x, inc};
   PartScaling<T> scaling{*alpha};

@@ -32,6 +32,7 @@ void swap(const QtbInt *n, T *x, const QtbInt *incx, T *y, const QtbInt *incy) {
 // Elements as wide as a vector: side by side they are twice as many doubles, from the tier on whose dswap gains by it.
 template <Row row, auto real_swap, class T>
 void complex_swap(const QtbInt *n, T *x, const QtbInt *incx, T *y, const QtbInt *incy) {
+  if (*n < 1) return;
   if (this_tier >= tier_ssse3 && both_one(*incx, *incy)) {
     const QtbInt part_count = 2 * *n, one = 1;
     real_swap(&part_count, parts(x), &one, parts(y), &one);

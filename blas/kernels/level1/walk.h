@@ -1,7 +1,7 @@
 // Walks over one or two vectors: what the basic vector kernels share.
 //
-// A walk knows the way over the elements: peeling to a 16-byte boundary, passes of many elements, shorter passes,
-// single elements, by the kernel's row of the tuning table. A kernel gives the work, a body with
+// A walk knows the way over the elements: peeling to a vector boundary, passes of many elements, shorter passes, single
+// elements, by the kernel's row of the tuning table. A kernel gives the work, a body with
 //
 //   template <int k, class X, class Y> void vector(X &x, Y &y)   vector k of a pass, through the operands' cursors
 //   void single(x, y)                                            one element, at any address

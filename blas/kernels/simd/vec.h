@@ -1,4 +1,4 @@
-// Vec<T>: 16 bytes of one of the four element types, the vector width of every tier at Levels 1 and 2.
+// Vec<T>: a vector of one of the four element types, vector_bytes wide, at Levels 1 and 2.
 //
 // A thin layer over the intrinsics that all tiers have, so that a kernel is one template over the element type. A
 // vector of complex elements is a vector of their parts in order of address. What a tier adds (duplicated parts,
@@ -18,25 +18,28 @@
 namespace qtb::QTB_TIER {
 namespace {
 
-// The width of a vector, and the boundary that aligned loads ask for.
+// The width of a vector, and the boundary that aligned loads ask for: one for all tiers. Kernels take it, and lanes
+// below, from here. A tier of another width states it here, and adds to VecOf and to the procedures on vectors; what it
+// leaves out does not compile.
 constexpr QtbInt vector_bytes = 16;
 
-template <class T>
+// The vector of an element type at a width in bytes.
+template <class T, QtbInt bytes>
 struct VecOf;
 template <>
-struct VecOf<float> {
+struct VecOf<float, 16> {
   using Type = __m128;
 };
 template <>
-struct VecOf<double> {
+struct VecOf<double, 16> {
   using Type = __m128d;
 };
-template <class R>
-struct VecOf<Complex<R>> : VecOf<R> {};
+template <class R, QtbInt bytes>
+struct VecOf<Complex<R>, bytes> : VecOf<R, bytes> {};
+template <class T, QtbInt bytes>
+struct VecOf<const T, bytes> : VecOf<T, bytes> {};
 template <class T>
-struct VecOf<const T> : VecOf<T> {};
-template <class T>
-using Vec = typename VecOf<T>::Type;
+using Vec = typename VecOf<T, vector_bytes>::Type;
 
 // Elements of T in a vector.
 template <class T>
@@ -186,9 +189,16 @@ inline __m128d add_lowest(__m128d a, __m128d b) { return _mm_add_sd(a, b); }
 inline __m128 mul_lowest(__m128 a, __m128 b) { return _mm_mul_ss(a, b); }
 inline __m128d mul_lowest(__m128d a, __m128d b) { return _mm_mul_sd(a, b); }
 
+// The lower half of v plus the upper one, in the lowest lanes. The lanes above add zeros: whatever v holds, a sum that
+// nobody wants raises no exception.
+inline __m128 sum_halves(__m128 v) {
+  const __m128 none = _mm_setzero_ps();
+  return _mm_add_ps(_mm_movelh_ps(v, none), _mm_movehl_ps(none, v));
+}
+
 // The sum of all lanes: halves first, then the two that are left.
 inline float sum_lanes(__m128 v) {
-  const __m128 halves = _mm_add_ps(v, _mm_movehl_ps(v, v));
+  const __m128 halves = sum_halves(v);
   return _mm_cvtss_f32(_mm_add_ss(halves, _mm_shuffle_ps(halves, halves, 1)));
 }
 inline double sum_lanes(__m128d v) { return _mm_cvtsd_f64(_mm_add_sd(v, _mm_unpackhi_pd(v, v))); }
@@ -233,7 +243,7 @@ __m128d load_highest(const double *p) {
   return _mm_set_pd(load_single(p), 0);
 }
 
-// The 16 bytes that start offset bytes into low, of two vectors that stand side by side in memory.
+// The vector that starts offset bytes into low, of two vectors that stand side by side in memory.
 #if defined(__SSSE3__)
 template <int offset>
 __m128 join(__m128 low, __m128 high) {

@@ -1,76 +1,16 @@
-// The arithmetic of the basic vector kernels: in what order a dot product is summed, and that no kernel depends on or
-// disturbs the floating-point state.
+// The arithmetic of the basic vector kernels: the same bits in the same place, and no kernel depends on or disturbs the
+// floating-point state, or raises an exception that its elements do not.
 
-#include <fenv.h>
 #include <xmmintrin.h>
 
+#include <algorithm>
 #include <limits>
 
 #include "tests/kernels/level1/vector_routines.h"
+#include "tests/support/finite_only.h"
 
 namespace qtb::test {
 namespace {
-
-// ---- The order of summation ----
-
-enum class Joined { in_a_chain, in_pairs };
-
-// A dot product of aligned vectors, element by element in the order of a tier: four accumulators of a vector's lanes,
-// which take the vectors in turn; a tail of less than a vector goes to lane 0 of the first accumulator before the join
-// (in a chain), or to the sum after it (in pairs). n is whole passes of the main loop and such a tail.
-template <class T>
-T modelled_dot(QtbInt n, const T *x, const T *y, Joined joined) {
-  constexpr int lanes = 16 / static_cast<int>(sizeof(T));
-  T a[4][lanes] = {};
-  const QtbInt vectors = n / lanes;
-  for (QtbInt v = 0; v < vectors; ++v)
-    for (int lane = 0; lane < lanes; ++lane) a[v % 4][lane] += x[v * lanes + lane] * y[v * lanes + lane];
-  T lane_sum[lanes];
-  if (joined == Joined::in_a_chain) {
-    for (QtbInt i = vectors * lanes; i < n; ++i) a[0][0] += x[i] * y[i];
-    for (int lane = 0; lane < lanes; ++lane) lane_sum[lane] = ((a[0][lane] + a[1][lane]) + a[2][lane]) + a[3][lane];
-  } else {
-    for (int lane = 0; lane < lanes; ++lane) lane_sum[lane] = (a[3][lane] + a[2][lane]) + (a[1][lane] + a[0][lane]);
-  }
-  T sum = lanes == 2 ? lane_sum[0] + lane_sum[1]
-                     : (lane_sum[0] + lane_sum[2 % lanes]) + (lane_sum[1] + lane_sum[3 % lanes]);
-  if (joined == Joined::in_pairs)
-    for (QtbInt i = vectors * lanes; i < n; ++i) sum += x[i] * y[i];
-  return sum;
-}
-
-template <class T>
-void expect_order(const Dot<T> &routine, int tier, QtbInt pass, Joined joined) {
-  if (!processor_runs(tier)) return;
-  constexpr QtbInt longest = 1000;
-  int told_apart = 0;
-  for (std::uint64_t seed = 0; seed < 20; ++seed) {
-    const Image<T> image_x(longest, 1, random_values<T>(longest, 2 * seed).data());
-    const Image<T> image_y(longest, 1, random_values<T>(longest, 2 * seed + 1).data());
-    Room room_x(image_x.size()), room_y(image_y.size());
-    const T *x = image_x.put(room_x.at(0)), *y = image_y.put(room_y.at(0));
-    for (QtbInt passes = 1; passes * pass + 3 < longest; ++passes)
-      for (QtbInt tail = 0; tail < 16 / QtbInt{sizeof(T)}; ++tail) {
-        const QtbInt n = passes * pass + tail;
-        const T got = routine.call(tier, n, x, 1, y, 1);
-        ASSERT_EQ(got, modelled_dot(n, x, y, joined)) << routine.name << ' ' << tier_name(tier) << " n " << n;
-        told_apart += got != modelled_dot(n, x, y, joined == Joined::in_pairs ? Joined::in_a_chain : Joined::in_pairs);
-      }
-  }
-  EXPECT_GT(told_apart, 0);
-}
-
-TEST(VectorArithmetic, def_joins_the_accumulators_of_a_dot_in_a_chain) {
-  expect_order(dot_of<double>("ddot", ddot_tiers), tier_def, 16, Joined::in_a_chain);
-  expect_order(dot_of<float>("sdot", sdot_tiers), tier_def, 32, Joined::in_a_chain);
-}
-
-TEST(VectorArithmetic, sse42_and_avx_join_the_accumulators_of_a_dot_in_pairs) {
-  for (const int tier : {tier_sse42, tier_avx}) {
-    expect_order(dot_of<double>("ddot", ddot_tiers), tier, 32, Joined::in_pairs);
-    expect_order(dot_of<float>("sdot", sdot_tiers), tier, 64, Joined::in_pairs);
-  }
-}
 
 TEST(VectorArithmetic, a_dot_gives_the_same_bits_for_the_same_alignment) {
   for_each_dot([]<class T>(const Dot<T> &routine) {
@@ -109,18 +49,6 @@ void for_each_way(QtbInt longest, F &&f) {
           if ((phase_x * 5 + phase_y + n) % (incx == 1 && incy == 1 ? 4 : 32) == 0) f(n, incx, incy, phase_x, phase_y);
 }
 
-class TrapsInvalid {
- public:
-  TrapsInvalid() {
-    feclearexcept(FE_ALL_EXCEPT);
-    feenableexcept(FE_INVALID);
-  }
-  ~TrapsInvalid() {
-    fedisableexcept(FE_INVALID);
-    feclearexcept(FE_ALL_EXCEPT);
-  }
-};
-
 template <class T>
 void call_among_signalling_nans(const Elementwise<T> &routine, Tally &tally) {
   const std::vector<T> x = random_values<T>(140, 1), y = random_values<T>(140, 2);
@@ -129,14 +57,14 @@ void call_among_signalling_nans(const Elementwise<T> &routine, Tally &tally) {
     const Image<T> image_x(n, incx, x.data()), image_y(n, incy, y.data());
     for_each_tier([&](int tier) {
       T *at_x = image_x.put(room_x.at(phase_x)), *at_y = image_y.put(room_y.at(phase_y));
-      const TrapsInvalid traps;
+      const FiniteOnly guard;
       routine.call(tier, n, at_x, incx, at_y, incy);
       tally.count(tier);
     });
   });
 }
 
-TEST(VectorArithmetic, finite_operands_raise_no_invalid_operation_among_signalling_nans) {
+TEST(VectorArithmetic, finite_operands_raise_no_exception_among_signalling_nans) {
   Tally tally;
   for_each_elementwise([&](const auto &routine) { call_among_signalling_nans(routine, tally); });
   for_each_dot([&]<class T>(const Dot<T> &routine) {
@@ -146,7 +74,7 @@ TEST(VectorArithmetic, finite_operands_raise_no_invalid_operation_among_signalli
       const T *at_x = Image<T>(n, incx, x.data()).put(room_x.at(phase_x));
       const T *at_y = Image<T>(n, incy, y.data()).put(room_y.at(phase_y));
       for_each_tier([&](int tier) {
-        const TrapsInvalid traps;
+        const FiniteOnly guard;
         routine.call(tier, n, at_x, incx, at_y, incy);
         tally.count(tier);
       });
@@ -155,7 +83,7 @@ TEST(VectorArithmetic, finite_operands_raise_no_invalid_operation_among_signalli
 }
 
 // Spare lanes that held zeros would become NaN, and say so.
-TEST(VectorArithmetic, an_infinite_factor_of_nonzero_elements_raises_no_invalid_operation) {
+TEST(VectorArithmetic, an_infinite_factor_of_nonzero_elements_raises_no_exception) {
   Tally tally;
   constexpr float single = std::numeric_limits<float>::infinity();
   constexpr double wide = std::numeric_limits<double>::infinity();
@@ -169,6 +97,89 @@ TEST(VectorArithmetic, an_infinite_factor_of_nonzero_elements_raises_no_invalid_
   call_among_signalling_nans(scal_of<cdouble, cdouble>("zscal", zscal_tiers, {wide, 2}), tally);
   call_among_signalling_nans(scal_of<cfloat, float>("csscal", csscal_tiers, single), tally);
   call_among_signalling_nans(scal_of<cdouble, double>("zdscal", zdscal_tiers, wide), tally);
+}
+
+template <class T>
+std::vector<T> ones_of(std::size_t count) {
+  std::vector<T> values(count);
+  for (T &v : values) std::fill_n(reinterpret_cast<Real<T> *>(&v), sizeof(T) / sizeof(Real<T>), Real<T>{1});
+  return values;
+}
+
+// An element of extreme magnitude in every place, among ones: the results are finite and normal, so that only a lane
+// that is no part of them could leave the range.
+template <class T, class F>
+void for_each_extreme(F &&f) {
+  using R = Real<T>;
+  const QtbInt parts_of_element = sizeof(T) / sizeof(R);
+  for (const QtbInt n : {1, 2, 3, 4, 5, 6, 7, 8, 9, 12, 17, 33, 70})
+    for (const R extreme :
+         {std::numeric_limits<R>::max(), -std::numeric_limits<R>::max(), std::numeric_limits<R>::min()})
+      for (QtbInt at = 0; at < n * parts_of_element; ++at) {
+        std::vector<R> parts(static_cast<std::size_t>(n * parts_of_element), R{1});
+        parts[static_cast<std::size_t>(at)] = extreme;
+        std::vector<T> values(static_cast<std::size_t>(n));
+        std::memcpy(static_cast<void *>(values.data()), parts.data(), parts.size() * sizeof(R));
+        f(n, values);
+      }
+}
+
+// The increments, and phases of whole and of halved vectors.
+template <class T, class F>
+void for_each_place(F &&f) {
+  for (const auto &[incx, incy] : increments)
+    for (const int phase_x : {0, static_cast<int>(sizeof(Real<T>))})
+      for (const int phase_y : {0, static_cast<int>(sizeof(Real<T>))}) f(incx, incy, phase_x, phase_y);
+}
+
+TEST(VectorArithmetic, the_largest_or_smallest_element_in_any_lane_raises_no_exception) {
+  Tally tally;
+  for_each_dot([&]<class T>(const Dot<T> &routine) {
+    Room room_x(1024 * sizeof(T)), room_y(1024 * sizeof(T));
+    const std::vector<T> ones = ones_of<T>(70);
+    for_each_extreme<T>([&](QtbInt n, const std::vector<T> &values) {
+      for_each_place<T>([&](QtbInt incx, QtbInt incy, int phase_x, int phase_y) {
+        const T *at_x = Image<T>(n, incx, values.data()).put(room_x.at(phase_x));
+        const T *at_y = Image<T>(n, incy, ones.data()).put(room_y.at(phase_y));
+        for_each_tier([&](int tier) {
+          const FiniteOnly guard;
+          routine.call(tier, n, at_x, incx, at_y, incy);
+          routine.call(tier, n, at_y, incy, at_x, incx);
+          tally.count(tier, 2);
+        });
+      });
+    });
+  });
+  const auto expect_quiet = [&]<class T>(const Elementwise<T> &routine) {
+    Room room_x(1024 * sizeof(T)), room_y(1024 * sizeof(T));
+    const std::vector<T> ones = ones_of<T>(70);
+    for_each_extreme<T>([&](QtbInt n, const std::vector<T> &values) {
+      for_each_place<T>([&](QtbInt incx, QtbInt incy, int phase_x, int phase_y) {
+        for (const bool in_x : {false, true}) {
+          if (in_x && routine.one_vector) continue;
+          const Image<T> image_x(n, incx, in_x ? values.data() : ones.data());
+          const Image<T> image_y(n, incy, in_x ? ones.data() : values.data());
+          for_each_tier([&](int tier) {
+            T *at_x = image_x.put(room_x.at(phase_x)), *at_y = image_y.put(room_y.at(phase_y));
+            const FiniteOnly guard;
+            routine.call(tier, n, at_x, incx, at_y, incy);
+            tally.count(tier);
+          });
+        }
+      });
+    });
+  };
+  // A factor of -1, which no tier takes for special and which leaves every magnitude in the range.
+  expect_quiet(axpy_of<float>("saxpy", saxpy_tiers, -1.0F));
+  expect_quiet(axpy_of<double>("daxpy", daxpy_tiers, -1.0));
+  expect_quiet(axpy_of<cfloat>("caxpy", caxpy_tiers, {-1, 0}));
+  expect_quiet(axpy_of<cdouble>("zaxpy", zaxpy_tiers, {-1, 0}));
+  expect_quiet(scal_of<float, float>("sscal", sscal_tiers, -1.0F));
+  expect_quiet(scal_of<double, double>("dscal", dscal_tiers, -1.0));
+  expect_quiet(scal_of<cfloat, cfloat>("cscal", cscal_tiers, {-1, 0}));
+  expect_quiet(scal_of<cdouble, cdouble>("zscal", zscal_tiers, {-1, 0}));
+  expect_quiet(scal_of<cfloat, float>("csscal", csscal_tiers, -1.0F));
+  expect_quiet(scal_of<cdouble, double>("zdscal", zdscal_tiers, -1.0));
 }
 
 constexpr unsigned control_bits = 0xFFC0;  // of MXCSR: rounding, masks, flush to zero, denormals are zero
