@@ -8,6 +8,10 @@
 //   static constexpr bool gathers                                whether strided passes go through vectors
 //   static constexpr bool updates                                whether y is read and then stored
 //
+// and, if it gains by loading ahead of a store,
+//
+//   template <int k, class X, class Y> void two_vectors(X &x, Y &y)   vectors k and k + 1 of a pass
+//
 // Nothing outside the operands is read, not even in a vector that is then cut. Addresses need not be multiples of the
 // element width: where peeling cannot reach a boundary, the passes are unaligned or the elements go singly.
 #pragma once
@@ -75,7 +79,10 @@ template <int vectors, class X, class Y, class CursorX, class CursorY, class Bod
   // Counted from where the last pass fits: one subtraction then is the test as well.
   walk.n -= reach;
   do {
-    repeat<vectors>([&](auto k) __attribute__((always_inline)) { body.template vector<k.value>(x, y); });
+    if constexpr (vectors % 2 == 0 && requires { body.template two_vectors<0>(x, y); })
+      repeat<vectors / 2>([&](auto k) __attribute__((always_inline)) { body.template two_vectors<2 * k.value>(x, y); });
+    else
+      repeat<vectors>([&](auto k) __attribute__((always_inline)) { body.template vector<k.value>(x, y); });
     x.advance(count);
     y.advance(count);
     walk.n -= count;

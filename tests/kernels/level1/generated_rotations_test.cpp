@@ -269,6 +269,23 @@ TEST(rotmg, stores_only_the_diagonal_that_its_flag_needs) {
   });
 }
 
+// Where d1*x1*x1 and d2*y1*y1 are equal in magnitude neither outweighs the other: the form is that of the second, and a
+// negative second resets.
+template <class R>
+void expect_equal_weights(Rotmg<R> routine) {
+  expect_modified<R>(routine, 1, 1, 1, 1, {R(0.5), R(0.5), 2, {1, 1, 9, 9, 1}});
+  expect_modified<R>(routine, 1, 1, -3, 3, {R(0.5), R(0.5), 6, {1, -1, 9, 9, -1}});
+  expect_modified<R>(routine, 4, 1, 1, 2, {R(0.5), 2, 4, {1, 2, 9, 9, R(0.5)}});
+  expect_modified<R>(routine, 1, -1, 1, 1, {0, 0, 0, {-1, 0, 0, 0, 0}});
+  expect_modified<R>(routine, 4, -1, 1, -2, {0, 0, 0, {-1, 0, 0, 0, 0}});
+}
+TEST(rotmg, of_equal_magnitudes_takes_the_form_of_the_second) {
+  in_every_tier([&](int tier) {
+    expect_equal_weights<float>(srotmg[tier]);
+    expect_equal_weights<double>(drotmg[tier]);
+  });
+}
+
 TEST(rotmg, scales_a_small_d1_up_and_a_large_one_down) {
   const double rgamsq = 5.960464477539e-8;  // not exactly 2**-24
   in_every_tier([&](int tier) {

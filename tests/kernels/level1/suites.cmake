@@ -7,6 +7,7 @@ qtb_add_test(rotations_test SOURCES kernels/level1/rotations_test.cpp LIBRARIES 
 qtb_add_test(searches_test SOURCES kernels/level1/searches_test.cpp LIBRARIES qtb_static)
 qtb_add_test(sparse_test SOURCES kernels/level1/sparse_test.cpp LIBRARIES qtb_static)
 qtb_add_test(summation_order_test SOURCES kernels/level1/summation_order_test.cpp LIBRARIES qtb_static)
+qtb_add_test(tuning_test SOURCES kernels/level1/tuning_test.cpp)
 qtb_add_test(vector_arithmetic_test SOURCES kernels/level1/vector_arithmetic_test.cpp LIBRARIES qtb_static SHARDS 2)
 qtb_add_test(vector_cases_test SOURCES kernels/level1/vector_cases_test.cpp LIBRARIES qtb_static)
 qtb_add_test(vector_memory_test SOURCES kernels/level1/vector_memory_test.cpp LIBRARIES qtb_static)

@@ -5,6 +5,7 @@
 
 #include "tests/kernels/level1/vector_routines.h"
 #include "tests/support/guarded.h"
+#include "tests/support/stepped.h"
 
 namespace qtb::test {
 namespace {
@@ -132,6 +133,68 @@ TEST(VectorMemory, operands_that_end_with_their_heap_block_are_not_left) {
   };
   for_each_elementwise([&]<class T>(const Elementwise<T> &routine) { at_phases(routine, T{}); });
   for_each_dot([&]<class T>(const Dot<T> &routine) { at_phases(routine, T{}); });
+}
+
+// The same without a sanitizer: no instruction brings anything from beside an operand into a register.
+constexpr std::size_t words_beside = 8;
+
+// n elements so many bytes above a vector boundary, with the forbidden pattern before and behind them.
+template <class T>
+class Surrounded {
+ public:
+  Surrounded(QtbInt n, int phase, std::uint64_t seed)
+      : words_(static_cast<std::size_t>(n) * sizeof(T) / sizeof(std::uint32_t) + 3 * words_beside, forbidden_pattern) {
+    unsigned char *first = reinterpret_cast<unsigned char *>(words_.data() + words_beside);
+    first += (16 - reinterpret_cast<std::uintptr_t>(first) % 16) % 16 + static_cast<std::uintptr_t>(phase);
+    data_ = reinterpret_cast<T *>(first);
+    const std::vector<T> values = random_values<T>(static_cast<std::size_t>(n), seed);
+    std::memcpy(first, values.data(), values.size() * sizeof(T));
+  }
+  T *data() { return data_; }
+
+ private:
+  std::vector<std::uint32_t> words_;
+  T *data_;
+};
+
+template <class T>
+T one_behind(const T *p, QtbInt n) {
+  volatile T sum = 0;
+  for (QtbInt i = 0; i <= n; ++i) sum = sum + p[i];
+  return sum;
+}
+
+TEST(VectorMemory, a_read_of_one_element_too_many_is_seen_by_stepping_through_it) {
+  Surrounded<float> single(5, 4, 1);
+  Surrounded<double> wide(5, 8, 1);
+  EXPECT_FALSE(step_through([&] { one_behind(single.data(), 4); }).read_forbidden);
+  EXPECT_TRUE(step_through([&] { one_behind(single.data(), 5); }).read_forbidden);
+  EXPECT_FALSE(step_through([&] { one_behind(wide.data(), 4); }).read_forbidden);
+  EXPECT_TRUE(step_through([&] { one_behind(wide.data(), 5); }).read_forbidden);
+}
+
+TEST(VectorMemory, nothing_beside_an_operand_is_brought_into_a_register) {
+#if defined(QTB_WATCHED)
+  GTEST_SKIP() << "every load is watched in this build";
+#endif
+  Tally tally;
+  long steps = 0;
+  const auto at_phases = [&]<class T>(const auto &routine, T) {
+    for (const QtbInt n : {1, 2, 3, 4, 5, 6, 7, 8, 9, 10, 13, 35})
+      for (const auto &[phase_x, phase_y] : {std::pair{0, 0}, {4, 0}, {8, 0}, {12, 0}, {0, 8}, {4, 12}}) {
+        Surrounded<T> x(n, phase_x, 1), y(n, phase_y, 2);
+        for_each_tier([&](int tier) {
+          const Stepped stepped = step_through([&] { routine.call(tier, n, x.data(), 1, y.data(), 1); });
+          ASSERT_FALSE(stepped.read_forbidden)
+              << routine.name << ' ' << tier_name(tier) << " n " << n << " phases " << phase_x << ' ' << phase_y;
+          steps += stepped.steps;
+          tally.count(tier);
+        });
+      }
+  };
+  for_each_elementwise([&]<class T>(const Elementwise<T> &routine) { at_phases(routine, T{}); });
+  for_each_dot([&]<class T>(const Dot<T> &routine) { at_phases(routine, T{}); });
+  std::cout << "instructions: " << steps << '\n';
 }
 
 TEST(VectorMemory, no_operand_is_touched_for_lengths_below_one) {
