@@ -1,7 +1,7 @@
 // compare: this library beside another BLAS shared library, or beside itself under other settings, on the same calls.
 //
 //   compare --library LIBRARY [--tier 0..4] [--setting NAME=VALUE]...
-//           [--peer LIBRARY|self] [--baseline LIBRARY] [--peer-setting NAME=VALUE]... [--threads 1]
+//           [--peer LIBRARY|self]... [--baseline LIBRARY]... [--peer-setting NAME=VALUE]... [--threads 1]
 //           [--routines ddot,gemv,level2] [--options N,UNN|all]
 //           [--sizes 8,4000] [--shapes 1000x1000x32] [--bands 16] [--increments 1,2] [--spare 0]
 //           [--alpha 1[,0]] [--beta 0[,0]] [--turns 21] [--seconds 0.5] [--csv FILE]
@@ -17,11 +17,16 @@
 // unit. Bands have so many diagonals on each side, arrays leading dimensions so many beyond their rows.
 //
 // A row: routine, options, case, this library's time per call and rate, the peer's rate, the ratio of the rates pair by
-// pair (median, lowest, highest; above 1 this library is faster), the share of what the core's own load, store and
-// arithmetic rates allow on that number of threads (Levels 1 and 2: in cache; Level 3: the arithmetic alone), and the
-// cores that each side kept busy. The share is a median of pairs too: a loop of nothing but the work that bounds the
-// call takes its turns beside the sides. Levels 2 and 3 are first checked; where a result is wrong, the row says so,
-// nothing is timed, and the exit status is 1. The file has the same as numbers, and the rate at the limit.
+// pair (median, lowest, highest; above 1 this library is faster), the share of what is possible on that number of
+// threads, and the cores that each side kept busy over the whole case.
+//
+// What is possible is a median of pairs too: a loop of nothing but the work that bounds the call takes its turns beside
+// the sides. That is the core's load, store and arithmetic rates in cache (Level 1), the arithmetic alone (Level 3), or
+// the slower one of arithmetic and moving arrays of the same sizes as the operands once (Level 2), so that a matrix
+// beyond the caches is held against the bandwidth of the memory.
+//
+// Levels 2 and 3 are first checked; where a result is wrong, the row says so, nothing is timed, and the exit status is
+// 1. The file has the same as numbers, and the rate at the limit; peers count from 1 there.
 
 #include <algorithm>
 #include <cstdio>
@@ -36,6 +41,7 @@
 #include "bench/limits.h"
 #include "bench/sides.h"
 #include "bench/timing.h"
+#include "bench/traffic.h"
 #include "blas/tiers.h"
 
 namespace qtb::bench {
@@ -45,7 +51,8 @@ using calls::Problem;
 using calls::Scalar;
 
 struct Options {
-  Side ours, peer;
+  Side ours;
+  std::vector<Side> peers;
   std::string csv;
   std::vector<std::string> routines{"level1"}, letters;
   std::vector<long> sizes, bands{16}, increments{1};
@@ -62,13 +69,14 @@ struct Case {
   std::string numbers;  // m,n,k,band,increment for the file, empty where the routine has none
   double work;          // of a call: flops where there are any, bytes elsewhere
   Bound bound;          // of the busiest thread's part of a call
+  Traffic traffic;      // nothing where the memory is no part of the limit
   const char *unit;
   Prepare prepare;
 };
 
 // The first row of the file; `compare` writes the others in this order.
 constexpr const char *header =
-    "routine,options,m,n,k,band,increment,threads,ns,rate,peer_ns,peer_rate,unit,ratio,ratio_low,ratio_high,limit,"
+    "routine,options,m,n,k,band,increment,threads,peer,ns,rate,peer_ns,peer_rate,unit,ratio,ratio_low,ratio_high,limit,"
     "share,"
     "cores,peer_cores,outcome,peer_outcome";
 
@@ -83,12 +91,34 @@ const char *name(Outcome outcome) {
 
 bool failed(Outcome outcome) { return outcome == Outcome::wrong || outcome == Outcome::crashed; }
 
-// The side that does no more than what bounds a call.
-Runner runner_at_limit(const Bound &bound) {
-  return {
-      Side{}, [bound](const Library &) {
-        return Prepared{[bound](long count) { work_at_limit(bound.limit, bound.amount * static_cast<double>(count)); }};
-      }};
+// ---- the side that does no more than what bounds a call ----
+
+// The loops that need a team are in a library of their own, which a child loads as its side.
+const Side team{QTB_TEAM_PATH, true, {}};
+
+template <class Function>
+Function *find_in_team(const Library &library, Function *, const char *name) {
+  return reinterpret_cast<Function *>(library.find(name));
+}
+#define QTB_IN_TEAM(library, function) find_in_team(library, &function, #function)
+
+Calls sweep_calls(const Library &library, const Traffic &traffic, int threads) {
+  Sweep *sweep = QTB_IN_TEAM(library, qtb_bench_make_sweep)(&traffic, threads);
+  return [sweep, run = QTB_IN_TEAM(library, qtb_bench_sweep)](long count) { run(sweep, count); };
+}
+
+// Whichever takes longer, the core's work or the memory's.
+Runner runner_at_limit(const Options &options, const CoreLimits &limits, const Case &item) {
+  const Bound bound = item.bound;
+  const Calls core = [bound](long count) { work_at_limit(bound.limit, bound.amount * static_cast<double>(count)); };
+  if (item.traffic.bytes() == 0) return {Side{}, [core](const Library &) { return Prepared{core}; }};
+  const double core_seconds = bound.amount / limits.*bound.limit;
+  return {team, [core, core_seconds, traffic = item.traffic, threads = options.threads](const Library &library) {
+            const Calls sweep = sweep_calls(library, traffic, static_cast<int>(threads));
+            constexpr double look_seconds = 0.001;
+            const double seconds = fastest_seconds_per_call(sweep, calibrate(sweep, look_seconds));
+            return Prepared{seconds > core_seconds ? sweep : core};
+          }};
 }
 
 // The other side's time over the first's, turn by turn.
@@ -99,24 +129,17 @@ Spread ratios(const Measurement &first, const Measurement &other) {
   return ratio.empty() ? Spread{} : spread(ratio);
 }
 
-// One case: its row in the table and in the file. False where a side failed.
-bool compare(const Options &options, const CoreLimits &limits, const Case &item, std::FILE *csv) {
-  const bool has_peer = !options.peer.path.empty();
-  std::vector<Runner> runners = {{options.ours, item.prepare}, runner_at_limit(item.bound)};
-  if (has_peer) runners.push_back({options.peer, item.prepare});
-  const std::vector<Measurement> measured = measure_in_turn(runners, options.turns, options.seconds);
-  const Measurement no_peer{Outcome::absent, {}, 0};
-  const Measurement &ours = measured[0], &at_limit = measured[1], &peer = has_peer ? measured[2] : no_peer;
-  if (ours.outcome == Outcome::absent) return true;
+double median_seconds(const Measurement &side) { return side.seconds.empty() ? 0 : spread(side.seconds).median; }
 
-  const auto time_of = [](const Measurement &side) { return side.seconds.empty() ? 0 : spread(side.seconds).median; };
-  const double ours_time = time_of(ours), peer_time = time_of(peer);
+// One row of the table and of the file: this library beside a peer, or beside none (number 0).
+void print_row(const Options &options, const Case &item, const Measurement &ours, const Measurement &at_limit,
+               std::size_t number, const Measurement &peer, std::FILE *csv) {
+  const double ours_time = median_seconds(ours), peer_time = median_seconds(peer);
   const auto rate = [&](double seconds) { return seconds > 0 ? item.work / seconds / 1e9 : 0; };
   const Spread ratio = ratios(ours, peer);
   const double share = ratios(ours, at_limit).median;
-  const double least_seconds = item.bound.amount / limits.*item.bound.limit;
 
-  std::printf("%-7s %-2s %-15s", item.routine.c_str(), item.letters.c_str(), item.label.c_str());
+  std::printf("%-7s %-4s %-15s", item.routine.c_str(), item.letters.c_str(), item.label.c_str());
   if (ours.outcome == Outcome::measured)
     std::printf(" %12.1f %8.2f", ours_time * 1e9, rate(ours_time));
   else
@@ -124,7 +147,7 @@ bool compare(const Options &options, const CoreLimits &limits, const Case &item,
   if (peer_time > 0)
     std::printf(" %8.2f", rate(peer_time));
   else
-    std::printf(" %8s", has_peer ? name(peer.outcome) : "-");
+    std::printf(" %8s", number > 0 ? name(peer.outcome) : "-");
   std::printf(" %-7s", item.unit);
   if (ratio.median == 0)
     std::printf(" %6s  %11s", "-", "");
@@ -136,12 +159,28 @@ bool compare(const Options &options, const CoreLimits &limits, const Case &item,
   std::fflush(stdout);
 
   if (csv != nullptr) {
-    std::fprintf(csv, "%s,%s,%s,%ld,%.4g,%.4g,%.4g,%.4g,%s,%.4g,%.4g,%.4g,%.4g,%.4g,%.3g,%.3g,%s,%s\n",
-                 item.routine.c_str(), item.letters.c_str(), item.numbers.c_str(), options.threads, ours_time * 1e9,
-                 rate(ours_time), peer_time * 1e9, rate(peer_time), item.unit, ratio.median, ratio.low, ratio.high,
-                 rate(least_seconds), share, ours.cores, peer.cores, name(ours.outcome), name(peer.outcome));
+    std::fprintf(csv, "%s,%s,%s,%ld,%zu,%.4g,%.4g,%.4g,%.4g,%s,%.4g,%.4g,%.4g,%.4g,%.4g,%.3g,%.3g,%s,%s\n",
+                 item.routine.c_str(), item.letters.c_str(), item.numbers.c_str(), options.threads, number,
+                 ours_time * 1e9, rate(ours_time), peer_time * 1e9, rate(peer_time), item.unit, ratio.median, ratio.low,
+                 ratio.high, rate(median_seconds(at_limit)), share, ours.cores, peer.cores, name(ours.outcome),
+                 name(peer.outcome));
   }
-  return !failed(ours.outcome) && !failed(peer.outcome);
+}
+
+// One case: a row for each peer. False where a side failed.
+bool compare(const Options &options, const CoreLimits &limits, const Case &item, std::FILE *csv) {
+  std::vector<Runner> runners = {{options.ours, item.prepare}, runner_at_limit(options, limits, item)};
+  for (const Side &peer : options.peers) runners.push_back({peer, item.prepare});
+  const std::vector<Measurement> measured = measure_in_turn(runners, options.turns, options.seconds);
+  const Measurement &ours = measured[0], &at_limit = measured[1];
+  if (ours.outcome == Outcome::absent) return true;
+  bool all_well = !failed(ours.outcome);
+  if (options.peers.empty()) print_row(options, item, ours, at_limit, 0, {Outcome::absent, {}, 0}, csv);
+  for (std::size_t i = 2; i < measured.size(); ++i) {
+    print_row(options, item, ours, at_limit, i - 1, measured[i], csv);
+    all_well = all_well && !failed(measured[i].outcome);
+  }
+  return all_well;
 }
 
 // The avx tier's only kernel with 32-byte vectors is that of dgemm, which the other real products in double precision
@@ -158,6 +197,22 @@ Bound find_call_bound(const Options &options, const CoreLimits &limits, const Ro
   if (routine.level == 3) return {product_limit(options, routine), flops};
   const double vectors_of_element = static_cast<double>(routine.element_bytes()) / 16;
   return find_bound(limits, d.read() * vectors_of_element, d.written() * vectors_of_element, flops, routine.is_single);
+}
+
+// What the memory has a part in: Level 2, whose matrices are read once.
+Traffic find_traffic(const Routine &routine, const calls::Description &d) {
+  Traffic traffic;
+  if (routine.level != 2) return traffic;
+  for (const calls::Form *form : {&d.a, &d.b, &d.c, &d.x, &d.y}) {
+    const double bytes = static_cast<double>(form->layout.count()) * static_cast<double>(routine.element_bytes());
+    if (form->is_read && form->is_written)
+      traffic.updated += bytes;
+    else if (form->is_read)
+      traffic.read += bytes;
+    else if (form->is_written)
+      traffic.written += bytes;
+  }
+  return traffic;
 }
 
 bool has_axis(const Routine &routine, const char *axes) {
@@ -184,6 +239,7 @@ Case make_case(const Options &options, const CoreLimits &limits, const Routine &
   item.unit = flops > 0 ? "GFLOP/s" : "GB/s";
   item.bound = find_call_bound(options, limits, routine, d);
   item.bound.amount /= static_cast<double>(options.threads);
+  item.traffic = find_traffic(routine, d);
   item.prepare = [&routine, problem](const Library &library) {
     const BoundCall bound = bind(library, routine, problem);
     return Prepared{bound.calls, bound.correct};
@@ -230,13 +286,13 @@ Options parse(int argc, char **argv) {
     if (key == "--library")
       options.ours.path = value;
     else if (key == "--peer")
-      options.peer.path = value, options.peer.wide = value == "self";
+      options.peers.push_back({value, value == "self", {}});
     else if (key == "--baseline")
-      options.peer.path = value;
+      options.peers.push_back({value, true, {}});
     else if (key == "--setting")
       options.ours.settings.push_back(value);
-    else if (key == "--peer-setting")
-      options.peer.settings.push_back(value);
+    else if (key == "--peer-setting" && !options.peers.empty())
+      options.peers.back().settings.push_back(value);
     else if (key == "--tier")
       tier = value;
     else if (key == "--threads")
@@ -270,7 +326,8 @@ Options parse(int argc, char **argv) {
   }
   if (options.ours.path.empty()) fail("--library is needed");
   if (options.sizes.empty() && options.shapes.empty()) options.sizes = {4000};
-  if (options.peer.path == "self") options.peer.path = options.ours.path;
+  for (Side &peer : options.peers)
+    if (peer.path == "self") peer.path = options.ours.path;
   // What both sides have in common comes first, so that the settings of a side go before it.
   if (!tier.empty()) set_environment("QTB_DEBUG_CPU_TYPE=" + tier);
   options.avx = tier == std::to_string(tier_avx);
@@ -353,21 +410,52 @@ std::vector<Case> list_cases(const Options &options, const CoreLimits &limits) {
   return cases;
 }
 
+// What the memory allows where it has a part, and what a parallel region costs where there is one.
+void print_surroundings(const Options &options, const std::vector<Case> &cases) {
+  const int threads = static_cast<int>(options.threads);
+  const auto seconds = [&](const Prepare &prepare) {
+    return median_seconds(measure_in_turn({{team, prepare}}, options.turns, options.seconds)[0]);
+  };
+  const auto bandwidth = [&](const Traffic &traffic) {
+    return traffic.bytes() / 1e9 /
+           seconds([&](const Library &library) { return Prepared{sweep_calls(library, traffic, threads)}; });
+  };
+  const auto has_traffic = [](const Case &item) { return item.traffic.bytes() > 0; };
+  if (std::any_of(cases.begin(), cases.end(), has_traffic)) {
+    constexpr double first_level = 16e3, second_level = 256e3, memory = 256e6;  // bytes, clearly within or without
+    std::printf(
+        "memory, %d thread%s: GB/s read %.1f (16 kB), %.1f (256 kB), %.1f (256 MB); read and written %.1f, "
+        "%.1f, %.1f\n",
+        threads, threads == 1 ? "" : "s", bandwidth({first_level, 0, 0}), bandwidth({second_level, 0, 0}),
+        bandwidth({memory, 0, 0}), 2 * bandwidth({0, 0, first_level}), 2 * bandwidth({0, 0, second_level}),
+        2 * bandwidth({0, 0, memory}));
+  }
+  if (threads > 1) {
+    const double region = seconds([&](const Library &library) {
+      return Prepared{
+          [threads, run = QTB_IN_TEAM(library, qtb_bench_empty_regions)](long count) { run(threads, count); }};
+    });
+    std::printf("an empty parallel region of %d threads: %.2f us\n", threads, region * 1e6);
+  }
+}
+
 int run(int argc, char **argv) {
   const Options options = parse(argc, argv);
   const CoreLimits limits = measure_core_limits();
+  const std::vector<Case> cases = list_cases(options, limits);
   std::printf(
       "core: %.1f GFLOP/s double, %.1f single (16-byte multiply and add); %.1f double, %.1f single (32-byte); "
       "%.2f G loads/s, %.2f G stores/s\n",
       limits.double_flops / 1e9, limits.single_flops / 1e9, limits.wide_double_flops / 1e9,
       limits.wide_single_flops / 1e9, limits.load_rate / 1e9, limits.store_rate / 1e9);
-  std::printf("%-7s %-2s %-15s %12s %8s %8s %-7s %6s  %-11s  %5s  %s\n", "routine", "", "case", "ns/call", "rate",
+  print_surroundings(options, cases);
+  std::printf("%-7s %-4s %-15s %12s %8s %8s %-7s %6s  %-11s  %5s  %s\n", "routine", "", "case", "ns/call", "rate",
               "peer", "", "ratio", "range", "limit", "cores");
   std::FILE *csv = options.csv.empty() ? nullptr : std::fopen(options.csv.c_str(), "w");
   if (csv == nullptr && !options.csv.empty()) fail("cannot write " + options.csv);
   if (csv != nullptr) std::fprintf(csv, "%s\n", header);
   bool all_well = true;
-  for (const Case &item : list_cases(options, limits)) all_well = compare(options, limits, item, csv) && all_well;
+  for (const Case &item : cases) all_well = compare(options, limits, item, csv) && all_well;
   if (csv != nullptr) std::fclose(csv);
   return all_well ? 0 : 1;
 }

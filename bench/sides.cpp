@@ -21,13 +21,14 @@ namespace {
 constexpr double turn_seconds = 0.001;  // long against the clock, short against a disturbance
 constexpr long warm_share = 4;          // of a turn's calls so many are first made without a look at the clock
 constexpr double once_seconds = 0.1;    // what a library does at its first call only takes less
+constexpr double stall_seconds = 1;     // so does a stall of the machine
 constexpr int least_turns = 5;          // unless fewer are asked for
 
-// What a child sends: once when it is ready, with what a turn will take, and after each turn.
+// What a child sends: once when it is ready, and after each turn.
 struct Report {
   Outcome outcome;
-  double seconds;  // ready: of a turn; later: per call
-  double cores;
+  double seconds;  // per call
+  double elapsed;  // of a whole turn, the calls that nobody timed included
 };
 
 constexpr pid_t gone = 0;
@@ -36,20 +37,24 @@ struct Child {
   pid_t process = gone;
   int channel = -1;
   Report last{Outcome::crashed, 0, 0};
+  double processor_seconds = 0, elapsed = 0;  // of all turns
 };
 
-double processor_seconds() {
+// What a stopped child has used of the processors. The system's books of a thread are exact only while it does not run.
+double processor_seconds(pid_t process) {
+  clockid_t clock{};
   timespec time{};
-  clock_gettime(CLOCK_PROCESS_CPUTIME_ID, &time);
+  if (clock_getcpuclockid(process, &clock) != 0 || clock_gettime(clock, &time) != 0) return 0;
   return static_cast<double>(time.tv_sec) + static_cast<double>(time.tv_nsec) * 1e-9;
 }
 
 Report measure_turn(const Calls &calls, long count) {
+  const double first = now();
   if (count >= warm_share) calls(count / warm_share);
-  const double processor_start = processor_seconds(), start = now();
+  const double start = now();
   calls(count);
-  const double elapsed = now() - start;
-  return {Outcome::measured, elapsed / static_cast<double>(count), (processor_seconds() - processor_start) / elapsed};
+  const double end = now();
+  return {Outcome::measured, (end - start) / static_cast<double>(count), end - first};
 }
 
 void send_report(int channel, const Report &report) {
@@ -67,13 +72,16 @@ void send_report(int channel, const Report &report) {
     send_report(channel, {prepared.calls ? Outcome::wrong : Outcome::absent, 0, 0});
     _exit(0);
   }
+  Report ready{Outcome::measured, seconds_per_call(prepared.calls, 1), 0};
+  if (ready.seconds >= once_seconds && ready.seconds < stall_seconds)
+    ready.seconds = fastest_seconds_per_call(prepared.calls, 1);
+  ready.elapsed = ready.seconds;
   long count = 1;
-  double seconds = seconds_per_call(prepared.calls, 1);
-  if (seconds < once_seconds) {
+  if (ready.seconds < once_seconds) {
     count = calibrate(prepared.calls, turn_seconds);
-    seconds = measure_turn(prepared.calls, count).seconds * static_cast<double>(count);
+    ready = measure_turn(prepared.calls, count);
   }
-  send_report(channel, {Outcome::measured, seconds, 0});
+  send_report(channel, ready);
   char turn = 0;
   while (recv(channel, &turn, 1, 0) == 1) send_report(channel, measure_turn(prepared.calls, count));
   _exit(0);
@@ -116,9 +124,12 @@ Child start(const Runner &runner) {
 
 void take_turn(Child &child) {
   const char turn = 1;
+  const double processor_start = processor_seconds(child.process);
   send(child.channel, &turn, 1, MSG_NOSIGNAL);
   kill(child.process, SIGCONT);
   take_report(child);
+  child.processor_seconds += processor_seconds(child.process) - processor_start;
+  child.elapsed += child.last.elapsed;
 }
 
 void end(Child &child) {
@@ -135,10 +146,9 @@ std::vector<Measurement> measure_in_turn(const std::vector<Runner> &runners, int
   double seconds_of_turns = 0;
   for (const Runner &runner : runners) {
     children.push_back(start(runner));
-    seconds_of_turns += children.back().last.seconds;
+    seconds_of_turns += children.back().last.elapsed;
   }
   std::vector<Measurement> measurements(runners.size());
-  std::vector<std::vector<double>> cores(runners.size());
   const double fitting = budget / std::max(seconds_of_turns, turn_seconds);
   const int turns = static_cast<int>(std::min<double>(std::max<double>(fitting, least_turns), most_turns));
   for (int turn = 0; turn < turns; ++turn)
@@ -148,12 +158,11 @@ std::vector<Measurement> measure_in_turn(const std::vector<Runner> &runners, int
       if (child.last.outcome != Outcome::measured) continue;
       take_turn(child);
       measurements[which].seconds.push_back(child.last.seconds);
-      cores[which].push_back(child.last.cores);
     }
   for (std::size_t i = 0; i < children.size(); ++i) {
     measurements[i].outcome = children[i].last.outcome;
     if (measurements[i].outcome == Outcome::measured)
-      measurements[i].cores = spread(cores[i]).median;
+      measurements[i].cores = children[i].processor_seconds / children[i].elapsed;
     else
       measurements[i].seconds.clear();
     end(children[i]);

@@ -38,7 +38,7 @@ enum class Outcome : int { measured, absent, wrong, crashed };
 struct Measurement {
   Outcome outcome = Outcome::crashed;
   std::vector<double> seconds;  // per call, one value per turn; empty unless measured
-  double cores = 0;             // processor time over elapsed time, the median of the turns
+  double cores = 0;             // processor time over elapsed time, of all turns together
 };
 
 // Measures the runners in turn, as often as fits the budget of seconds, but not less than a few times, and not more
