@@ -1,4 +1,4 @@
-// The table of routines, and what binds one to memory and to a procedure of a library.
+// What binds a routine to memory and to a procedure of a library.
 
 #include "bench/calls.h"
 
@@ -7,10 +7,9 @@
 #include <random>
 #include <type_traits>
 
+#include "bench/bound.h"
 #include "bench/check.h"
-#include "bench/memory.h"
 #include "calls/level1.h"
-#include "calls/level3.h"
 
 namespace qtb::bench {
 namespace {
@@ -49,28 +48,6 @@ struct ComplexFunction {
   void operator()(Argument, A... arguments) const {
     procedure(arguments...);
   }
-};
-
-// Everything that the arguments of a call point to. Integers have 64 bits; a procedure with 32-bit integers finds its
-// value in the lower half of each, which comes first.
-template <ShapeName shape, class T>
-struct Bound {
-  Bound(const Problem &problem, const Kind &of_routine, std::vector<QtbInt> positions)
-      : index(std::move(positions)),
-        kind(of_routine),
-        description(calls::describe<shape>(problem, kind)),
-        scalars(description) {
-    Shape<shape>::set_steady(scalars);
-    arguments = scalars.template arguments<shape>(a.data(), b.data(), c.data(), x.data(), y.data(), index.data());
-  }
-
-  std::vector<QtbInt> index;
-  std::vector<std::int32_t> narrow_index;
-  Kind kind;
-  Description description;
-  Scalars<T> scalars;
-  Operand<T> a{description.a}, b{description.b}, c{description.c}, x{description.x}, y{description.y};
-  Arguments arguments;
 };
 
 template <ShapeName shape, class T, class P>
@@ -113,54 +90,18 @@ BoundCall bind_as(const Library &library, const Routine &routine, const Problem 
   return {repeated_calls, correct};
 }
 
-template <ShapeName shape, class T>
-Routine make_routine(std::string_view name) {
-  using S = Shape<shape>;
-  return {name,
-          S::axes,
-          S::level,
-          S::sparse,
-          sizeof(Real<T>) == sizeof(float),
-          kind_of<T>(name),
-          S::steady_alpha,
-          S::steady_beta,
-          calls::describe<shape>,
-          S::legal_trans,
-          bind_as<shape, T>};
-}
-
-}  // namespace
-
-const std::vector<Routine> routines = {
-#define QTB_ROUTINE(name, NAME, shape, T, route) make_routine<#shape, T>(#name),
+// In the order of the routines.
+using Binder = BoundCall (*)(const Library &, const Routine &, const Problem &);
+constexpr Binder binders[] = {
+#define QTB_ROUTINE(name, NAME, shape, T, route) bind_as<#shape, T>,
 #include "blas/routines.def"
 #undef QTB_ROUTINE
 };
 
-std::string_view Routine::options() const {
-  const std::size_t first = axes.find_first_of(option_axes);
-  if (first == axes.npos) return {};
-  return axes.substr(first, axes.find_last_of(option_axes) - first + 1);
-}
-
-bool Routine::knows(char axis, char letter) const {
-  const bool is_trans = axis == 'A' || axis == 'B';
-  if (!is_trans) return true;
-  if (letter == 'C' && !kind.complex) return false;  // where T says the same
-  return legal_trans(letter, kind) == letter;
-}
-
-double call_flops(const Routine &routine, const Problem &problem) {
-  return routine.describe(problem, routine.kind).work.flops(routine.kind.complex);
-}
-
-double call_bytes(const Routine &routine, const Problem &problem) {
-  const Description d = routine.describe(problem, routine.kind);
-  return (d.read() + d.written()) * static_cast<double>(routine.element_bytes());
-}
+}  // namespace
 
 BoundCall bind(const Library &library, const Routine &routine, const Problem &problem) {
-  return routine.bind(library, routine, problem);
+  return binders[&routine - routines.data()](library, routine, problem);
 }
 
 }  // namespace qtb::bench

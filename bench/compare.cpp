@@ -32,13 +32,12 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
-#include <optional>
 #include <string>
-#include <string_view>
 #include <vector>
 
 #include "bench/calls.h"
 #include "bench/limits.h"
+#include "bench/selection.h"
 #include "bench/sides.h"
 #include "bench/timing.h"
 #include "bench/traffic.h"
@@ -54,11 +53,8 @@ struct Options {
   Side ours;
   std::vector<Side> peers;
   std::string csv;
-  std::vector<std::string> routines{"level1"}, letters;
-  std::vector<long> sizes, bands{16}, increments{1};
-  std::vector<std::vector<long>> shapes;
-  std::optional<Scalar> alpha, beta;  // the routine's own where not given
-  long spare = 0, threads = 1;
+  Selection selection;
+  long threads = 1;
   int turns = 21;
   double seconds = 0.5;
   bool avx = false;  // the tier of this library's side
@@ -215,25 +211,22 @@ Traffic find_traffic(const Routine &routine, const calls::Description &d) {
   return traffic;
 }
 
-bool has_axis(const Routine &routine, const char *axes) {
-  return routine.axes.find_first_of(axes) != routine.axes.npos;
-}
-
-Case make_case(const Options &options, const CoreLimits &limits, const Routine &routine, const std::string &letters,
-               const Problem &problem) {
+Case make_case(const Options &options, const CoreLimits &limits, const Selected &call) {
+  const Routine &routine = *call.routine;
+  const Problem &problem = call.problem;
   const calls::Description d = routine.describe(problem, routine.kind);
   Case item;
   item.routine = routine.name;
-  item.letters = letters;
+  item.letters = call.letters;
   const auto number = [&](const char *axis, QtbInt value) {
-    if (!has_axis(routine, axis)) return std::string();
+    if (!routine.has_axis(axis)) return std::string();
     if (std::strchr("mnk", *axis) != nullptr) item.label += (item.label.empty() ? "" : "x") + std::to_string(value);
     return std::to_string(value);
   };
   item.numbers = number("m", problem.m) + ',' + number("n", problem.n) + ',' + number("k", problem.k) + ',' +
                  number("lb", problem.kl) + ',' + number("xy", problem.incx);
-  if (has_axis(routine, "lb")) item.label += " b" + std::to_string(problem.kl);
-  if (has_axis(routine, "xy") && problem.incx != 1) item.label += " inc " + std::to_string(problem.incx);
+  if (routine.has_axis("lb")) item.label += " b" + std::to_string(problem.kl);
+  if (routine.has_axis("xy") && problem.incx != 1) item.label += " inc " + std::to_string(problem.incx);
   const double flops = d.work.flops(routine.kind.complex);
   item.work = flops > 0 ? flops : call_bytes(routine, problem);
   item.unit = flops > 0 ? "GFLOP/s" : "GB/s";
@@ -298,23 +291,23 @@ Options parse(int argc, char **argv) {
     else if (key == "--threads")
       options.threads = std::stol(value);
     else if (key == "--routines")
-      options.routines = split(value, ',');
+      options.selection.routines = split(value, ',');
     else if (key == "--sizes")
-      options.sizes = parse_numbers(value, ',');
+      options.selection.sizes = parse_numbers(value, ',');
     else if (key == "--shapes")
-      for (const std::string &shape : split(value, ',')) options.shapes.push_back(parse_numbers(shape, 'x'));
+      for (const std::string &shape : split(value, ',')) options.selection.shapes.push_back(parse_numbers(shape, 'x'));
     else if (key == "--options")
-      options.letters = split(value, ',');
+      options.selection.letters = split(value, ',');
     else if (key == "--alpha")
-      options.alpha = parse_scalar(value);
+      options.selection.alpha = parse_scalar(value);
     else if (key == "--beta")
-      options.beta = parse_scalar(value);
+      options.selection.beta = parse_scalar(value);
     else if (key == "--bands")
-      options.bands = parse_numbers(value, ',');
+      options.selection.bands = parse_numbers(value, ',');
     else if (key == "--increments")
-      options.increments = parse_numbers(value, ',');
+      options.selection.increments = parse_numbers(value, ',');
     else if (key == "--spare")
-      options.spare = std::stol(value);
+      options.selection.spare = std::stol(value);
     else if (key == "--turns")
       options.turns = std::stoi(value);
     else if (key == "--seconds")
@@ -325,7 +318,8 @@ Options parse(int argc, char **argv) {
       fail("unknown option " + key);
   }
   if (options.ours.path.empty()) fail("--library is needed");
-  if (options.sizes.empty() && options.shapes.empty()) options.sizes = {4000};
+  Selection &selection = options.selection;
+  if (selection.sizes.empty() && selection.shapes.empty()) selection.sizes = {4000};
   for (Side &peer : options.peers)
     if (peer.path == "self") peer.path = options.ours.path;
   // What both sides have in common comes first, so that the settings of a side go before it.
@@ -336,77 +330,12 @@ Options parse(int argc, char **argv) {
   return options;
 }
 
-// ---- routines and options by name ----
-
-bool is_named(const Routine &routine, const std::string &name) {
-  return routine.name == name || routine.name.substr(1) == name || "level" + std::to_string(routine.level) == name;
-}
-
-// Every combination of a routine's letters that differs from the others.
-std::vector<std::string> all_letters(const Routine &routine) {
-  std::vector<std::string> words{""};
-  for (const char axis : routine.options()) {
-    std::vector<std::string> longer;
-    for (const std::string &word : words)
-      for (const char letter : calls::legal_letters(axis))
-        if (routine.knows(axis, letter)) longer.push_back(word + letter);
-    words = longer;
-  }
-  return words;
-}
-
-std::vector<std::string> letters_of(const Options &options, const Routine &routine) {
-  const std::vector<std::string> all = all_letters(routine);
-  if (options.letters.empty()) return {all.front()};
-  if (options.letters.front() == "all" || routine.options().empty()) return all;
-  std::vector<std::string> known;
-  for (const std::string &word : options.letters)
-    if (std::find(all.begin(), all.end(), word) != all.end()) known.push_back(word);
-  return known;
-}
-
-void set_letters(const Routine &routine, const std::string &letters, Problem &problem) {
-  for (std::size_t i = 0; i < letters.size(); ++i) problem.option(routine.options()[i]) = letters[i];
-}
-
-// The problems of one routine: every size and shape with every band and increment.
-std::vector<Problem> list_problems(const Options &options, const Routine &routine) {
-  std::vector<std::vector<long>> shapes = options.shapes;
-  std::string_view dimensions = routine.axes.substr(0, routine.axes.find_first_not_of(calls::size_axes));
-  for (const long size : options.sizes) shapes.emplace_back(dimensions.size(), size);
-  std::vector<Problem> problems;
-  for (const std::vector<long> &shape : shapes) {
-    if (shape.size() != dimensions.size()) continue;
-    for (const long band : has_axis(routine, "lb") ? options.bands : std::vector<long>{0})
-      for (const long increment : has_axis(routine, "xy") ? options.increments : std::vector<long>{1}) {
-        Problem problem;
-        for (std::size_t i = 0; i < shape.size(); ++i) problem.size(dimensions[i]) = shape[i];
-        problem.kl = problem.ku = band;
-        problem.incx = problem.incy = increment;
-        for (QtbInt &spare : problem.spare) spare = options.spare;
-        problem.alpha = options.alpha.value_or(routine.steady_alpha);
-        problem.beta = options.beta.value_or(routine.steady_beta);
-        problems.push_back(problem);
-      }
-  }
-  return problems;
-}
-
 std::vector<Case> list_cases(const Options &options, const CoreLimits &limits) {
   std::vector<Case> cases;
-  for (const std::string &name : options.routines) {
-    bool found = false;
-    for (const Routine &routine : routines) {
-      if (!is_named(routine, name)) continue;
-      for (const std::string &letters : letters_of(options, routine))
-        for (Problem problem : list_problems(options, routine)) {
-          set_letters(routine, letters, problem);
-          cases.push_back(make_case(options, limits, routine, letters, problem));
-          found = true;
-        }
-    }
-    if (!found) fail("no case of " + name);
-  }
+  std::string unknown;
+  for (const Selected &call : select_calls(options.selection, unknown))
+    cases.push_back(make_case(options, limits, call));
+  if (!unknown.empty()) fail("no case of " + unknown);
   return cases;
 }
 

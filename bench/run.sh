@@ -3,44 +3,38 @@
 # charts and the summary (summary.md) are kept in BUILD_FOLDER/bench-results.
 #
 # Environment:
-#   BENCH_PARTS            what to run (default: slot level1 kernels gemm families threads balance)
+#   BENCH_PARTS            what to run (default: slot level1 level2 kernels gemm flat families threads balance)
 #                            slot     what a dispatch slot costs
 #                            level1   Level 1 on one thread and on all, and beside the peer
+#                            level2   Level 2: every option and increment in cache, some beyond it, and on all threads
 #                            kernels  the inner kernels of matrix products, beside what their instructions allow
 #                            gemm     matrix products on one thread, beside the peer
+#                            flat     matrix products with one short side, on one thread, beside the peer
 #                            families the same by the kernels that this processor does not take
 #                            threads  matrix products on all threads, beside one thread and beside the peer
 #                            balance  how evenly matrix products are cut over up to 64 threads (nothing is timed)
-#   BENCH_TIERS            on which tiers (default: def sse3 ssse3 sse42 avx)
-#   BENCH_LONG             with any value, square products of sizes 2000 and 4000 too
+#   BENCH_TIERS            on which tiers (default: all)
+#   BENCH_LONG             with any value, square products of sizes 2000 and 4000 too, and Level 2 with every option at
+#                          every size
 #   BENCH_FILTER           regular expression of the Level-1 cases (default: all)
 #   BENCH_MIN_TIME         seconds per Level-1 case (default 0.005)
-#   PEER                   path of another BLAS shared library to compare with
-#   PEER_SETTING_<tier>    NAME=VALUE, the peer's own setting that holds it to the tier's instruction set
+#   PEER                   path of another BLAS shared library to compare with; PEER2 and PEER3 more of them
+#   PEER_SETTING_<tier>    NAME=VALUE, the peer's own setting that holds it to the tier's instruction set; likewise
+#                          PEER2_SETTING_<tier> and PEER3_SETTING_<tier>
 set -eu
 build=$1
 results=$build/bench-results
-all_tiers='def sse3 ssse3 sse42 avx' # in the order of their numbers
-parts=${BENCH_PARTS:-slot level1 kernels gemm families threads balance}
-tiers=${BENCH_TIERS:-$all_tiers}
+parts=${BENCH_PARTS:-slot level1 level2 kernels gemm flat families threads balance}
 threads=$(nproc)
 products=sgemm,dgemm,cgemm,zgemm
 mkdir -p "$results"
 
-# The processor's name for the instruction set of a tier.
-instruction_set() {
-  case $1 in
-    def) echo sse2 ;;
-    sse3) echo pni ;;
-    ssse3) echo ssse3 ;;
-    sse42) echo sse4_2 ;;
-    avx) echo avx ;;
-    *)
-      echo "run.sh: no such tier: $1" >&2
-      exit 2
-      ;;
-  esac
-}
+# number name runs|lacks, a line per tier; the summary and the charts read it too.
+"$build/bench/tiers" > "$results/tiers.txt"
+tiers=${BENCH_TIERS:-$(cut -d ' ' -f 2 "$results/tiers.txt")}
+for tier in $tiers; do
+  grep -q " $tier " "$results/tiers.txt" || { echo "run.sh: no such tier: $tier" >&2; exit 2; }
+done
 
 heading() { echo "== tier $tier: $1"; }
 
@@ -54,14 +48,14 @@ compared() {
   "$build/bench/compare" --library "$library" "$@" --csv "$results/$name.csv" | tee "$results/$name.txt"
 }
 
-# The same beside the peer, where there is one.
+# The same beside the peers that there are.
 beside_peer() {
   name_of_part=$1
   shift
-  if [ -n "${PEER:-}" ]; then
-    eval "setting=\${PEER_SETTING_$tier:-}"
-    set -- "$@" --peer "$PEER" ${setting:+--peer-setting "$setting"}
-  fi
+  for which in PEER PEER2 PEER3; do
+    eval "path=\${$which:-} setting=\${${which}_SETTING_$tier:-}"
+    [ -z "$path" ] || set -- "$@" --peer "$path" ${setting:+--peer-setting "$setting"}
+  done
   compared "$name_of_part" "$@"
 }
 
@@ -85,6 +79,38 @@ part_level1() {
   beside_peer vectors --threads 1 --sizes 8,32,100,4000,32000
 }
 
+# Some letters of each routine of Level 2: plain and transposed, upper and lower.
+some_options=N,T,U,UNN,LTN
+# The routines with a parallel path.
+threaded=gemv,ssymv,dsymv,ssyr,dsyr,ssyr2,dsyr2,trmv,trsv
+
+part_level2() {
+  set -- --turns 7 --seconds 0.1
+  if [ -n "${BENCH_LONG:-}" ]; then
+    heading "Level 2, one thread, every option and increment${PEER:+, beside $PEER}"
+    beside_peer level2 --threads 1 --routines level2 --options all --increments 1,2,-1 \
+      --sizes 4,5,8,16,32,100,200,500,1000,2000,4000 "$@"
+  else
+    heading "Level 2, one thread${PEER:+, beside $PEER}"
+    beside_peer level2 --threads 1 --routines level2 --options $some_options --sizes 4,8,16,32,200,500 "$@"
+    heading "Level 2, one thread, every option${PEER:+, beside $PEER}"
+    beside_peer level2-options --threads 1 --routines level2 --options all --sizes 100 "$@"
+    heading "Level 2, one thread, increments${PEER:+, beside $PEER}"
+    beside_peer level2-increments --threads 1 --routines level2 --options $some_options --increments 2,-1 \
+      --sizes 100 "$@"
+    heading "Level 2, one thread, large${PEER:+, beside $PEER}"
+    beside_peer level2-large --threads 1 --options N,T,U,UNN,UTN --sizes 1000,2000,4000 \
+      --routines dgemv,dger,dsymv,dspmv,dsyr,dsyr2,dtrmv,dtrsv,dtpmv,dtpsv,dgbmv,dtbsv --bands 100 "$@"
+  fi
+  heading "Level 2, $threads threads, beside one"
+  compared level2-threads-serial --threads "$threads" --routines $threaded --options N,T,U,UNN,UTN \
+    --sizes 100,200,500,1000,4000 --peer self --peer-setting QTB_NUM_THREADS=1 "$@"
+  [ -n "${PEER:-}" ] || return 0
+  heading "Level 2, $threads threads, beside $PEER"
+  beside_peer level2-threads-peer --threads "$threads" --routines $threaded --options N,T,U,UNN,UTN \
+    --sizes 100,200,500,1000,4000 "$@"
+}
+
 part_kernels() {
   heading 'the inner kernels of products alone'
   "$build/bench/inner_kernels" | tee "$results/kernels-$tier.txt"
@@ -95,9 +121,18 @@ square_sizes=4,8,16,32,64,100,200,350,500,1000${BENCH_LONG:+,2000,4000}
 part_gemm() {
   heading "products, one thread${PEER:+, beside $PEER}"
   beside_peer square --threads 1 --routines $products --sizes "$square_sizes"
-  beside_peer flat --threads 1 --routines $products \
+  beside_peer oblong --threads 1 --routines $products \
     --shapes 1000x1000x32,200x200x32,16x1000x1000,16x200x200,1000x16x1000,200x16x200
   beside_peer options --threads 1 --routines $products --options NT,TN,TT --sizes 8,32,200,1000
+}
+
+part_flat() {
+  shapes=
+  for side in 1 2 3 4 5 8 12 16 17 24; do
+    shapes=$shapes${shapes:+,}${side}x500x500,500x${side}x500,500x500x$side
+  done
+  heading "products with one short side, one thread${PEER:+, beside $PEER}"
+  beside_peer flat --threads 1 --routines $products --options NN,NT,TN,TT --shapes "$shapes" --turns 7 --seconds 0.1
 }
 
 part_families() {
@@ -128,19 +163,15 @@ part_balance() {
   "$build/bench/load_balance" | tee "$results/balance-$tier.txt"
 }
 
-number=0
-for tier in $all_tiers; do
-  case " $tiers " in
-    *" $tier "*)
-      if grep -qwm1 "$(instruction_set "$tier")" /proc/cpuinfo; then
-        export QTB_DEBUG_CPU_TYPE=$number
-        for part in $parts; do "part_$part"; done
-      else
-        echo "tier $tier: not on this processor"
-      fi
-      ;;
-  esac
-  number=$((number + 1))
+for tier in $tiers; do
+  # shellcheck disable=SC2046 # a line of three words
+  set -- $(grep " $tier " "$results/tiers.txt")
+  if [ "$3" = lacks ]; then
+    echo "tier $tier: not on this processor"
+    continue
+  fi
+  export QTB_DEBUG_CPU_TYPE="$1"
+  for part in $parts; do "part_$part"; done
 done
 
 folder=$(dirname "$0")
@@ -148,7 +179,7 @@ if ls "$results"/*.csv > /dev/null 2>&1; then
   "$folder/summary.sh" "$results" > "$results/summary.md"
   echo "== summary: $results/summary.md"
 fi
-if ls "$results"/square-*.csv > /dev/null 2>&1; then
+if ls "$results"/square-*.csv "$results"/level2-*.csv > /dev/null 2>&1; then
   "$folder/chart.sh" "$results"
   echo "== charts: $results/*.svg and *.png"
 fi

@@ -1,15 +1,17 @@
 #!/bin/sh
 # summary.sh RESULTS: the comparisons in RESULTS/*.csv as Markdown tables: a row per routine and case, a column per
-# tier.
+# tier, in the order of RESULTS/tiers.txt.
 set -eu
 cd "$1"
+order=$(cut -d ' ' -f 2 tiers.txt | tr '\n' ' ')
 
 # table CELL FILE...: the rows of files named <kind>-<tier>.csv. A cell is "rate" (the rate, its share of the limit, the
-# ratio to the peer) or "ratio" (that of each kind of file, in the order given).
+# ratio to each peer), "ratio" (that of each kind of file, in the order given, to each peer) or "gemv" (of the rows of
+# trmv and trsv, the rate over that of gemv with the same transposition, type and order).
 table() {
   cell=$1
   shift
-  awk -F, -v cell="$cell" '
+  awk -F, -v cell="$cell" -v order_of_tiers="$order" '
     function join_cell(key, text) {
       if (key in cells) text = cells[key] " / " text
       cells[key] = text
@@ -37,16 +39,31 @@ table() {
       if ($column["band"] != "") shape = shape ", band " $column["band"]
       if ($column["increment"] != "" && $column["increment"] != 1) shape = shape ", increment " $column["increment"]
       row = $column["routine"] " | " $column["options"] " | " shape
-      if (!(row in known)) { known[row] = 1; rows[++count] = row }
       ratio = $column["ratio"] > 0 ? sprintf("%.2f", $column["ratio"]) : "-"
       outcome = $column["outcome"]
-      if (outcome != "measured") text = outcome
-      else if (cell == "ratio") text = ratio
+      if (cell == "gemv") {
+        if ($column["peer"] > 1) next
+        type = substr($column["routine"], 1, 1)
+        trans = $column["options"]
+        if ($column["routine"] ~ /^.gemv$/) { gemv[tier, type, trans, shape] = $column["rate"]; next }
+        if ($column["routine"] !~ /^.tr[ms]v$/) next
+        as_gemv[++triangles] = tier SUBSEP type SUBSEP substr(trans, 2, 1) SUBSEP shape
+        rate[triangles] = $column["rate"]
+        row_of[triangles] = row
+        text = ""
+      }
+      else if (outcome != "measured") text = outcome
+      else if (cell == "ratio" || $column["peer"] > 1) text = ratio
       else text = sprintf("%.1f / %.0f%% / %s", $column["rate"], 100 * $column["share"], ratio)
-      join_cell(row SUBSEP tier, text)
+      if (!(row in known)) { known[row] = 1; rows[++count] = row }
+      if (cell != "gemv") join_cell(row SUBSEP tier, text)
     }
     END {
-      tiers = split("def sse3 ssse3 sse42 avx", order, " ")
+      for (i = 1; i <= triangles; i++) {
+        split(as_gemv[i], part, SUBSEP)
+        if (gemv[as_gemv[i]] > 0) cells[row_of[i], part[1]] = sprintf("%.2f", rate[i] / gemv[as_gemv[i]])
+      }
+      tiers = split(order_of_tiers, order, " ")
       head = "| Routine | Options | Case |"
       line = "|---|---|---|"
       for (t = 1; t <= tiers; t++) if (order[t] in seen) { head = head " " order[t] " |"; line = line "---|" }
@@ -68,7 +85,7 @@ section() {
   shift 3
   files=
   for kind in "$@"; do
-    for tier in def sse3 ssse3 sse42 avx; do
+    for tier in $order; do
       [ ! -s "$kind-$tier.csv" ] || files="$files $kind-$tier.csv"
     done
   done
@@ -80,13 +97,25 @@ section() {
 
 section 'Matrix products, one thread' \
   'GFLOP/s / share of the arithmetic peak / ratio to the peer (above 1: this library is faster)' \
-  rate square flat options
+  rate square oblong options
+section 'Matrix products with one short side, one thread' \
+  'GFLOP/s / share of the arithmetic peak / ratio to the peer' \
+  rate flat
 section 'Matrix products, one thread, by the kernels that this processor does not take' \
   'GFLOP/s / share of the arithmetic peak / ratio to the peer' \
   rate families
 section 'Matrix products, all threads' \
   'Ratio to this library on one thread / ratio to the peer on all threads' \
   ratio threads-serial threads-peer
+section 'Level 2, one thread' \
+  'GFLOP/s / share of what caches, memory and arithmetic allow / ratio to the peer' \
+  rate level2 level2-large level2-increments level2-options
+section 'Level 2, triangular matrices beside general ones, one thread' \
+  'Rate over that of gemv of the same order and transposition, in the same run' \
+  gemv level2 level2-large level2-options
+section 'Level 2, all threads' \
+  'Ratio to this library on one thread / ratio to the peer on all threads' \
+  ratio level2-threads-serial level2-threads-peer
 section 'Level 1, one thread' \
   'GFLOP/s, or GB/s where nothing is computed / share of what a core allows in cache / ratio to the peer' \
   rate vectors

@@ -14,7 +14,7 @@ inline void describe_two_matrices(const Problem &p, const Form &a, const Layout 
                                   Description &d) {
   const bool is_read = !p.alpha.is_zero();
   d.a = input(a.layout, is_read, a.structure);
-  d.b = input(b, is_read);
+  if (b.rows > 0 || b.cols > 0) d.b = input(b, is_read);
   d.c = result(c.layout, !p.beta.is_zero(), c.structure);
   d.work = products_and_sums(products);
 }

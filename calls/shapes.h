@@ -56,6 +56,7 @@ struct Form {
   Layout layout;
   Structure structure = Structure::general;
   bool is_read = false, is_written = false;
+  bool is_argument = false;  // whether the shape has it
 };
 
 // Operations in the element type, and operations on its parts one by one. A complex product is four real products and
@@ -91,11 +92,11 @@ struct Description {
 };
 
 inline Form input(const Layout &layout, bool is_read = true, Structure structure = Structure::general) {
-  return {layout, structure, is_read, false};
+  return {layout, structure, is_read, false, true};
 }
 // Read where the routine adds to what is there.
 inline Form result(const Layout &layout, bool is_read, Structure structure = Structure::general) {
-  return {layout, structure, is_read, true};
+  return {layout, structure, is_read, true, true};
 }
 
 // ---- arguments ----
@@ -207,6 +208,7 @@ struct Scalars {
   char side, uplo, transa, transb, diag;
   QtbInt m, n, k, kl, ku, lda, ldb, ldc, incx, incy;
   T alpha, beta;  // a real factor is the first part
+  // What follows is written by calls that have it.
   T result{}, sine{};
   Real<T> cosine{};
   T param[5]{}, d1{}, d2{}, x1{}, y1{};

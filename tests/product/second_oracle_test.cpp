@@ -26,7 +26,7 @@ void add(void *library, const char *name) {
   // Generation of rotations differs by design in signs and special cases.
   if (std::strstr(name, "rotg") != nullptr || std::strstr(name, "rotmg") != nullptr) return;
   void *symbol = dlsym(library, (std::string(name) + "_").c_str());
-  if (symbol != nullptr) register_routine<shape, T>(Routine<Function>(name, symbol));
+  if (symbol != nullptr) register_routine<shape, T>(Routine<Function>(name, qtb::calls::kind_of<T>(name), symbol));
 }
 
 void add_all(void *library) {

@@ -1,8 +1,8 @@
-// How a routine of each Level-1 shape is tested on one problem: the arguments made, the call, the judgement. Only n,
-// the increments and the factors of a problem are used; kl and ku choose special cases.
+// How a routine of each Level-1 shape is tested on one problem: the call, and what is expected of it. Only n, the
+// increments and the factors of a problem are used; kl and ku choose special cases.
 #pragma once
 
-#include "tests/product/surface/session.h"
+#include "tests/product/surface/called.h"
 
 namespace qtb::surface {
 
@@ -12,10 +12,20 @@ using reference::Term;
 using reference::update;
 
 // A large problem's vectors are as long as its matrices are large.
-inline QtbInt vector_length(const Problem &p) { return p.n <= 70 ? p.n : 30 * p.n; }
-
-// The increment of an operand that is only read: sometimes zero, the same element every time.
+inline Problem with_length(Problem p) {
+  if (p.n > 70) p.n *= 30;
+  return p;
+}
+// An operand that is only read sometimes has an increment of zero, the same element every time.
 inline QtbInt input_increment(QtbInt increment, QtbInt choice) { return choice == 1 ? 0 : increment; }
+inline Problem with_input_x(Problem p) {
+  p.incx = input_increment(p.incx, p.kl);
+  return with_length(p);
+}
+inline Problem with_inputs(Problem p) {
+  p.incy = input_increment(p.incy, p.ku);
+  return with_input_x(p);
+}
 
 inline Dense one_by_one(bool complex) {
   Dense d(1, 1, complex, true);
@@ -24,81 +34,67 @@ inline Dense one_by_one(bool complex) {
 }
 // What a vector holds already, read as a matrix of one column.
 template <class T>
-Dense column_before(const Operand<T> &x) {
+Dense column_before(const Array<T> &x) {
   return reference::read(x.layout(), x.before());
 }
 
 // The elements of one vector in the places of another, exactly.
 template <class T>
-Expectation moved(const Operand<T> &from, const Layout &to) {
+Expectation moved(const Array<T> &from, const Layout &to) {
   const T nothing{};
   return update(to, {{{1, 0}, column_before(from), one_by_one(is_complex<T>)}}, {0, 0}, &nothing, 0);
 }
 
 // ---- updates and moves ----
 
-// y := alpha*x + y. call(alpha, x, y) makes the call.
-template <class T, class Call>
-void test_axpy(const Problem &p, Session &s, const Layout &lx, const Layout &ly, Call call) {
-  Draw draw(p.seed);
-  Operand<T> x(lx, draw), y(ly, draw);
-  const T alpha = scalar<T>(p.alpha);
-  prepare_input(x, Structure::general, p, draw, !is_zero(alpha));
-  prepare_output(y, Structure::general, p, draw, true);
-  call(&alpha, x.data(), y.data());
-  s.judge(y, is_zero(alpha) ? reference::untouched(ly)
-                            : update(ly, {{test::widen(alpha), column_before(x), one_by_one(is_complex<T>)}}, {1, 0},
-                                     y.before(), is_complex<T> ? 3 : 2));
+// y := alpha*x + y.
+template <ShapeName shape, class T, class R>
+void test_axpy(const R &routine, const Problem &p, Session &s) {
+  Called<shape, T> o(p, routine.kind());
+  o.call(s, routine);
+  const T alpha = o.scalars.alpha;
+  const Layout &layout = o.y.layout();
+  s.judge(o.y.operand(), is_zero(alpha)
+                             ? reference::untouched(layout)
+                             : update(layout, {{test::widen(alpha), column_before(o.x), one_by_one(is_complex<T>)}},
+                                      {1, 0}, o.y.before(), is_complex<T> ? 3 : 2));
 }
-
 template <class T, class R>
 void run(Shape<"axpy">, const R &routine, const Problem &p, Session &s) {
-  const QtbInt n = vector_length(p), incx = input_increment(p.incx, p.kl);
-  test_axpy<T>(p, s, strided(n, incx), strided(n, p.incy),
-               [&](const T *alpha, const T *x, T *y) { s.call(routine, &n, alpha, x, &incx, y, &p.incy); });
+  test_axpy<"axpy", T>(routine, with_input_x(p), s);
 }
 
 template <class T, class R>
 void run(Shape<"copy">, const R &routine, const Problem &p, Session &s) {
-  const QtbInt n = vector_length(p), incx = input_increment(p.incx, p.kl);
-  Draw draw(p.seed);
-  Operand<T> x(strided(n, incx), draw), y(strided(n, p.incy), draw);
-  prepare_input(x, Structure::general, p, draw, true);
-  prepare_output(y, Structure::general, p, draw, false);
-  s.call(routine, &n, x.data(), &incx, y.data(), &p.incy);
-  s.judge(y, moved(x, y.layout()));
+  Called<"copy", T> o(with_input_x(p), routine.kind());
+  o.call(s, routine);
+  s.judge(o.y.operand(), moved(o.x, o.y.layout()));
 }
 
 template <class T, class R>
 void run(Shape<"swap">, const R &routine, const Problem &p, Session &s) {
-  const QtbInt n = vector_length(p);
-  Draw draw(p.seed);
-  Operand<T> x(strided(n, p.incx), draw), y(strided(n, p.incy), draw);
-  prepare_output(x, Structure::general, p, draw, true);
-  prepare_output(y, Structure::general, p, draw, true);
-  s.call(routine, &n, x.data(), &p.incx, y.data(), &p.incy);
-  s.judge(x, moved(y, x.layout()));
-  s.judge(y, moved(x, y.layout()));
+  Called<"swap", T> o(with_length(p), routine.kind());
+  o.call(s, routine);
+  s.judge(o.x.operand(), moved(o.y, o.x.layout()));
+  s.judge(o.y.operand(), moved(o.x, o.y.layout()));
 }
 
-// x := alpha*x. A negative increment takes the elements that its magnitude takes.
-template <class T, class Factor, class R>
-void test_scal(const R &routine, const Problem &p, Session &s) {
-  const QtbInt n = vector_length(p), incx = routine.is_independent() ? std::abs(p.incx) : p.incx;
-  Draw draw(p.seed);
-  Operand<T> x(strided(n, incx), draw);
-  const Factor alpha = scalar<Factor>(p.alpha);
-  prepare_output(x, Structure::general, p, draw, true);
-  s.call(routine, &n, &alpha, x.data(), &incx);
-  s.judge(x, update(x.layout(), {}, test::widen(alpha), x.before(), is_complex<Factor> ? 2 : 1));
+// x := alpha*x, with so many roundings. A negative increment takes the elements that its magnitude takes.
+template <ShapeName shape, class T, class R>
+void test_scal(const R &routine, const Problem &p, Session &s, double roundings) {
+  Problem q = with_length(p);
+  if (routine.is_independent()) q.incx = std::abs(q.incx);
+  Called<shape, T> o(q, routine.kind());
+  o.call(s, routine);
+  s.judge(o.x.operand(), update(o.x.layout(), {}, test::widen(o.scalars.alpha), o.x.before(), roundings));
 }
 template <class T, class R>
 void run(Shape<"scal">, const R &routine, const Problem &p, Session &s) {
-  test_scal<T, T>(routine, p, s);
+  test_scal<"scal", T>(routine, p, s, is_complex<T> ? 2 : 1);
 }
 template <class T, class R>
 void run(Shape<"real_scal">, const R &routine, const Problem &p, Session &s) {
-  test_scal<T, Real<T>>(routine, p, s);
+  test_scal<"real_scal", T>(routine, p, s, 1);
 }
 
 // ---- dot products ----
@@ -109,65 +105,54 @@ struct Dot {
   double gauge;
 };
 template <class T>
-Dot dot_before(const Operand<T> &x, const Operand<T> &y, bool conjugated) {
+Dot dot_before(const Array<T> &x, const Array<T> &y, bool conjugated) {
   const Dense row = reference::op(conjugated ? 'C' : 'T', column_before(x));
   const T nothing{};
   const Expectation e = update(strided(1, 1), {{{1, 0}, row, column_before(y)}}, {0, 0}, &nothing, 0);
   return {e.at(0, 0).value, e.at(0, 0).gauge};
 }
 
-// The arguments of a dot product, filled and sealed.
-template <class T>
-struct DotOperands {
-  DotOperands(const Problem &p, const Layout &lx, const Layout &ly) : draw(p.seed), x(lx, draw), y(ly, draw) {
-    prepare_input(x, Structure::general, p, draw, true);
-    prepare_input(y, Structure::general, p, draw, true);
-  }
-  Draw draw;
-  Operand<T> x, y;
-};
-
+template <ShapeName shape, class T, class R>
+void test_dot(const R &routine, const Problem &p, Session &s) {
+  Called<shape, T> o(p, routine.kind());
+  const auto got = o.call(s, routine);
+  const Dot want = dot_before(o.x, o.y, false);
+  s.judge_value(got, want.value, want.gauge, static_cast<double>(o.x.layout().rows));
+}
 template <class T, class R>
 void run(Shape<"dot">, const R &routine, const Problem &p, Session &s) {
-  const QtbInt n = vector_length(p), incx = input_increment(p.incx, p.kl), incy = input_increment(p.incy, p.ku);
-  DotOperands<T> o(p, strided(n, incx), strided(n, incy));
-  const T got = s.call(routine, &n, o.x.data(), &incx, o.y.data(), &incy);
-  const Dot want = dot_before(o.x, o.y, false);
-  s.judge_value(got, want.value, want.gauge, static_cast<double>(n));
+  test_dot<"dot", T>(routine, with_inputs(p), s);
 }
-
-template <class T, class R>
-void run(Shape<"cdot">, const R &routine, const Problem &p, Session &s) {
-  const QtbInt n = vector_length(p), incx = input_increment(p.incx, p.kl), incy = input_increment(p.incy, p.ku);
-  DotOperands<T> o(p, strided(n, incx), strided(n, incy));
-  T got{};
-  T *const returned = s.call(routine, &got, &n, o.x.data(), &incx, o.y.data(), &incy);
-  s.require(returned == &got, "the value of a complex function is the pointer to its result");
-  const Dot want = dot_before(o.x, o.y, routine.is_conjugated());
-  s.judge_value(got, want.value, want.gauge, 2 * static_cast<double>(n));
-}
-
 template <class T, class R>
 void run(Shape<"dsdot">, const R &routine, const Problem &p, Session &s) {
-  const QtbInt n = vector_length(p), incx = input_increment(p.incx, p.kl), incy = input_increment(p.incy, p.ku);
-  DotOperands<T> o(p, strided(n, incx), strided(n, incy));
-  const double got = s.call(routine, &n, o.x.data(), &incx, o.y.data(), &incy);
-  const Dot want = dot_before(o.x, o.y, false);
-  s.judge_value(got, want.value, want.gauge, static_cast<double>(n));
+  test_dot<"dsdot", T>(routine, with_inputs(p), s);
+}
+
+template <ShapeName shape, class T, class R>
+void test_complex_dot(const R &routine, const Problem &p, Session &s) {
+  Called<shape, T> o(p, routine.kind());
+  T *const returned = o.call(s, routine);
+  s.require(returned == &o.scalars.result, "the value of a complex function is the pointer to its result");
+  const Dot want = dot_before(o.x, o.y, routine.kind().conjugated);
+  s.judge_value(o.scalars.result, want.value, want.gauge, 2 * static_cast<double>(o.x.layout().rows));
+}
+template <class T, class R>
+void run(Shape<"cdot">, const R &routine, const Problem &p, Session &s) {
+  test_complex_dot<"cdot", T>(routine, with_inputs(p), s);
 }
 
 template <class T, class R>
 void run(Shape<"sdsdot">, const R &routine, const Problem &p, Session &s) {
-  const QtbInt n = vector_length(p), incx = input_increment(p.incx, p.kl), incy = input_increment(p.incy, p.ku);
-  DotOperands<T> o(p, strided(n, incx), strided(n, incy));
-  const T sb = scalar<T>(p.alpha);
-  const T got = s.call(routine, &n, &sb, o.x.data(), &incx, o.y.data(), &incy);
+  Called<"sdsdot", T> o(with_inputs(p), routine.kind());
+  const double n = static_cast<double>(o.x.layout().rows);
+  const T sb = o.scalars.alpha;
+  const T got = o.call(s, routine);
   Dot want = dot_before(o.x, o.y, false);
   want.value.re += Quad(sb);
   // One rounding to single, and n of the double sum.
   constexpr double doubles = test::unit_roundoff<double> / test::unit_roundoff<float>;
-  const double gauge = std::fabs(static_cast<double>(want.value.re)) +
-                       static_cast<double>(n) * doubles * (want.gauge + std::fabs(static_cast<double>(sb)));
+  const double gauge =
+      std::fabs(static_cast<double>(want.value.re)) + n * doubles * (want.gauge + std::fabs(static_cast<double>(sb)));
   s.judge_value(got, want.value, gauge, 1);
 }
 
@@ -178,7 +163,7 @@ struct PlaneMap {
   double xx, xy, yx, yy;
 };
 template <class T>
-Expectation mapped(const Layout &out, double fx, const Operand<T> &x, double fy, const Operand<T> &y) {
+Expectation mapped(const Layout &out, double fx, const Array<T> &x, double fy, const Array<T> &y) {
   const Dense one = one_by_one(is_complex<T>);
   const T nothing{};
   std::vector<Term> terms;
@@ -187,42 +172,37 @@ Expectation mapped(const Layout &out, double fx, const Operand<T> &x, double fy,
   return update(out, terms, {0, 0}, &nothing, is_complex<T> ? 4 : 2);
 }
 
-// A map of two vectors, stored as told. call(x, y) makes the call; nothing may change where it is not applied.
-template <class T, class Call>
-void test_plane_map(const Problem &p, Session &s, const Layout &lx, const Layout &ly, PlaneMap map, bool applied,
-                    Call call) {
-  Draw draw(p.seed);
-  Operand<T> x(lx, draw), y(ly, draw);
-  prepare_output(x, Structure::general, p, draw, true);
-  prepare_output(y, Structure::general, p, draw, true);
-  call(x.data(), y.data());
-  s.judge(x, applied ? mapped(lx, map.xx, x, map.xy, y) : reference::untouched(lx));
-  s.judge(y, applied ? mapped(ly, map.yx, x, map.yy, y) : reference::untouched(ly));
+// The call made, of a map of two vectors: nothing may change where it is not applied.
+template <ShapeName shape, class T, class R>
+void test_plane_map(Called<shape, T> &o, const R &routine, Session &s, PlaneMap map, bool applied) {
+  o.call(s, routine);
+  const Layout &lx = o.x.layout(), &ly = o.y.layout();
+  s.judge(o.x.operand(), applied ? mapped(lx, map.xx, o.x, map.xy, o.y) : reference::untouched(lx));
+  s.judge(o.y.operand(), applied ? mapped(ly, map.yx, o.x, map.yy, o.y) : reference::untouched(ly));
 }
 
 template <class T, class R>
 void run(Shape<"rot">, const R &routine, const Problem &p, Session &s) {
-  const QtbInt n = vector_length(p);
-  const Real<T> c = scalar<Real<T>>(p.alpha), sine = scalar<Real<T>>(p.beta);
-  const double dc = static_cast<double>(c), ds = static_cast<double>(sine);
-  test_plane_map<T>(p, s, strided(n, p.incx), strided(n, p.incy), {dc, ds, -ds, dc}, true,
-                    [&](T *x, T *y) { s.call(routine, &n, x, &p.incx, y, &p.incy, &c, &sine); });
+  Called<"rot", T> o(with_length(p), routine.kind());
+  const double c = static_cast<double>(scalar<Real<T>>(p.alpha)), sine = static_cast<double>(scalar<Real<T>>(p.beta));
+  test_plane_map(o, routine, s, {c, sine, -sine, c}, true);
 }
 
 template <class T, class R>
 void run(Shape<"rotm">, const R &routine, const Problem &p, Session &s) {
-  const QtbInt n = vector_length(p);
+  Called<"rotm", T> o(with_length(p), routine.kind());
   Draw draw(p.seed + 1);
   const double flag = static_cast<double>(draw.integer(-2, 1));
   const double h11 = draw_scalar(draw, p.values).re, h21 = draw_scalar(draw, p.values).re,
                h12 = draw_scalar(draw, p.values).re, h22 = draw_scalar(draw, p.values).re;
-  const T param[5] = {static_cast<T>(flag), static_cast<T>(h11), static_cast<T>(h21), static_cast<T>(h12),
-                      static_cast<T>(h22)};
+  const double drawn[] = {flag, h11, h21, h12, h22};
+  T(&param)[5] = o.scalars.param;
+  for (std::size_t i = 0; i < 5; ++i) param[i] = static_cast<T>(drawn[i]);
   PlaneMap map{param[1], param[3], param[2], param[4]};
   if (flag == 0) map.xx = map.yy = 1;
   if (flag == 1) map.xy = 1, map.yx = -1;
-  test_plane_map<T>(p, s, strided(n, p.incx), strided(n, p.incy), map, flag != -2,
-                    [&](T *x, T *y) { s.call(routine, &n, x, &p.incx, y, &p.incy, param); });
+  test_plane_map(o, routine, s, map, flag != -2);
+  for (std::size_t i = 0; i < 5; ++i) s.require(param[i] == static_cast<T>(drawn[i]), "param is an input");
 }
 
 inline Quad square_root(Quad v) {
@@ -236,11 +216,11 @@ inline Quad square_root(Quad v) {
 template <class T, class R>
 void run(Shape<"rotg">, const R &routine, const Problem &p, Session &s) {
   using Part = Real<T>;
-  T a = scalar<T>(p.alpha), b = scalar<T>(p.beta);
+  Called<"rotg", T> o(p, routine.kind());
+  const T &a = o.scalars.alpha, &b = o.scalars.beta, &sine = o.scalars.sine;
+  const Part &c = o.scalars.cosine;
   const QuadComplex before_a = test::widen(a), before_b = test::widen(b);
-  Part c{};
-  T sine{};
-  s.call(routine, &a, &b, &c, &sine);
+  o.call(s, routine);
   const QuadComplex r = test::widen(a), wide_s = test::widen(sine);
   const QuadComplex wide_c{Quad(c), 0};
   const Quad length = square_root(before_a.re * before_a.re + before_a.im * before_a.im + before_b.re * before_b.re +
@@ -278,11 +258,14 @@ template <class T, class R>
 void run(Shape<"rotmg">, const R &routine, const Problem &p, Session &s) {
   Draw draw(p.seed);
   const auto near_one = [&] { return static_cast<T>(1.5 + draw.real() / 2); };
-  T d1 = near_one(), d2 = near_one(), x1 = near_one();
-  const T y1 = static_cast<T>(draw.one_in(2) ? static_cast<double>(near_one()) : -static_cast<double>(near_one()));
+  Called<"rotmg", T> o(p, routine.kind());
+  T &d1 = o.scalars.d1, &d2 = o.scalars.d2, &x1 = o.scalars.x1, &y1 = o.scalars.y1;
+  d1 = near_one(), d2 = near_one(), x1 = near_one();
+  y1 = static_cast<T>(draw.one_in(2) ? static_cast<double>(near_one()) : -static_cast<double>(near_one()));
   const Quad old_d1 = d1, old_d2 = d2, old_x1 = x1, old_y1 = y1;
-  T param[5] = {};
-  s.call(routine, &d1, &d2, &x1, &y1, param);
+  o.call(s, routine);
+  const T(&param)[5] = o.scalars.param;
+  s.require(Quad(y1) == old_y1, "y1 is an input");
   const Quad h11 = param[0] == 1 ? Quad(param[1]) : 1, h22 = param[0] == 1 ? Quad(param[4]) : 1;
   const Quad h21 = param[0] == 1 ? Quad(-1) : Quad(param[2]), h12 = param[0] == 1 ? Quad(1) : Quad(param[3]);
   s.require(param[0] == 0 || param[0] == 1, "nothing is rescaled");
@@ -301,13 +284,12 @@ void run(Shape<"rotmg">, const R &routine, const Problem &p, Session &s) {
 
 template <class T, class R>
 void run(Shape<"norm">, const R &routine, const Problem &p, Session &s) {
-  const QtbInt n = vector_length(p);
-  const QtbInt incx = routine.is_independent() ? std::abs(p.incx) : input_increment(p.incx, p.kl);
-  Draw draw(p.seed);
-  Operand<T> x(strided(n, incx), draw);
-  prepare_input(x, Structure::general, p, draw, true);
-  const Real<T> got = s.call(routine, &n, x.data(), &incx);
-  const Dense column = column_before(x);
+  Problem q = with_input_x(p);
+  if (routine.is_independent()) q.incx = std::abs(p.incx);
+  Called<"norm", T> o(q, routine.kind());
+  const Real<T> got = o.call(s, routine);
+  const Dense column = column_before(o.x);
+  const QtbInt n = q.n;
   Quad sum = 0, squares = 0;
   for (QtbInt i = 0; i < n; ++i) {
     const QuadComplex v = column.value(i, 0);
@@ -315,7 +297,7 @@ void run(Shape<"norm">, const R &routine, const Problem &p, Session &s) {
     squares += v.re * v.re + v.im * v.im;
   }
   const double terms = static_cast<double>(is_complex<T> ? 2 * n : n);
-  const bool is_sum = std::string(routine.name()).find("asum") != std::string::npos;
+  const bool is_sum = !routine.kind().squares;
   const Quad want = is_sum ? sum : square_root(squares);
   const bool rescales = sizeof(Real<T>) == sizeof(double);
   const double c = is_sum ? terms : rescales ? 3 * terms + 4 : terms / 2 + 4;
@@ -332,16 +314,14 @@ Real<T> search_magnitude(T v) {
 
 template <class T, class R>
 void run(Shape<"search">, const R &routine, const Problem &p, Session &s) {
-  const QtbInt n = vector_length(p), incx = input_increment(p.incx, p.kl);
-  Draw draw(p.seed);
-  Operand<T> x(strided(n, incx), draw);
-  prepare_input(x, Structure::general, p, draw, true);
-  const QtbInt got = s.call(routine, &n, x.data(), &incx);
+  Called<"search", T> o(with_input_x(p), routine.kind());
+  const QtbInt n = o.scalars.n, incx = o.scalars.incx;
+  const QtbInt got = o.call(s, routine);
   const bool largest = std::string(routine.name()).find("max") != std::string::npos;
   QtbInt want = n < 1 || incx < 1 ? 0 : 1;
   for (QtbInt i = 1; i < n && want != 0; ++i) {
-    const Real<T> value = search_magnitude(reference::load(x.before(), i * incx));
-    const Real<T> best = search_magnitude(reference::load(x.before(), (want - 1) * incx));
+    const Real<T> value = search_magnitude(reference::load(o.x.before(), i * incx));
+    const Real<T> best = search_magnitude(reference::load(o.x.before(), (want - 1) * incx));
     if (largest ? value > best : value < best) want = i + 1;
   }
   s.require(got == want, "the index of the first extreme magnitude");
@@ -349,8 +329,9 @@ void run(Shape<"search">, const R &routine, const Problem &p, Session &s) {
 
 template <class T, class R>
 void run(Shape<"cabs1">, const R &routine, const Problem &p, Session &s) {
-  const T z = scalar<T>(p.alpha);
-  const Real<T> got = s.call(routine, &z);
+  Called<"cabs1", T> o(p, routine.kind());
+  const T z = o.scalars.alpha;
+  const Real<T> got = o.call(s, routine);
   s.judge_value(got, {magnitude(test::widen(z)), 0}, static_cast<double>(magnitude(test::widen(z))), 1);
 }
 
@@ -366,87 +347,67 @@ struct Indices {
                 all[static_cast<std::size_t>(draw.integer(i, static_cast<QtbInt>(all.size()) - 1))]);
       operand.store(i, 0, all[static_cast<std::size_t>(i)]);
     }
-    chosen.assign(all.begin(), all.begin() + nz);
     operand.seal(Access::read);
   }
-  Layout layout() const { return reference::indexed(static_cast<QtbInt>(chosen.size()), chosen.data()); }
-  const QtbInt *data() { return operand.data(); }
+  // The problem on these positions.
+  Problem of(Problem p) {
+    p.index = operand.data();
+    return p;
+  }
 
  private:
   Draw draw;
   Operand<QtbInt> operand;
-  std::vector<QtbInt> chosen;
 };
 
 template <class T, class R>
 void run(Shape<"axpyi">, const R &routine, const Problem &p, Session &s) {
   Indices index(p, p.n);
-  test_axpy<T>(p, s, strided(p.n, 1), index.layout(),
-               [&](const T *alpha, const T *x, T *y) { s.call(routine, &p.n, alpha, x, index.data(), y); });
+  test_axpy<"axpyi", T>(routine, index.of(p), s);
 }
 
 template <class T, class R>
 void run(Shape<"doti">, const R &routine, const Problem &p, Session &s) {
   Indices index(p, p.n);
-  DotOperands<T> o(p, strided(p.n, 1), index.layout());
-  const T got = s.call(routine, &p.n, o.x.data(), index.data(), o.y.data());
-  const Dot want = dot_before(o.x, o.y, false);
-  s.judge_value(got, want.value, want.gauge, static_cast<double>(p.n));
+  test_dot<"doti", T>(routine, index.of(p), s);
 }
-
 template <class T, class R>
 void run(Shape<"cdoti">, const R &routine, const Problem &p, Session &s) {
   Indices index(p, p.n);
-  DotOperands<T> o(p, strided(p.n, 1), index.layout());
-  T got{};
-  T *const returned = s.call(routine, &got, &p.n, o.x.data(), index.data(), o.y.data());
-  s.require(returned == &got, "the value of a complex function is the pointer to its result");
-  const Dot want = dot_before(o.x, o.y, routine.is_conjugated());
-  s.judge_value(got, want.value, want.gauge, 2 * static_cast<double>(p.n));
+  test_complex_dot<"cdoti", T>(routine, index.of(p), s);
 }
 
 // x(k) := y(indx(k)), and with zeroing y(indx(k)) := 0.
 template <class T, class R>
-void test_gather(const R &routine, const Problem &p, Session &s, bool zeroes) {
-  Indices index(p, p.n);
-  Draw draw(p.seed);
-  Operand<T> x(strided(p.n, 1), draw), y(index.layout(), draw);
-  prepare_output(x, Structure::general, p, draw, false);
-  if (zeroes)
-    prepare_output(y, Structure::general, p, draw, true);
-  else
-    prepare_input(y, Structure::general, p, draw, true);
-  s.call(routine, &p.n, y.data(), x.data(), index.data());
-  s.judge(x, moved(y, x.layout()));
-  if (zeroes) s.judge(y, update(y.layout(), {}, {0, 0}, y.before(), 0));
-}
-template <class T, class R>
 void run(Shape<"gthr">, const R &routine, const Problem &p, Session &s) {
-  test_gather<T>(routine, p, s, false);
+  Indices index(p, p.n);
+  Called<"gthr", T> o(index.of(p), routine.kind());
+  o.call(s, routine);
+  s.judge(o.x.operand(), moved(o.y, o.x.layout()));
 }
 template <class T, class R>
 void run(Shape<"gthrz">, const R &routine, const Problem &p, Session &s) {
-  test_gather<T>(routine, p, s, true);
+  Indices index(p, p.n);
+  Called<"gthrz", T> o(index.of(p), routine.kind());
+  o.call(s, routine);
+  s.judge(o.x.operand(), moved(o.y, o.x.layout()));
+  s.judge(o.y.operand(), update(o.y.layout(), {}, {0, 0}, o.y.before(), 0));
 }
 
 template <class T, class R>
 void run(Shape<"sctr">, const R &routine, const Problem &p, Session &s) {
   Indices index(p, p.n);
-  Draw draw(p.seed);
-  Operand<T> x(strided(p.n, 1), draw), y(index.layout(), draw);
-  prepare_input(x, Structure::general, p, draw, true);
-  prepare_output(y, Structure::general, p, draw, false);
-  s.call(routine, &p.n, x.data(), index.data(), y.data());
-  s.judge(y, moved(x, y.layout()));
+  Called<"sctr", T> o(index.of(p), routine.kind());
+  o.call(s, routine);
+  s.judge(o.y.operand(), moved(o.x, o.y.layout()));
 }
 
 template <class T, class R>
 void run(Shape<"roti">, const R &routine, const Problem &p, Session &s) {
   Indices index(p, p.n);
-  const T c = scalar<T>(p.alpha), sine = scalar<T>(p.beta);
-  const double dc = static_cast<double>(c), ds = static_cast<double>(sine);
-  test_plane_map<T>(p, s, strided(p.n, 1), index.layout(), {dc, ds, -ds, dc}, dc != 1 || ds != 0,
-                    [&](T *x, T *y) { s.call(routine, &p.n, x, index.data(), y, &c, &sine); });
+  Called<"roti", T> o(index.of(p), routine.kind());
+  const double c = static_cast<double>(o.scalars.alpha), sine = static_cast<double>(o.scalars.beta);
+  test_plane_map(o, routine, s, {c, sine, -sine, c}, c != 1 || sine != 0);
 }
 
 }  // namespace qtb::surface

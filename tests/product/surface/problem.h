@@ -1,16 +1,19 @@
-// A problem: every number and option that a call of a published routine can need, whatever its shape, and the draws
-// from which problems and the contents of their arrays are made. The same seed gives the same problem on every machine.
+// The draws from which problems and the contents of their arrays are made. The same seed gives the same problem on
+// every machine.
 #pragma once
 
-#include <algorithm>
 #include <cstdint>
-#include <cstdio>
 #include <cstring>
 #include <iterator>
 
-#include "blas/types.h"
+#include "calls/problem.h"
 
 namespace qtb::surface {
+
+using calls::Problem;
+using calls::Scalar;
+using calls::scalar;
+using calls::Values;
 
 // A source of numbers: a counter passed through a mixing function, so that any seed is as good as another.
 class Draw {
@@ -43,46 +46,6 @@ class Draw {
 
  private:
   std::uint64_t state_;
-};
-
-// What arrays hold: numbers whose sums round, or whole numbers whose sums do not in either precision.
-enum class Values { rounding, exact };
-
-struct Scalar {
-  double re = 0, im = 0;
-};
-
-template <class T>
-T scalar(Scalar v) {
-  if constexpr (is_complex<T>)
-    return {static_cast<Real<T>>(v.re), static_cast<Real<T>>(v.im)};
-  else
-    return static_cast<T>(v.re);
-}
-
-struct Problem {
-  std::uint64_t seed = 0;  // of the contents
-  QtbInt m = 0, n = 0, k = 0, kl = 0, ku = 0;
-  QtbInt incx = 1, incy = 1;
-  QtbInt spare[3] = {};  // leading dimensions beyond the least legal one: of A, B, C
-  Scalar alpha, beta;
-  char side = 'L', uplo = 'U', transa = 'N', transb = 'N', diag = 'N';
-  bool upper_name = false;  // by the upper-case name of the routine
-  Values values = Values::rounding;
-
-  QtbInt leading(int which, QtbInt least) const { return std::max<QtbInt>(least, 1) + spare[which]; }
-
-  void describe(char *text, std::size_t size) const {
-    std::snprintf(text, size,
-                  "seed %llu m %lld n %lld k %lld kl %lld ku %lld side %c uplo %c transa %c transb %c diag %c "
-                  "alpha (%g, %g) beta (%g, %g) incx %lld incy %lld spare %lld %lld %lld%s%s",
-                  static_cast<unsigned long long>(seed), static_cast<long long>(m), static_cast<long long>(n),
-                  static_cast<long long>(k), static_cast<long long>(kl), static_cast<long long>(ku), side, uplo, transa,
-                  transb, diag, alpha.re, alpha.im, beta.re, beta.im, static_cast<long long>(incx),
-                  static_cast<long long>(incy), static_cast<long long>(spare[0]), static_cast<long long>(spare[1]),
-                  static_cast<long long>(spare[2]), upper_name ? " upper-case name" : "",
-                  values == Values::exact ? " whole numbers" : "");
-  }
 };
 
 // Factors: the ones that routines treat apart, in both parts, and others.

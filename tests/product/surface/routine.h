@@ -5,20 +5,12 @@
 #include <cstdint>
 #include <type_traits>
 
-#include "blas/shapes.h"
+#include "calls/shapes.h"
 
 namespace qtb::surface {
 
-// A shape of routines.def as a type, to choose the procedure that tests it.
-template <std::size_t length>
-struct ShapeName {
-  char text[length];
-  constexpr ShapeName(const char (&name)[length]) {  // NOLINT: a literal is meant to convert
-    for (std::size_t i = 0; i < length; ++i) text[i] = name[i];
-  }
-};
-template <ShapeName name>
-struct Shape {};
+using calls::Shape;
+using calls::ShapeName;
 
 // The same routine with 32-bit integers, a trailing underscore, hidden lengths behind the arguments and complex results
 // as function values: the convention of the independent library.
@@ -59,15 +51,14 @@ class Routine<R(A...)> {
  public:
   using Pointer = R (*)(A...);
 
-  Routine(const char *name, Pointer lower, Pointer upper) : name_(name), lower_(lower), upper_(upper) {}
-  Routine(const char *name, void *independent) : name_(name), independent_(independent) {}
+  Routine(const char *name, const calls::Kind &kind, Pointer lower, Pointer upper)
+      : name_(name), kind_(kind), lower_(lower), upper_(upper) {}
+  Routine(const char *name, const calls::Kind &kind, void *independent)
+      : name_(name), kind_(kind), independent_(independent) {}
 
   const char *name() const { return name_; }
   bool is_independent() const { return independent_ != nullptr; }
-  // Properties that the name tells and the shape does not.
-  bool is_hermitian() const { return name_[1] == 'h'; }
-  bool is_conjugated() const { return name_[4] == 'c'; }  // cdotc, cgerc and the like
-  bool is_solve() const { return name_[3] == 's'; }       // trsv, tbsv, tpsv, trsm
+  const calls::Kind &kind() const { return kind_; }
 
   R call(bool upper_name, A... arguments) const {
     if (independent_ == nullptr) return (upper_name ? upper_ : lower_)(arguments...);
@@ -89,6 +80,7 @@ class Routine<R(A...)> {
   }
 
   const char *name_;
+  calls::Kind kind_;
   Pointer lower_ = nullptr, upper_ = nullptr;
   void *independent_ = nullptr;
 };

@@ -19,7 +19,7 @@ int main(int argc, char **argv) {
   testing::InitGoogleTest(&argc, argv);
   if (!qtb::test::processor_runs_forced_tier()) return qtb::test::exit_skipped;
 #define QTB_ROUTINE(name, NAME, shape, T, route) \
-  register_routine<#shape, T>(Routine<QTB_FUNCTION_TYPE(shape, T)>(#name, &name, &NAME));
+  register_routine<#shape, T>(Routine<QTB_FUNCTION_TYPE(shape, T)>(#name, qtb::calls::kind_of<T>(#name), &name, &NAME));
 #include "blas/routines.def"
 #undef QTB_ROUTINE
   std::signal(SIGSEGV, on_trap);
