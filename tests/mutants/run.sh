@@ -3,11 +3,11 @@
 #
 #   tests/mutants/run.sh [pattern]     the mutants whose name or file matches the extended regular expression, or all
 #
-# Every mutant of mutants.list is applied to a copy of the tree below build/mutants; what its suites need is built there,
-# and they run until the first of them fails. Ahead of all, the suites have to pass on the copy as it is. The report has
-# a line for each mutant: the test that caught it, or that it survived, or that it could not be judged because the
-# expression changes nothing or the result does not compile. It ends with 0 if at least 98 in 100 of the mutants were
-# caught and all could be judged. The tree itself stays as it is.
+# Every mutant of mutants.list is applied to a copy of the tree below build/mutants; what its suites need is built
+# there, and they run until the first of them fails. Ahead of all, the suites have to pass on the copy as it is. The
+# report has a line for each mutant: the test that caught it, or that it survived, or that it could not be judged
+# because the expression changes nothing or the result does not compile. It ends with 0 if at least 98 in 100 of the
+# mutants were caught and all could be judged. The tree itself stays as it is.
 #
 # JOBS=n sets how many cores to use. An object cache (ccache) is used where the machine has one.
 set -euo pipefail

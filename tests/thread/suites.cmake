@@ -8,7 +8,8 @@ qtb_add_test(gemm_decision_test SOURCES thread/level3/gemm_decision_test.cpp TIM
 qtb_add_test(gemm_driver_test SOURCES thread/level3/gemm_driver_test.cpp LIBRARIES qtb_static
   ENVIRONMENT OMP_THREAD_LIMIT=5 OMP_WAIT_POLICY=passive)
 qtb_add_test(gemm_front_ends_test SOURCES thread/level3/gemm_front_ends_test.cpp LIBRARIES qtb_static TIMEOUT 60)
-qtb_add_test(gemm_select_test SOURCES thread/level3/gemm_select_test.cpp LIBRARIES qtb_static qtb_platform_static SHARDS 2)
+qtb_add_test(gemm_select_test SOURCES thread/level3/gemm_select_test.cpp
+  LIBRARIES qtb_static qtb_platform_static SHARDS 2)
 qtb_add_test(gemm_share_test SOURCES thread/level3/gemm_share_test.cpp TIMEOUT 60)
 qtb_add_test(gemm_strategy_cover_test SOURCES thread/level3/gemm_strategy_cover_test.cpp LIBRARIES qtb_static
   ENVIRONMENT OMP_WAIT_POLICY=passive)
