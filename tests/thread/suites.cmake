@@ -23,4 +23,11 @@ qtb_add_test(level1_front_ends_test SOURCES thread/level1/front_ends_test.cpp LI
 qtb_add_test(level1_library_test SOURCES thread/level1/library_test.cpp
   LIBRARIES qtb_static qtb_platform_fake SHARDS 2)
 qtb_add_test(level1_share_test SOURCES thread/level1/share_test.cpp TIMEOUT 60)
+qtb_add_test(level2_decision_test SOURCES thread/level2/decision_test.cpp TIMEOUT 60)
+qtb_add_test(level2_drivers_test SOURCES thread/level2/drivers_test.cpp LIBRARIES qtb_static SHARDS 2
+  ENVIRONMENT OMP_WAIT_POLICY=passive)
+qtb_add_test(level2_front_ends_test SOURCES thread/level2/front_ends_test.cpp LIBRARIES qtb_static TIMEOUT 60)
+qtb_add_test(level2_share_test SOURCES thread/level2/share_test.cpp TIMEOUT 60)
+qtb_add_test(level2_small_team_test SOURCES thread/level2/drivers_test.cpp LIBRARIES qtb_static
+  ENVIRONMENT OMP_WAIT_POLICY=passive OMP_THREAD_LIMIT=5)
 qtb_add_test(team_test SOURCES thread/team_test.cpp ENVIRONMENT OMP_WAIT_POLICY=passive TIMEOUT 60)

@@ -31,7 +31,8 @@ void add_block_row(const SymvBlocks &cut, QtbInt b, char uplo, const T *alpha, c
   }
 }
 
-// The diagonal blocks apply beta to all of y. Behind the barrier each block of y is its owner's alone.
+// The diagonal blocks apply beta to all of y; behind the barrier each block of y is its owner's alone. Which thread
+// takes a diagonal block is the team's matter, so that only the barrier keeps it apart from the owner's sums.
 template <class T, auto slot, auto gemv>
 void symv(QtbInt nthreads, QTB_PARAMS_symv(T)) {
   run_team(nthreads, [=](const Team &team) {
