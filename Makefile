@@ -1,16 +1,18 @@
 # The daily commands. Each does everything on a fresh Debian 12 machine: it installs what is missing by package name,
 # configures a preset of CMakePresets.json, builds and runs.
 #
-# JOBS=n sets how many cores to use, PREFIX=folder where to install, FUZZ_SECONDS=n how long each fuzz target runs.
+# JOBS=n sets how many cores to use, PREFIX=folder where to install, FUZZ_SECONDS=n how long each fuzz target runs,
+# MUTANTS=pattern which mutants to try.
 
 JOBS ?= $(shell nproc)
 PREFIX ?= /usr/local
 FUZZ_SECONDS ?= 60
+MUTANTS ?= .
 
 # The lists (*.def) are laid out by hand.
 sources = $(shell git ls-files '*.cpp' '*.h' '*.c')
 
-.PHONY: help build demo test test-long bench lint format asan tsan fuzz coverage install clean
+.PHONY: help build demo test test-long bench lint format asan tsan fuzz mutants coverage install clean
 .DEFAULT_GOAL := help
 
 help:
@@ -24,6 +26,7 @@ help:
 	@echo 'make asan       the tests under the address and undefined-behaviour sanitizers'
 	@echo 'make tsan       the tests under the thread sanitizer'
 	@echo 'make fuzz       $(FUZZ_SECONDS) seconds of each fuzz target'
+	@echo 'make mutants    breaks the library in one place at a time: do the tests see it? MUTANTS=pattern chooses'
 	@echo 'make coverage   lines and branches that the tests reach'
 	@echo 'make install    installs below PREFIX=$(PREFIX)'
 	@echo 'make clean      removes build/'
@@ -75,6 +78,10 @@ fuzz:
 	cmake --preset fuzz -D QTB_FUZZ_SECONDS=$(FUZZ_SECONDS)
 	cmake --build --preset fuzz -j $(JOBS) --target fuzz_targets
 	ctest --preset fuzz -j $(JOBS)
+
+mutants:
+	@tools/packages.sh build test
+	JOBS=$(JOBS) tests/mutants/run.sh '$(MUTANTS)'
 
 coverage:
 	@tools/packages.sh build test coverage

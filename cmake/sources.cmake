@@ -102,6 +102,10 @@ set(QTB_CORE_SOURCES
   # thread
   blas/thread/32e/level1/xf_l1.cpp
   blas/thread/32e/level1/xf_l1_omp.cpp
+  blas/thread/32e/level2/gemv.cpp
+  blas/thread/32e/level2/gemv_omp.cpp
+  blas/thread/32e/level2/l2.cpp
+  blas/thread/32e/level2/l2_omp.cpp
   blas/thread/32e/level3/gemm.cpp
   blas/thread/32e/level3/gemm_1d.cpp
   blas/thread/32e/level3/gemm_2d.cpp

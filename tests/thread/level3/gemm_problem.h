@@ -9,6 +9,7 @@
 #include <vector>
 
 #include "blas/shapes.h"
+#include "blas/thread/drivers.h"
 #include "tests/reference/level3.h"
 #include "tests/support/guarded.h"
 #include "tests/support/placed.h"
@@ -178,5 +179,25 @@ class GemmProblem {
       }
   }
 };
+
+template <class T>
+struct GemmFrontEnd;
+#define QTB_TEST_FRONT_END(t, T)                      \
+  template <>                                         \
+  struct GemmFrontEnd<T> {                            \
+    static constexpr auto call = &qtb_blas_##t##gemm; \
+    static constexpr const char *name = #t "gemm";    \
+  };
+QTB_TEST_FRONT_END(s, float)
+QTB_TEST_FRONT_END(d, double)
+QTB_TEST_FRONT_END(c, cfloat)
+QTB_TEST_FRONT_END(z, cdouble)
+
+template <class T>
+void call(GemmProblem<T> &p) {
+  const GemmShape &s = p.shape;
+  GemmFrontEnd<T>::call(&s.transa, &s.transb, &s.m, &s.n, &s.k, &p.alpha, p.a.data(), &p.lda, p.b.data(), &p.ldb,
+                        &p.beta, p.c.data(), &p.ldc);
+}
 
 }  // namespace qtb::test

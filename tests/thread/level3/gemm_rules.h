@@ -14,17 +14,12 @@ using Int = std::int64_t;
 
 // ---- Machine classes ----
 
-struct Machine {
-  int tier = 0;  // 0 def, 1 sse3, 2 ssse3, 3 sse42, 4 avx
-  bool sse41 = false, family16 = false;
-  std::uint32_t cache_count = 0, second_size = 0;  // bytes
-};
-
-inline int class_of(const Machine &x) {
-  const bool second_is_large = x.cache_count == 0 || x.second_size > 3u * 1024 * 1024;
-  return 6 * int(x.tier == 0 && x.family16) + 1 * int(x.tier == 2 && !x.sse41) +
-         2 * int(x.tier == 2 && x.sse41 && second_is_large) + 4 * int(x.tier == 2 && x.sse41 && !second_is_large) +
-         3 * int(x.tier == 3) + 5 * int(x.tier == 4);
+// tier: 0 def, 1 sse3, 2 ssse3, 3 sse42, 4 avx; the cache table's levels and the bytes of the second.
+inline int class_of(int tier, bool sse41, bool family16, std::uint32_t levels, std::uint32_t second) {
+  const bool second_is_large = levels == 0 || second > 3u * 1024 * 1024;
+  return 6 * int(tier == 0 && family16) + 1 * int(tier == 2 && !sse41) +
+         2 * int(tier == 2 && sse41 && second_is_large) + 4 * int(tier == 2 && sse41 && !second_is_large) +
+         3 * int(tier == 3) + 5 * int(tier == 4);
 }
 
 // ---- Too small for threads, whatever the processor ----

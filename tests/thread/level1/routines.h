@@ -26,10 +26,12 @@ template <class T>
 struct Level1Routine {
   const char *name;
   Shape shape;
+  SlotNumber slot;
+  CodePointer targets[tier_count];
   void (*driver)(QtbInt nthreads, Level1Call<T> &call);
-  void (*tier)(int tier, Level1Call<T> &call);
+  void (*target)(CodePointer target, Level1Call<T> &call);
 
-  bool writes_x() const { return shape == Shape::swap || shape == Shape::rot; }
+  void serial(int tier, Level1Call<T> &call) const { target(targets[tier], call); }
   bool is_dot() const { return shape == Shape::dot || shape == Shape::cdot; }
 };
 
@@ -51,13 +53,16 @@ void invoke(F f, Level1Call<T> &call, NThreads... nthreads) {
 // Calls visit(routine) for each routine, a Level1Routine of its type.
 template <class Visit>
 void for_each_level1_routine(Visit visit) {
+#define QTB_TARGET(tier, TIER, name) reinterpret_cast<CodePointer>(&qtb_blas_##tier##_x##name),
 #define QTB_VISIT(name, shape, T)                                                                                 \
   visit(Level1Routine<T>{                                                                                         \
-      #name, Shape::shape,                                                                                        \
+      #name,                                                                                                      \
+      Shape::shape,                                                                                               \
+      slot_##name,                                                                                                \
+      {QTB_FOR_EACH_TIER(QTB_TARGET, name)},                                                                      \
       [](QtbInt nthreads, Level1Call<T> &call) { invoke<Shape::shape>(&qtb_blas_##name##_omp, call, nthreads); }, \
-      [](int tier, Level1Call<T> &call) {                                                                         \
-        static constexpr QTB_RESULT_##shape(T) (*const targets[])(QTB_PARAMS_##shape(T)) = QTB_ALL_TIERS(name);   \
-        invoke<Shape::shape>(targets[tier], call);                                                                \
+      [](CodePointer target, Level1Call<T> &call) {                                                               \
+        invoke<Shape::shape>(reinterpret_cast<QTB_RESULT_##shape(T) (*)(QTB_PARAMS_##shape(T))>(target), call);   \
       }});
 #define QTB_LEVEL1_SIZED(name, shape, T, ...) QTB_VISIT(name, shape, T)
 #define QTB_LEVEL1_PAIR(name, shape, T, min_n) QTB_VISIT(name, shape, T)
@@ -65,6 +70,7 @@ void for_each_level1_routine(Visit visit) {
 #undef QTB_LEVEL1_SIZED
 #undef QTB_LEVEL1_PAIR
 #undef QTB_VISIT
+#undef QTB_TARGET
 }
 
 }  // namespace qtb::test

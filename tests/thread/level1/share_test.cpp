@@ -9,7 +9,7 @@
 #include <random>
 #include <vector>
 
-#include "tests/thread/level1_sum_model.h"
+#include "tests/thread/level1/sum_model.h"
 
 namespace {
 
@@ -28,69 +28,38 @@ std::vector<QtbInt> lengths_around_chunks(QtbInt team) {
   return lengths;
 }
 
-TEST(Level1Share, SharesFollowOneAnotherAndCoverTheVector) {
+TEST(Level1Share, EqualMultiplesOfEightCoverTheVectorAndTheLastTakesTheRest) {
   for (QtbInt team = 1; team <= 200; ++team)
     for (const QtbInt n : lengths_around_chunks(team)) {
-      QtbInt next = 0;
+      SCOPED_TRACE(testing::Message() << n << " on " << team);
+      QtbInt chunk = 0, next = 0;
+      while ((chunk + 8) * team <= n) chunk += 8;
       for (QtbInt rank = 0; rank < team; ++rank) {
         const Level1Share share = level1_share(n, team, rank);
-        ASSERT_GE(share.len, 0);
+        ASSERT_EQ(share.len, rank < team - 1 ? chunk : n - chunk * (team - 1));
         if (share.len > 0) {
-          ASSERT_EQ(share.start, next) << "n " << n << " team " << team << " rank " << rank;
+          ASSERT_EQ(share.start, next);
         }
+        ASSERT_TRUE(n == 0 || (share.start >= 0 && share.start < n)) << "an empty share starts inside, too";
         next += share.len;
       }
-      ASSERT_EQ(next, n) << "team " << team;
-    }
-}
-
-TEST(Level1Share, AllSharesButTheLastAreTheSameMultipleOfEight) {
-  for (QtbInt team = 1; team <= 200; ++team)
-    for (const QtbInt n : lengths_around_chunks(team)) {
-      QtbInt chunk = 0;
-      while ((chunk + 8) * team <= n) chunk += 8;
-      for (QtbInt rank = 0; rank < team - 1; ++rank) ASSERT_EQ(level1_share(n, team, rank).len, chunk);
-      ASSERT_EQ(level1_share(n, team, team - 1).len, n - chunk * (team - 1));
     }
 }
 
 TEST(Level1Share, ThreeThreadsOn4099Elements) {
-  EXPECT_EQ(level1_share(4099, 3, 0).len, 1360);
-  EXPECT_EQ(level1_share(4099, 3, 1).len, 1360);
-  EXPECT_EQ(level1_share(4099, 3, 2).len, 1379);
-  EXPECT_EQ(level1_share(4099, 3, 2).start, 2720);
+  for (QtbInt rank = 0; rank < 3; ++rank) EXPECT_EQ(level1_share(4099, 3, rank).len, rank < 2 ? 1360 : 1379);
 }
 
-TEST(Level1Share, TeamOfOneHasTheWholeVectorAtTheCallersPointer) {
-  for (const QtbInt n : {1, 2, 7, 8, 9, 1000})
-    for (const QtbInt inc : {-3, -1, 0, 1, 2}) {
-      const Level1Share share = level1_share(n, 1, 0);
-      EXPECT_EQ(share.len, n);
-      EXPECT_EQ(level1_offset(share, n, inc), 0);
-    }
-}
-
-TEST(Level1Share, VectorShorterThanEightPerThreadGoesToTheLast) {
-  for (QtbInt rank = 0; rank < 4; ++rank) EXPECT_EQ(level1_share(31, 4, rank).len, rank == 3 ? 31 : 0);
-}
-
-TEST(Level1Share, LengthsBelowOneGiveNothingToDoAtTheCallersPointer) {
-  for (const QtbInt n : {0, -1, -5, -8, -100, -100000})
-    for (QtbInt team = 1; team <= 40; ++team)
-      for (QtbInt rank = 0; rank < team; ++rank) {
-        const Level1Share share = level1_share(n, team, rank);
-        ASSERT_LE(share.len, 0);
-        for (const QtbInt inc : {-3, -1, 0, 1, 2}) ASSERT_EQ(level1_offset(share, n, inc), 0);
-      }
-}
-
-TEST(Level1Share, EmptyShareStartsInsideTheVector) {
-  for (QtbInt team = 2; team <= 200; ++team)
-    for (const QtbInt n : lengths_around_chunks(team))
-      for (QtbInt rank = 0; n > 0 && rank < team; ++rank) {
-        ASSERT_GE(level1_share(n, team, rank).start, 0);
-        ASSERT_LT(level1_share(n, team, rank).start, n);
-      }
+TEST(Level1Share, TeamsOfOneAndLengthsBelowOneStayAtTheCallersPointer) {
+  for (const QtbInt inc : {-3, -1, 0, 1, 2}) {
+    for (const QtbInt n : {1, 2, 7, 8, 9, 1000}) ASSERT_EQ(level1_offset(level1_share(n, 1, 0), n, inc), 0);
+    for (const QtbInt n : {0, -1, -5, -8, -100, -100000})
+      for (QtbInt team = 1; team <= 40; ++team)
+        for (QtbInt rank = 0; rank < team; ++rank) {
+          ASSERT_LE(level1_share(n, team, rank).len, 0);
+          ASSERT_EQ(level1_offset(level1_share(n, team, rank), n, inc), 0);
+        }
+  }
 }
 
 // The element that the published convention gives a place in memory: number i of n, from the vector's pointer.
@@ -108,19 +77,6 @@ TEST(Level1Share, PieceVisitsTheElementsOfTheWholeAtEitherSign) {
             ASSERT_EQ(offset + place(i, share.len, inc), place(share.start + i, n, inc))
                 << "n " << n << " team " << team << " rank " << rank << " inc " << inc;
         }
-}
-
-TEST(Level1Share, NegativeIncrementPutsTheFirstThreadAtTheFarEnd) {
-  const QtbInt n = 100, inc = -1;
-  const Level1Share share = level1_share(n, 2, 0);
-  EXPECT_EQ(share.len, 48);
-  EXPECT_EQ(level1_offset(share, n, inc), 52);
-}
-
-TEST(Level1Share, PiecesOfAContiguousVectorKeepItsAlignment) {
-  for (QtbInt team = 2; team <= 64; ++team)
-    for (QtbInt rank = 0; rank < team; ++rank)
-      ASSERT_EQ(level1_offset(level1_share(100003, team, rank), 100003, 1) % 8, 0);
 }
 
 // ---- Sums ----

@@ -6,75 +6,28 @@
 #include <omp.h>
 
 #include <cmath>
-#include <cstdio>
-#include <map>
 #include <string>
-#include <vector>
 
-#include "blas/thread/drivers.h"
 #include "tests/support/together.h"
-#include "tests/thread/checked_memory.h"
-#include "tests/thread/gemm_machines.h"
-#include "tests/thread/gemm_problem.h"
+#include "tests/thread/level3/gemm_machines.h"
+#include "tests/thread/level3/gemm_problem.h"
 
 namespace qtb::test {
 namespace {
 
-const GemmMachine &machine = named_machine();
-
-std::map<std::string, long> runs;
-std::map<std::string, double> worst;
-
-class Machine : public testing::Environment {
-  void SetUp() override {
-    become(machine);
-    use_checked_memory();
-    omp_set_dynamic(0);
-  }
-  void TearDown() override {
-    for (const auto &[what, count] : runs)
-      std::printf("%-14s %-20s runs %ld; worst error/bound %.3f\n", machine.name, what.c_str(), count, worst[what]);
-    EXPECT_EQ(checked_memory.outstanding, 0);
-    EXPECT_EQ(checked_memory.overruns, 0);
-  }
-};
-const testing::Environment *const machine_environment = testing::AddGlobalTestEnvironment(new Machine);
-
-template <class T>
-struct FrontEnd;
-#define QTB_TEST_FRONT_END(t, T)                      \
-  template <>                                         \
-  struct FrontEnd<T> {                                \
-    static constexpr auto call = &qtb_blas_##t##gemm; \
-    static constexpr const char *name = #t "gemm";    \
-  };
-QTB_TEST_FRONT_END(s, float)
-QTB_TEST_FRONT_END(d, double)
-QTB_TEST_FRONT_END(c, cfloat)
-QTB_TEST_FRONT_END(z, cdouble)
-
-constexpr char letters[] = {'N', 'T', 'C', 'n', 't', 'c'};
 constexpr int teams[] = {2, 3, 4, 8};
 
 template <class T>
-void call(GemmProblem<T> &p) {
-  const GemmShape &s = p.shape;
-  FrontEnd<T>::call(&s.transa, &s.transb, &s.m, &s.n, &s.k, &p.alpha, p.a.data(), &p.lda, p.b.data(), &p.ldb, &p.beta,
-                    p.c.data(), &p.ldc);
-}
-
-template <class T>
 void check(const GemmShape &s, T alpha, T beta, int team) {
-  SCOPED_TRACE(std::string(FrontEnd<T>::name) + " on " + std::to_string(team) + " threads: " + text_of(s));
+  SCOPED_TRACE(std::string(GemmFrontEnd<T>::name) + " on " + std::to_string(team) + " threads: " + text_of(s));
   GemmProblem<T> p(s, alpha, beta);
   omp_set_num_threads(team);
+  recorded_memory.forget();
   call(p);
-  const std::string what = std::string(FrontEnd<T>::name) + (s.whole_numbers ? " exact" : "");
-  ++runs[what];
   if (s.whole_numbers)
     p.expect_exact();
   else
-    worst[what] = std::fmax(worst[what], p.expect_within_bound());
+    p.expect_within_bound();
 }
 
 GemmShape shape_of(QtbInt m, QtbInt n, QtbInt k, std::uint64_t seed) {
@@ -207,32 +160,29 @@ TEST(GemmClasses, LargeProblemsAreExact) {
 // With each request for memory failing, alone and with all that follow it, the product is right, and nothing is kept.
 template <class T>
 void without_memory(QtbInt m, QtbInt n, QtbInt k, int team) {
-  SCOPED_TRACE(std::string(FrontEnd<T>::name) + " on " + std::to_string(team) + " threads");
+  SCOPED_TRACE(std::string(GemmFrontEnd<T>::name) + " on " + std::to_string(team) + " threads");
   GemmShape s = shape_of(m, n, k, large_seed++);
   s.whole_numbers = true;
   omp_set_num_threads(team);
   GemmProblem<T> p(s, number<T>(2, 1), number<T>(3, -1));
-  checked_memory.requests = 0;
+  recorded_memory.forget();
   call(p);
   p.expect_exact();
-  const long requests = checked_memory.requests;
+  const long requests = static_cast<long>(recorded_memory.requests.size());
   EXPECT_GE(requests, team - team % 2) << "not every thread that takes part had work";
-  const std::string what = std::string(FrontEnd<T>::name) + " without memory";
   // Of very many requests, the first of each thread and some of the others.
   constexpr long most = 60;
   for (long first = 0; first < requests; first += requests <= most || first < 2 * team ? 1 : requests / 7)
     for (const long count : {1L, 1000000L}) {
       p.restore();
-      checked_memory.requests = 0;
-      checked_memory.failing_count = count;
-      checked_memory.failing_first = first;
+      recorded_memory.forget();
+      recorded_memory.fails = [=](long number, int, int) { return number >= first && number < first + count; };
       call(p);
-      checked_memory.failing_first = -1;
+      recorded_memory.fails = nullptr;
       p.expect_exact();
-      ASSERT_EQ(checked_memory.outstanding, 0);
+      ASSERT_TRUE(recorded_memory.held.empty());
       ASSERT_FALSE(testing::Test::HasFailure())
           << "request " << first << " of " << requests << " and " << count - 1 << " more";
-      ++runs[what];
     }
 }
 

@@ -27,28 +27,24 @@
 #include <vector>
 
 #include "blas/thread/32e/level3/gemm_strategies.h"
-#include "service/memory.h"
-#include "tests/thread/gemm_strategy_model.h"
+#include "tests/thread/level3/gemm_strategy_model.h"
+#include "tests/thread/recorded_memory.h"
+#include "tests/thread/stand_ins.h"
+
+QTB_RECORDED_MEMORY_SERVICE
 
 namespace qtb::test {
 namespace {
 
 using namespace gemm_model;
 
-// ---- The memory service ----
-
-struct Request {
-  void *given;
-  std::uint64_t bytes;
-  std::int32_t alignment;
-};
-
-std::mutex memory_mutex;
-std::map<void *, void *> memory_held;  // given -> what free takes
-std::vector<std::pair<int, Request>> memory_requests;
-std::vector<std::pair<int, void *>> memory_releases;
-int memory_failing_thread = -1, memory_failing_request = 0;  // which request of which thread gets nothing
-thread_local std::vector<Request> own_requests;
+// The request number which that this thread has made in this run.
+MemoryRequest own_request(std::size_t which) {
+  const std::lock_guard guard(recorded_memory_mutex);
+  for (const MemoryRequest &request : recorded_memory.requests)
+    if (request.thread == omp_get_thread_num() && which-- == 0) return request;
+  return {};
+}
 
 // ---- What the threads did ----
 
@@ -151,8 +147,8 @@ Position position_in_b(const Problem<T> &p, const T *tile) {
 template <class T>
 std::int64_t place_of(const Problem<T> &p, const T *panel, std::size_t which) {
   if (!p.own_panels) return (panel - p.panels) * static_cast<std::int64_t>(sizeof(T));
-  if (own_requests.size() <= which) return fault("a panel that was not asked for"), 0;
-  const auto address = reinterpret_cast<std::uintptr_t>(own_requests[which].given);
+  const auto address = reinterpret_cast<std::uintptr_t>(own_request(which).given);
+  if (address == 0) return fault("a panel that was not asked for"), 0;
   return static_cast<std::int64_t>(reinterpret_cast<std::uintptr_t>(panel) - (address + 4095) / 4096 * 4096);
 }
 
@@ -294,49 +290,6 @@ void kernel_packed(QTB_PARAMS_gemm_packed(T)) {
   compute<T>(QTB_TILE, ap, *ldap, bp, *ldbp);
 }
 
-}  // namespace
-}  // namespace qtb::test
-
-extern "C" {
-// Memory begins 128 bytes behind a page boundary: aligned as asked, and as far from the next page as that allows.
-void *qtb_serv_malloc(std::uint64_t size, std::int32_t alignment) {
-  using namespace qtb::test;
-  const std::lock_guard guard(memory_mutex);
-  const int thread = omp_get_thread_num();
-  int earlier = 0;
-  for (const auto &[asker, request] : memory_requests) earlier += asker == thread;
-  void *given = nullptr;
-  if (thread != memory_failing_thread || earlier != memory_failing_request) {
-    void *const raw = std::aligned_alloc(4096, (size + 128 + 4095) / 4096 * 4096);
-    given = static_cast<char *>(raw) + 128;
-    memory_held[given] = raw;
-  }
-  own_requests.push_back({given, size, alignment});
-  memory_requests.push_back({thread, own_requests.back()});
-  return given;
-}
-
-void qtb_serv_free(void *pointer) {
-  using namespace qtb::test;
-  if (pointer == nullptr) return;
-  const std::lock_guard guard(memory_mutex);
-  memory_releases.push_back({omp_get_thread_num(), pointer});
-  const auto held = memory_held.find(pointer);
-  if (held == memory_held.end()) return fault("a release of what is not held");
-  std::free(held->second);
-  memory_held.erase(held);
-}
-
-// What a thread without memory falls back to.
-void qtb_blas_xsgemm(QTB_PARAMS_gemm(float)) { qtb::test::kernel_gemm<float>(QTB_ARGS(gemm)); }
-void qtb_blas_xdgemm(QTB_PARAMS_gemm(double)) { qtb::test::kernel_gemm<double>(QTB_ARGS(gemm)); }
-void qtb_blas_xcgemm(QTB_PARAMS_gemm(cfloat)) { qtb::test::kernel_gemm<cfloat>(QTB_ARGS(gemm)); }
-void qtb_blas_xzgemm(QTB_PARAMS_gemm(cdouble)) { qtb::test::kernel_gemm<cdouble>(QTB_ARGS(gemm)); }
-}
-
-namespace qtb::test {
-namespace {
-
 // ---- The strategies ----
 
 enum class Kind { row, col, shared_b, grid, xgemm, acopy, bcopy, abcopy };
@@ -377,8 +330,6 @@ GemmKernel<T> kernel_of(Kind kind) {
 
 // ---- One run, checked ----
 
-long runs_of_strategy = 0, steps_seen = 0;
-
 constexpr char letters[] = {'N', 'T', 'C', 'n', 't', 'c'};
 
 template <class T>
@@ -411,8 +362,13 @@ void prepare(Problem<T> &p, Kind kind, const Setting &set, int team, std::uint64
     events[i].clear();
     delays[i] = (seed + 1) * 0x9E3779B97F4A7C15U + static_cast<std::uint64_t>(i) * 0xBF58476D1CE4E5B9U + 1;
   }
-  memory_requests.clear();
-  memory_releases.clear();
+  recorded_memory.forget();
+  stand_ins.recording = false;
+  // What a thread without memory falls back to.
+  stand_ins.behind[slot_sgemm] = code_pointer(&kernel_gemm<float>);
+  stand_ins.behind[slot_dgemm] = code_pointer(&kernel_gemm<double>);
+  stand_ins.behind[slot_cgemm] = code_pointer(&kernel_gemm<cfloat>);
+  stand_ins.behind[slot_zgemm] = code_pointer(&kernel_gemm<cdouble>);
   faults = 0;
   first_fault.clear();
 }
@@ -447,7 +403,6 @@ Returns run(Problem<T> &p, const Strategy<T> &strategy) {
   p.returned = 0;
 #pragma omp parallel num_threads(p.team)
   {
-    own_requests.clear();
     const GemmPlan<T> own_plan = plan;
     const GemmPanelSet<T> own_set = panel_set;
     strategy.run(&p.transa, &p.transb, &s.m, &s.n, &s.k, &p.alpha, p.a.data(), &p.lda, p.b.data(), &p.ldb, &p.beta,
@@ -470,26 +425,6 @@ void expect_covered_once(const Problem<T> &p) {
          << " computed " << int{*wrong} << " times";
 }
 
-// Between two barriers no two threads pack to one place.
-template <class T>
-void expect_disjoint_packing(const Schedule &schedule, const Setting &s) {
-  for (std::int64_t phase = 0; phase < schedule.phases; ++phase) {
-    std::map<std::int64_t, std::size_t> owner;
-    for (std::size_t i = 0; i < schedule.threads.size(); ++i)
-      for (const Step &step : schedule.threads[i]) {
-        if (step.phase != phase || step.what == Action::compute) continue;
-        const QtbInt unit = step.what == Action::pack_a ? s.mu : s.nu;
-        const QtbInt count = step.what == Action::pack_a ? step.rows : step.cols;
-        for (QtbInt e = 0; e < count; ++e)
-          for (QtbInt d = 0; d < step.depths; ++d) {
-            const QtbInt place = step.place / static_cast<QtbInt>(sizeof(T)) + e / unit * step.ld + d * unit + e % unit;
-            const auto [at, fresh] = owner.emplace(place, i);
-            ASSERT_TRUE(fresh || at->second == i) << "threads " << at->second << " and " << i << " pack to one place";
-          }
-      }
-  }
-}
-
 // All that the threads did, against the model.
 template <class T>
 void expect_schedule(const Problem<T> &p, const Schedule &want, const Returns &returns) {
@@ -506,7 +441,6 @@ void expect_schedule(const Problem<T> &p, const Schedule &want, const Returns &r
       const auto phase = static_cast<std::size_t>(got.phase);
       first[phase] = std::min(first[phase], events[i][e].begin);
       last[phase] = std::max(last[phase], events[i][e].end);
-      ++steps_seen;
     }
   }
   long before = 0;
@@ -519,34 +453,18 @@ void expect_schedule(const Problem<T> &p, const Schedule &want, const Returns &r
   }
 }
 
-// No two threads at the same columns at the same turn of a super-slab, and thread i begins with slab i.
-template <class T>
-void expect_rotation(const Problem<T> &p) {
-  const Setting &s = p.set;
-  const QtbInt super = s.t * s.nb, whole = s.n / super * super;
-  for (int i = 0; i < static_cast<int>(s.t); ++i) {
-    QtbInt turn = 0;
-    for (const Event &event : events[i]) {
-      if (event.step.what != Action::compute || event.step.col >= whole) {
-        if (event.step.what == Action::compute) turn = 0;
-        continue;
-      }
-      ASSERT_EQ(event.step.col % super / s.nb, (i + turn % s.t) % s.t) << "thread " << i << ", turn " << turn;
-      ++turn;
-    }
-  }
-}
-
 template <class T>
 void expect_own_panels(const Problem<T> &p) {
   const Setting &s = p.set;
   const auto width = static_cast<QtbInt>(sizeof(T));
   const QtbInt share = s.m / s.t / s.mu * s.mu, last_rows = s.m - (s.t - 1) * share;
-  ASSERT_TRUE(memory_held.empty()) << "panels kept";
-  std::vector<std::vector<Request>> asked(most_threads);
-  for (const auto &[thread, request] : memory_requests) asked[static_cast<std::size_t>(thread)].push_back(request);
+  ASSERT_TRUE(recorded_memory.held.empty()) << "panels kept";
+  ASSERT_EQ(recorded_memory.faults, 0);
+  std::vector<std::vector<MemoryRequest>> asked(most_threads);
+  for (const MemoryRequest &request : recorded_memory.requests)
+    asked[static_cast<std::size_t>(request.thread)].push_back(request);
   for (QtbInt i = 0; i < p.team; ++i) {
-    const std::vector<Request> &own = asked[static_cast<std::size_t>(i)];
+    const std::vector<MemoryRequest> &own = asked[static_cast<std::size_t>(i)];
     if (i >= s.t || share < 1) {
       ASSERT_TRUE(own.empty());
       continue;
@@ -563,7 +481,7 @@ void expect_own_panels(const Problem<T> &p) {
     ASSERT_EQ(own[0].alignment, 128);
     ASSERT_EQ(own[1].alignment, 128);
     std::vector<void *> released;
-    for (const auto &[thread, pointer] : memory_releases)
+    for (const auto &[thread, pointer] : recorded_memory.releases)
       if (thread == i) released.push_back(pointer);
     ASSERT_EQ(released, (std::vector<void *>{own[0].given, own[1].given})) << "not the A one first";
   }
@@ -592,13 +510,10 @@ void check(const Strategy<T> &strategy, Setting set, int team, std::uint64_t see
     ASSERT_NO_FATAL_FAILURE(expect_covered_once(p));
   }
   if (strategy.kind == Kind::abcopy) {
-    ASSERT_NO_FATAL_FAILURE(expect_rotation(p));
     ASSERT_NO_FATAL_FAILURE(expect_own_panels(p));
   } else {
-    ASSERT_NO_FATAL_FAILURE(expect_disjoint_packing<T>(want, set));
-    ASSERT_TRUE(memory_requests.empty());
+    ASSERT_TRUE(recorded_memory.requests.empty());
   }
-  ++runs_of_strategy;
 }
 
 // ---- Which runs ----
@@ -675,48 +590,22 @@ void sweep(const Strategy<T> &strategy, int cases_per_grid) {
     }
 }
 
-#define QTB_SWEEP(name, kind, T) \
-  ASSERT_NO_FATAL_FAILURE(sweep<T>({#name, kind, &qtb_blas_##name}, is_complex<T> || sizeof(T) == 4 ? 20 : 60))
-
-TEST(GemmStrategyCover, Rows) {
-  QTB_SWEEP(dgemm_1d_row, Kind::row, double);
-  QTB_SWEEP(sgemm_1d_row, Kind::row, float);
-  QTB_SWEEP(cgemm_1d_row, Kind::row, cfloat);
-  QTB_SWEEP(zgemm_1d_row, Kind::row, cdouble);
+// By the end of a strategy's name.
+Kind kind_of(const std::string &name) {
+  const std::pair<const char *, Kind> kinds[] = {
+      {"1d_row", Kind::row},    {"1d_col", Kind::col},       {"1d_with_copy_0", Kind::shared_b},
+      {"2d_grid", Kind::grid},  {"2d_xgemm_p", Kind::xgemm}, {"2d_acopy_n", Kind::acopy},
+      {"2d_bcopy", Kind::bcopy}};
+  for (const auto &[end, kind] : kinds)
+    if (name.ends_with(end)) return kind;
+  return Kind::abcopy;
 }
 
-TEST(GemmStrategyCover, Columns) {
-  QTB_SWEEP(dgemm_1d_col, Kind::col, double);
-  QTB_SWEEP(sgemm_1d_col, Kind::col, float);
-  QTB_SWEEP(cgemm_1d_col, Kind::col, cfloat);
-  QTB_SWEEP(zgemm_1d_col, Kind::col, cdouble);
-}
-
-TEST(GemmStrategyCover, SharedB) { QTB_SWEEP(dgemm_1d_with_copy_0, Kind::shared_b, double); }
-
-TEST(GemmStrategyCover, Grid) {
-  QTB_SWEEP(dgemm_2d_grid, Kind::grid, double);
-  QTB_SWEEP(sgemm_2d_grid, Kind::grid, float);
-}
-
-TEST(GemmStrategyCover, Blocks) {
-  QTB_SWEEP(dgemm_2d_xgemm_p, Kind::xgemm, double);
-  QTB_SWEEP(sgemm_2d_xgemm_p, Kind::xgemm, float);
-}
-
-TEST(GemmStrategyCover, SharedA) { QTB_SWEEP(dgemm_2d_acopy_n, Kind::acopy, double); }
-
-TEST(GemmStrategyCover, PairsOfThreads) {
-  QTB_SWEEP(cgemm_2d_bcopy, Kind::bcopy, cfloat);
-  QTB_SWEEP(zgemm_2d_bcopy, Kind::bcopy, cdouble);
-}
-
-TEST(GemmStrategyCover, OwnPanels) {
-  QTB_SWEEP(dgemm_2d_abcopy_abx_m_km_par_p, Kind::abcopy, double);
-  QTB_SWEEP(sgemm_2d_abcopy_abx_m_km_par_p, Kind::abcopy, float);
-  QTB_SWEEP(cgemm_2d_abcopy_abx_m_km_par_p, Kind::abcopy, cfloat);
-  QTB_SWEEP(zgemm_2d_abcopy_abx_m_km_par_p, Kind::abcopy, cdouble);
-}
+#define QTB_COVER_TEST(name, T)                                                                     \
+  TEST(GemmStrategyCover, name) {                                                                   \
+    sweep<T>({#name, kind_of(#name), &qtb_blas_##name}, is_complex<T> || sizeof(T) == 4 ? 20 : 60); \
+  }
+QTB_FOR_EACH_GEMM_STRATEGY(QTB_COVER_TEST)
 
 // ---- Edges by name ----
 
@@ -727,7 +616,6 @@ const Strategy<double> d_row = {"row", Kind::row, &qtb_blas_dgemm_1d_row},
                        d_blocks = {"blocks", Kind::xgemm, &qtb_blas_dgemm_2d_xgemm_p},
                        d_shared_a = {"shared A", Kind::acopy, &qtb_blas_dgemm_2d_acopy_n},
                        d_own = {"own panels", Kind::abcopy, &qtb_blas_dgemm_2d_abcopy_abx_m_km_par_p};
-const Strategy<cdouble> z_pairs = {"pairs", Kind::bcopy, &qtb_blas_zgemm_2d_bcopy};
 
 // The events of a thread in the last run that are of a kind.
 std::vector<Step> steps_of(int thread, Action what) {
@@ -738,45 +626,10 @@ std::vector<Step> steps_of(int thread, Action what) {
 }
 
 // m n k, t r c, mb nb kb, mu nu ku, width
-TEST(GemmStrategyCover, SevenRowsOnFourThreads) {
-  ASSERT_NO_FATAL_FAILURE(check(d_row, {7, 5, 3, 4, 1, 4, 0, 0, 0, 1, 1, 1, 8}, 4, 0));
-  for (int i = 0; i < 3; ++i) EXPECT_EQ(steps_of(i, Action::compute).at(0).rows, 1);
-  EXPECT_EQ(steps_of(3, Action::compute).at(0).rows, 4);
-}
-
-TEST(GemmStrategyCover, FewerRowsOrColumnsThanThreadsAllGoToTheLast) {
-  for (std::uint64_t seed = 0; seed < 36; ++seed) {
-    ASSERT_NO_FATAL_FAILURE(check(d_row, {3, 5, 3, 5, 1, 5, 0, 0, 0, 1, 1, 1, 8}, 5, seed));
-    EXPECT_EQ(steps_of(4, Action::compute).at(0).rows, 3);
-    ASSERT_NO_FATAL_FAILURE(check(d_col, {5, 3, 3, 5, 1, 5, 0, 0, 0, 1, 1, 1, 8}, 5, seed));
-    EXPECT_EQ(steps_of(4, Action::compute).at(0).cols, 3);
-  }
-}
-
 TEST(GemmStrategyCover, TeamOfOneTakesAll) {
   ASSERT_NO_FATAL_FAILURE(check(d_row, {7, 5, 3, 1, 1, 1, 0, 0, 0, 1, 1, 1, 8}, 1, 0));
   ASSERT_NO_FATAL_FAILURE(check(d_col, {7, 5, 3, 1, 1, 1, 0, 0, 0, 1, 1, 1, 8}, 1, 1));
   ASSERT_NO_FATAL_FAILURE(check(d_grid, {7, 5, 3, 1, 1, 1, 0, 0, 0, 4, 1, 1, 8}, 1, 2));
-}
-
-TEST(GemmStrategyCover, FewerColumnsThanTilesAreAllPackedByTheLastThread) {
-  ASSERT_NO_FATAL_FAILURE(check(d_shared_b, {40, 15, 9, 4, 1, 4, 8, 100, 4, 4, 4, 4, 8}, 4, 0));
-  for (int i = 0; i < 3; ++i) EXPECT_TRUE(steps_of(i, Action::pack_b).empty());
-  EXPECT_EQ(steps_of(3, Action::pack_b).at(0).cols, 15);
-}
-
-TEST(GemmStrategyCover, PackedStridesUseTheRoundedDepth) {
-  ASSERT_NO_FATAL_FAILURE(check(d_shared_b, {40, 35, 7, 4, 1, 4, 8, 100, 7, 4, 4, 4, 8}, 4, 0));
-  const Step packed = steps_of(1, Action::pack_b).at(0);
-  EXPECT_EQ(packed.depths, 7);
-  EXPECT_EQ(packed.ld, 4 * 8);
-  EXPECT_EQ(packed.place, 8 * 8 * 8);
-}
-
-TEST(GemmStrategyCover, GridWithFewColumnsGivesThemToItsLastColumn) {
-  ASSERT_NO_FATAL_FAILURE(check(d_grid, {40, 15, 3, 8, 2, 4, 0, 0, 0, 4, 4, 1, 8}, 8, 0));
-  for (int i = 0; i < 6; ++i) EXPECT_TRUE(steps_of(i, Action::compute).empty());
-  EXPECT_EQ(steps_of(7, Action::compute).at(0).cols, 15);
 }
 
 // Where no panel is shared no thread waits for another: the end of the region does that.
@@ -805,49 +658,6 @@ TEST(GemmStrategyCover, DepthOf64AThreadSharesOutRowsAnd65Depth) {
   }
 }
 
-TEST(GemmStrategyCover, LastGroupHasPassesOfItsOwn) {
-  // Two groups of 8 and 15 rows in blocks of 4: in the last two of four passes only the last group has work.
-  for (const QtbInt k : {QtbInt{9}, QtbInt{140}}) {
-    ASSERT_NO_FATAL_FAILURE(check(d_shared_a, {23, 20, k, 4, 2, 2, 4, 0, 16, 8, 4, 4, 8}, 5, 3));
-    const QtbInt blocks_of_k = (k + 15) / 16;
-    EXPECT_EQ(static_cast<QtbInt>(steps_of(0, Action::compute).size()), 2 * blocks_of_k);
-    EXPECT_EQ(static_cast<QtbInt>(steps_of(2, Action::compute).size()), 4 * blocks_of_k);
-  }
-  // And with no rows at all in the others.
-  ASSERT_NO_FATAL_FAILURE(check(d_shared_a, {7, 20, 9, 4, 2, 2, 4, 0, 16, 8, 4, 4, 8}, 4, 4));
-}
-
-TEST(GemmStrategyCover, LastPairIsWider) {
-  // Pairs of 4, 4 and 13 columns in passes of 4.
-  ASSERT_NO_FATAL_FAILURE(check(z_pairs, {20, 21, 9, 6, 2, 3, 0, 4, 4, 4, 4, 2, 16}, 7, 0));
-  EXPECT_EQ(steps_of(0, Action::pack_b).size(), 3U);
-  EXPECT_EQ(steps_of(4, Action::pack_b).size(), 12U);
-  EXPECT_TRUE(steps_of(1, Action::pack_b).empty());
-  // No columns in any pair but the last.
-  ASSERT_NO_FATAL_FAILURE(check(z_pairs, {20, 5, 9, 6, 2, 3, 0, 4, 4, 4, 4, 2, 16}, 6, 1));
-}
-
-TEST(GemmStrategyCover, ThreadsBeginWithTheSlabOfTheirNumber) {
-  ASSERT_NO_FATAL_FAILURE(check(d_own, {32, 2 * 4 * 8 + 3, 5, 4, 4, 1, 8, 8, 4, 4, 4, 4, 8}, 5, 0));
-  for (int i = 0; i < 4; ++i) {
-    const std::vector<Step> computed = steps_of(i, Action::compute);
-    EXPECT_EQ(computed.at(0).col, i * 8);
-    EXPECT_EQ(computed.at(3).col, (i + 3) % 4 * 8);
-    EXPECT_EQ(computed.at(4).col, 32 + i * 8) << "the second super-slab begins anew";
-    EXPECT_EQ(computed.at(8).col, 64) << "the rest is walked in the same order by all";
-  }
-}
-
-TEST(GemmStrategyCover, FewerColumnsThanASuperSlabAreNotRotated) {
-  ASSERT_NO_FATAL_FAILURE(check(d_own, {32, 31, 5, 4, 4, 1, 8, 8, 4, 4, 4, 4, 8}, 4, 0));
-  for (int i = 0; i < 4; ++i) EXPECT_EQ(steps_of(i, Action::compute).at(0).col, 0);
-}
-
-TEST(GemmStrategyCover, ShareOfRowsBelowATileIsNoShare) {
-  ASSERT_NO_FATAL_FAILURE(check(d_own, {15, 31, 5, 4, 4, 1, 8, 8, 4, 4, 4, 4, 8}, 4, 0));
-  for (int i = 0; i < 4; ++i) EXPECT_TRUE(events[i].empty());
-}
-
 TEST(GemmStrategyCover, LastBlockOfRowsMayBeLongerThanTwoBlocks) {
   // Shares of 8 rows, 31 + 8 for the last thread, in blocks of 8.
   ASSERT_NO_FATAL_FAILURE(check(d_own, {8 * 16 + 31 - 8 + 8, 20, 9, 16, 16, 1, 8, 8, 4, 8, 4, 4, 8}, 16, 0));
@@ -874,26 +684,20 @@ TEST(GemmStrategyCover, ThreadWithoutPanelsComputesItsRowsByTheSerialRoutine) {
   for (int thread = 0; thread < 4; ++thread)
     for (int request = 0; request < 2; ++request)
       for (std::uint64_t seed = 0; seed < 36; seed += 7) {
-        memory_failing_thread = thread;
-        memory_failing_request = request;
         Problem<double> p;
         prepare(p, Kind::abcopy, {35, 2 * 4 * 8 + 3, 9, 4, 4, 1, 8, 8, 4, 4, 4, 4, 8}, 5, seed);
+        recorded_memory.fails = [=](long, int by, int number) { return by == thread && number == request; };
         run(p, d_own);
-        memory_failing_thread = -1;
+        recorded_memory.fails = nullptr;
         ASSERT_EQ(faults, 0) << first_fault;
         ASSERT_NO_FATAL_FAILURE(expect_covered_once(p));
         ASSERT_EQ(events[thread].size(), 1U);
         ASSERT_EQ(events[thread][0].step.depths, 9);
         ASSERT_EQ(events[thread][0].step.cols, 2 * 4 * 8 + 3);
         ASSERT_GT(events[(thread + 1) % 4].size(), 1U);
-        ASSERT_TRUE(memory_held.empty());
+        ASSERT_TRUE(recorded_memory.held.empty());
       }
 }
-
-class Figures : public testing::Environment {
-  void TearDown() override { std::printf("strategies: %ld runs, %ld steps compared\n", runs_of_strategy, steps_seen); }
-};
-const testing::Environment *const figures = testing::AddGlobalTestEnvironment(new Figures);
 
 }  // namespace
 }  // namespace qtb::test

@@ -13,13 +13,12 @@
 #include <string>
 #include <vector>
 
-#include "blas/thread/drivers.h"
 #include "service/memory.h"
 #include "tests/product/program.h"
 #include "tests/support/child.h"
 #include "tests/support/run.h"
 #include "tests/support/together.h"
-#include "tests/thread/gemm_problem.h"
+#include "tests/thread/level3/gemm_problem.h"
 
 #if defined(__SANITIZE_THREAD__) || defined(__SANITIZE_ADDRESS__)
 #define QTB_TEST_WATCHED 1
@@ -44,25 +43,6 @@ class Process : public testing::Environment {
 const testing::Environment *const process = testing::AddGlobalTestEnvironment(new Process);
 
 // ---- Calls, checked ----
-
-template <class T>
-struct FrontEnd;
-#define QTB_TEST_FRONT_END(t, T)                      \
-  template <>                                         \
-  struct FrontEnd<T> {                                \
-    static constexpr auto call = &qtb_blas_##t##gemm; \
-  };
-QTB_TEST_FRONT_END(s, float)
-QTB_TEST_FRONT_END(d, double)
-QTB_TEST_FRONT_END(c, cfloat)
-QTB_TEST_FRONT_END(z, cdouble)
-
-template <class T>
-void call(GemmProblem<T> &p) {
-  const GemmShape &s = p.shape;
-  FrontEnd<T>::call(&s.transa, &s.transb, &s.m, &s.n, &s.k, &p.alpha, p.a.data(), &p.lda, p.b.data(), &p.ldb, &p.beta,
-                    p.c.data(), &p.ldc);
-}
 
 struct Size {
   QtbInt m, n, k;

@@ -2,6 +2,9 @@
 // selector asks for. A process is one machine, named by QTB_TEST_MACHINE in its environment.
 #pragma once
 
+#include <gtest/gtest.h>
+#include <omp.h>
+
 #include <cstdio>
 #include <cstdlib>
 #include <string>
@@ -9,6 +12,7 @@
 #include "blas/thread/32e/level3/gemm_plan.h"
 #include "tests/platform/fake.h"
 #include "tests/support/tiers.h"
+#include "tests/thread/recorded_memory.h"
 
 namespace qtb::test {
 
@@ -71,5 +75,24 @@ inline const GemmMachine &named_machine() {
   if (name != nullptr) std::abort();
   return gemm_machines[0];
 }
+
+// A program that is a machine, in recorded memory: everything is given back, and nothing is written outside it.
+inline const GemmMachine &machine = named_machine();
+
+class MachineOfThisProgram : public testing::Environment {
+  void SetUp() override {
+    become(machine);
+    use_recorded_memory();
+    omp_set_dynamic(0);
+  }
+  void TearDown() override {
+    EXPECT_TRUE(recorded_memory.held.empty());
+    EXPECT_EQ(recorded_memory.faults, 0);
+  }
+};
+inline const testing::Environment *const machine_environment =
+    testing::AddGlobalTestEnvironment(new MachineOfThisProgram);
+
+constexpr char letters[] = {'N', 'T', 'C', 'n', 't', 'c'};
 
 }  // namespace qtb::test

@@ -1,33 +1,27 @@
-// Selections of a parallel GEMM between stand-ins: every dispatch slot and every strategy is a routine of this program,
-// by which a plan is compared with an outcome of gemm_rules.h; the block queries among them note the question and
-// answer with numbers of their own. Nothing here knows or asks the processor.
+// Selections of a parallel GEMM between stand-ins: every dispatch slot is a routine of this program, by which a plan is
+// compared with an outcome of gemm_rules.h; the block queries among them note the question and answer with numbers of
+// their own. Nothing here knows or asks the processor.
 //
-// For one source of one program: it defines the library's own names.
+// For one source of one program, as stand_ins.h is.
 #pragma once
 
-#include <gtest/gtest.h>
-
-#include <algorithm>
-#include <array>
 #include <cstdio>
 #include <cstring>
 #include <map>
-#include <string>
-#include <vector>
 
-#include "blas/dispatch/slots.h"
 #include "blas/thread/32e/level3/gemm_select.h"
 #include "blas/thread/32e/level3/gemm_strategies.h"
-#include "tests/thread/gemm_rules.h"
+#include "tests/thread/level3/gemm_rules.h"
+#include "tests/thread/stand_ins.h"
 
 namespace {
 
 using namespace qtb::test;
 
-// ---- The stand-ins ----
+// ---- The block queries ----
 
 struct BlockQuery {
-  const void *slot;  // the address of the routine that was asked
+  int slot;  // that was asked
   QtbInt m, n, k, mb, nb, kb;
 };
 thread_local int query_count = 0;
@@ -35,60 +29,44 @@ thread_local BlockQuery query;
 thread_local QtbInt answered_mu = 0;
 constexpr QtbInt answered_block = 77, answered_nu = 6, answered_ku = 12;
 
-// A routine by its arguments: those of a block query, and all others, which no selector calls.
-inline void stand_in(const void *slot, const QtbInt *m, const QtbInt *n, const QtbInt *k, QtbInt *mb, QtbInt *nb,
-                     QtbInt *kb, QtbInt *mu, QtbInt *nu, QtbInt *ku) {
+template <int slot>
+void answer_blocks(const QtbInt *m, const QtbInt *n, const QtbInt *k, QtbInt *mb, QtbInt *nb, QtbInt *kb, QtbInt *mu,
+                   QtbInt *nu, QtbInt *ku) {
   ++query_count;
   query = {slot, *m, *n, *k, *mb, *nb, *kb};
   for (QtbInt *block : {mb, nb, kb})
     if (*block == 0) *block = answered_block;
-  *mu = answered_mu;
-  *nu = answered_nu;
-  *ku = answered_ku;
-}
-template <class... A>
-void stand_in(const void *, A...) {
-  ADD_FAILURE() << "a selector calls no routine but a block query";
+  *mu = answered_mu, *nu = answered_nu, *ku = answered_ku;
 }
 
-}  // namespace
-
-extern "C" {
-// Each hands on an address of its own, or a linker might fold them into one.
-#define QTB_SLOT(name, shape, T, tiers)                                           \
-  QTB_FUNCTION(shape, T, qtb_blas_x##name) {                                      \
-    using Result = QTB_RESULT_##shape(T);                                         \
-    stand_in(reinterpret_cast<const void *>(&qtb_blas_x##name), QTB_ARGS(shape)); \
-    return Result();                                                              \
-  }
+void use_block_queries() {
+  stand_ins = StandIns{};
+  stand_ins.recording = false;
+#define QTB_SLOT(name, shape, T, tiers)                                          \
+  if (std::is_same_v<QTB_FUNCTION_TYPE(shape, T), QTB_FUNCTION_TYPE(blocks, T)>) \
+    stand_ins.behind[qtb::slot_##name] = code_pointer(&answer_blocks<qtb::slot_##name>);
 #include "blas/dispatch/slots.def"
 #undef QTB_SLOT
-#define QTB_STRATEGY(name, T)                                                           \
-  void qtb_blas_##name(QTB_PARAMS_GEMM_STRATEGY(T)) {                                   \
-    stand_in(reinterpret_cast<const void *>(&qtb_blas_##name), QTB_ARGS_GEMM_STRATEGY); \
-  }
-QTB_FOR_EACH_GEMM_STRATEGY(QTB_STRATEGY)
-#undef QTB_STRATEGY
 }
-
-namespace {
 
 // ---- A plan's routines by name ----
 
 struct Routine {
   const void *address;
   unsigned tiers;  // that have it, as a set of tier bits
+  int slot;        // -1 for a strategy
 };
 
 // Null for a name that no routine has.
 const Routine *routine(const std::string &name) {
   using namespace qtb::tier_set;
-  static const std::map<std::string, Routine> all = {{"", {nullptr, ALL}},
-#define QTB_SLOT(name, shape, T, tiers) {#name, {reinterpret_cast<const void *>(&qtb_blas_x##name), tiers}},
+  static const std::map<std::string, Routine> all = {
+#define QTB_SLOT(name, shape, T, tiers) \
+  {#name, {reinterpret_cast<const void *>(&qtb_blas_x##name), tiers, qtb::slot_##name}},
 #include "blas/dispatch/slots.def"
 #undef QTB_SLOT
-#define QTB_STRATEGY(name, T) {#name, {reinterpret_cast<const void *>(&qtb_blas_##name), ALL}},
-                                                     QTB_FOR_EACH_GEMM_STRATEGY(QTB_STRATEGY)
+#define QTB_STRATEGY(name, T) {#name, {reinterpret_cast<const void *>(&qtb_blas_##name), ALL, -1}},
+      QTB_FOR_EACH_GEMM_STRATEGY(QTB_STRATEGY)
 #undef QTB_STRATEGY
   };
   const auto found = all.find(name);
@@ -105,6 +83,7 @@ struct Routines {
 struct KindInType {
   bool exists = true;  // the type has all of its routines
   Routines routines;
+  int blocks_slot = -1;
   unsigned tiers = ~0u;  // that have all of them
 };
 
@@ -119,6 +98,11 @@ KindInType find_kind(char type, const KindRoutines &names) {
     found.tiers &= r->tiers;
     return r->address;
   };
+  if (*names.blocks != 0) {
+    std::string blocks = names.blocks;
+    blocks[0] = type;
+    if (const Routine *r = routine(blocks)) found.blocks_slot = r->slot;
+  }
   // A conjugate transpose is a form of its own in complex types only.
   const bool three_forms = is_complex_type(type);
   found.routines = {
@@ -152,12 +136,11 @@ struct Selected {
   qtb::GemmPanelSet<T> panels;
 };
 
-void call_select(const Point &p, Selected<float> *s) { qtb_blas_sgemm_select(&p.m, &p.n, &p.k, &s->panels, &s->plan); }
-void call_select(const Point &p, Selected<double> *s) { qtb_blas_dgemm_select(&p.m, &p.n, &p.k, &s->panels, &s->plan); }
-void call_select(const Point &p, Selected<cfloat> *s) { qtb_blas_cgemm_select(&p.m, &p.n, &p.k, &s->panels, &s->plan); }
-void call_select(const Point &p, Selected<cdouble> *s) {
-  qtb_blas_zgemm_select(&p.m, &p.n, &p.k, &s->panels, &s->plan);
-}
+#define QTB_CALL_SELECT(t, T)                                          \
+  void call_select(const Point &p, Selected<T> *s) {                   \
+    qtb_blas_##t##gemm_select(&p.m, &p.n, &p.k, &s->panels, &s->plan); \
+  }
+QTB_FOR_EACH_GEMM(QTB_CALL_SELECT)
 
 // Selects as a thread of a region does. *s is overwritten, padding and all.
 template <class T>
@@ -206,7 +189,7 @@ bool is_outcome(const Selected<T> &s, const Point &p, const Outcome &want) {
       plan.a_buffers != want.a_buffers || plan.b_buffers != want.b_buffers || query_count != int(queried))
     return false;
   if (queried) {
-    if (query.slot != kind.routines.blocks || query.m != p.m || query.n != p.n || query.k != p.k) return false;
+    if (query.slot != kind.blocks_slot || query.m != p.m || query.n != p.n || query.k != p.k) return false;
     if (query.mb != want.mb || query.nb != want.nb || query.kb != want.kb) return false;
     if (plan.mb != filled_in(want.mb) || plan.nb != filled_in(want.nb) || plan.kb != filled_in(want.kb)) return false;
     if (s.panels.mu != answered_mu || s.panels.nu != answered_nu || s.panels.ku != answered_ku) return false;
