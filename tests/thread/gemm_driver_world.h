@@ -164,7 +164,7 @@ void strategy(const char *name, QTB_PARAMS_GEMM_STRATEGY(T)) {
 
 extern "C" {
 ProcessorTier qtb_serv_cpu_detect() { return ask('t'), world.tier; }
-int qtb_serv_cpu_has_sse41() { return ask('4'), world.sse41; }
+int qtb_serv_cpu_takes_sse41() { return ask('4'), world.sse41; }
 int qtb_serv_cpu_is_amd_family16() { return ask('f'), world.family16; }
 std::int32_t qtb_serv_get_max_threads(std::int32_t domain) {
   EXPECT_EQ(domain, domain_blas);
