@@ -14,17 +14,12 @@
 #include "bench/limits.h"
 #include "bench/memory.h"
 #include "bench/timing.h"
+#include "blas/kernels/level3/gemm/tiles.h"
 #include "service/cache.h"
 #include "service/cpu.h"
 
-// The rules of all tiers stand in the build of each.
-#define QTB_TIER def
-#include "blas/kernels/level3/gemm/tiles.h"
-
 namespace qtb::bench {
 namespace {
-
-namespace tables = qtb::QTB_TIER;
 
 template <class T>
 using Kernel = void(QtbInt m, QtbInt n, QtbInt kp, const T *ap, QtbInt ldap, const T *bp, QtbInt ldbp, T *c, QtbInt ldc,
@@ -89,16 +84,16 @@ template <class T>
 struct Listed {
   const char *name;
   Kernel<T> *kernel;
-  tables::GemmBlocks blocks;
+  tiles::GemmBlocks blocks;
   const Step &step;
 };
 
 // The blocks of a large problem on this processor.
-tables::GemmBlocks large_blocks(const tables::GemmRules &rules) {
+tiles::GemmBlocks large_blocks(const tiles::GemmRules &rules) {
   constexpr QtbInt size = 1000;
   std::uint32_t caches[cache_size_entries];
   qtb_serv_get_cache_sizes(caches);
-  tables::GemmBlocks blocks{};
+  tiles::GemmBlocks blocks{};
   fill_blocks(rules, size, size, size, caches, blocks);
   return blocks;
 }
@@ -158,7 +153,7 @@ int main() {
   std::printf("%-22s %5s %5s %9s %7s %7s %7s  %s\n", "kernel", "depth", "rows", "GFLOP/s", "share", "few", "at most",
               "by its step");
 #define QTB_BLOCKS(tier, T, family) \
-  large_blocks(tables::find_rules(tables::kind_of<T>, tier_##tier, tables::Family::family))
+  large_blocks(tiles::find_rules(tiles::kind_of<T>, tier_##tier, tiles::Family::family))
 #define QTB_MEASURE(listed_tier, T, family, name, step) \
   if (tier == tier_##listed_tier)                       \
     measure<T>({#name, qtb_blas_##listed_tier##_##name, QTB_BLOCKS(listed_tier, T, family), step}, limits, mixes);

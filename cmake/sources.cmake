@@ -19,9 +19,6 @@ set(QTB_KERNEL_SOURCES
   blas/kernels/level1/sparse.cpp
   blas/kernels/level1/swap.cpp
   # level3
-  blas/kernels/level3/gemm/blocks.cpp
-  blas/kernels/level3/gemm/gemm.cpp
-  blas/kernels/level3/gemm/pack.cpp
   blas/kernels/level3/gemm/scale_c.cpp
   blas/kernels/level3/gemm/small.cpp
   # plain
@@ -39,27 +36,46 @@ set(QTB_KERNEL_SOURCES
   blas/kernels/plain/trsv.cpp
 )
 
-# Compiled for some tiers only.
+# Compiled for some tiers only: these lists alone decide where.
 set(QTB_KERNEL_SOURCES_def
-  blas/kernels/level3/gemm/def/dgemm_kernel.cpp
+  blas/kernels/level3/gemm/def/blocks.cpp
   blas/kernels/level3/gemm/def/dgemm.cpp
+  blas/kernels/level3/gemm/def/dgemm_kernel.cpp
   blas/kernels/level3/gemm/def/folding_gemm.cpp
   blas/kernels/level3/gemm/def/folding_kernels.cpp
+  blas/kernels/level3/gemm/def/pack.cpp
+  blas/kernels/level3/gemm/pack.cpp
 )
 set(QTB_KERNEL_SOURCES_sse3
-  blas/kernels/level3/gemm/sse3/dgemm.cpp
   blas/kernels/level3/gemm/def/folding_gemm.cpp
   blas/kernels/level3/gemm/def/folding_kernels.cpp
+  blas/kernels/level3/gemm/pack.cpp
+  blas/kernels/level3/gemm/sse3/dgemm.cpp
   blas/kernels/level3/gemm/sse3/dgemm_kernel.cpp
 )
 set(QTB_KERNEL_SOURCES_ssse3
+  blas/kernels/level3/gemm/blocks.cpp
+  blas/kernels/level3/gemm/pieces.cpp
+  blas/kernels/level3/gemm/ssse3/blocks.cpp
+  blas/kernels/level3/gemm/ssse3/gemm.cpp
   blas/kernels/level3/gemm/ssse3/gemm_kernel.cpp
+  blas/kernels/level3/gemm/ssse3/pack.cpp
 )
 set(QTB_KERNEL_SOURCES_sse42
+  blas/kernels/level3/gemm/blocks.cpp
+  blas/kernels/level3/gemm/gemm.cpp
+  blas/kernels/level3/gemm/pack.cpp
+  blas/kernels/level3/gemm/pieces.cpp
+  blas/kernels/level3/gemm/sse42/dgemm_kernel.cpp
   blas/kernels/level3/gemm/sse42/gemm_kernel.cpp
+  blas/kernels/level3/gemm/sse42/pieces.cpp
 )
 set(QTB_KERNEL_SOURCES_avx
   blas/kernels/level3/gemm/avx/dgemm_kernel.cpp
+  blas/kernels/level3/gemm/blocks.cpp
+  blas/kernels/level3/gemm/gemm.cpp
+  blas/kernels/level3/gemm/pack.cpp
+  blas/kernels/level3/gemm/pieces.cpp
   blas/kernels/level3/gemm/sse42/gemm_kernel.cpp
 )
 set(qtb_tier_sources ${QTB_KERNEL_SOURCES_def} ${QTB_KERNEL_SOURCES_sse3} ${QTB_KERNEL_SOURCES_ssse3}

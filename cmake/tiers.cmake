@@ -2,8 +2,9 @@
 #
 # -mno-popcnt and its kin keep out what a compiler would add on its own to the instruction set that the tier names.
 #
-# The product holds all tiers; fewer make the tree for a tool that reads sources.
-set(QTB_TIERS def sse3 ssse3 sse42 avx CACHE STRING "Tiers whose kernels are built")
+set(QTB_TIERS def sse3 ssse3 sse42 avx)
+# The product holds a source once per tier that lists it. A tool that reads sources wants each of them once.
+option(QTB_EACH_SOURCE_ONCE "Kernels in the highest tier alone that lists them: for tools, not a product" OFF)
 set(QTB_TIER_FLAGS_def   -march=x86-64)
 set(QTB_TIER_FLAGS_sse3  -march=x86-64 -msse3)
 set(QTB_TIER_FLAGS_ssse3 -march=x86-64 -mssse3)
@@ -18,11 +19,19 @@ set(QTB_WIDE_FLAGS -mavx)
 set(QTB_KERNEL_ALIGNMENT -falign-functions=64 -falign-loops=64)
 
 # qtb_add_tiers(source...): one object library qtb_<tier> per tier, each of all the sources and of those that
-# QTB_KERNEL_SOURCES_<tier> lists for this tier.
+# QTB_KERNEL_SOURCES_<tier> lists for this tier; with QTB_EACH_SOURCE_ONCE without those that a higher tier has.
 function(qtb_add_tiers)
   set_property(SOURCE ${QTB_WIDE_KERNEL_SOURCES} APPEND PROPERTY COMPILE_OPTIONS ${QTB_WIDE_FLAGS})
-  foreach(tier IN LISTS QTB_TIERS)
-    add_library(qtb_${tier} OBJECT ${ARGN} ${QTB_KERNEL_SOURCES_${tier}})
+  set(highest_first ${QTB_TIERS})
+  list(REVERSE highest_first)
+  set(taken "")
+  foreach(tier IN LISTS highest_first)
+    set(sources ${ARGN} ${QTB_KERNEL_SOURCES_${tier}})
+    if(QTB_EACH_SOURCE_ONCE)
+      list(REMOVE_ITEM sources ${taken} "")
+      list(APPEND taken ${sources})
+    endif()
+    add_library(qtb_${tier} OBJECT ${sources})
     target_link_libraries(qtb_${tier} PRIVATE qtb_options)
     target_compile_definitions(qtb_${tier} PRIVATE QTB_TIER=${tier})
     target_compile_options(qtb_${tier} PRIVATE

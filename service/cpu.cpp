@@ -19,6 +19,7 @@ constexpr std::int32_t no_override = -666;  // outside every value that atoi's r
 
 std::atomic<std::int32_t> cached_tier{-1};        // negative until decided
 std::atomic<std::int32_t> avx_enabled{-1};        // -1 not looked at, 0 off, 1 on: the avx tier is never taken unasked
+std::atomic<std::int32_t> sse41_cached{-1};       // -1 until asked
 std::atomic<std::int32_t> amd_family_cached{-1};  // -1 until tested
 
 constexpr auto relaxed = std::memory_order_relaxed;
@@ -68,6 +69,14 @@ int qtb_serv_cpu_has_sse42() { return bits(feature_bits(), 20, 20) != 0; }
 int qtb_serv_cpu_has_sse41() { return bits(feature_bits(), 19, 19) != 0; }
 int qtb_serv_cpu_has_ssse3() { return bits(feature_bits(), 9, 9) != 0; }
 int qtb_serv_cpu_has_sse3() { return bits(feature_bits(), 0, 0) != 0; }
+
+int qtb_serv_cpu_takes_sse41() {
+  const std::int32_t known = sse41_cached.load(relaxed);
+  if (known != -1) return known;
+  const std::int32_t asked = qtb_serv_cpu_has_sse41();
+  sse41_cached.store(asked, relaxed);
+  return asked;
+}
 
 // A reader that comes while the first caller still tests may see 0, and takes the ordinary path that once.
 int qtb_serv_cpu_is_amd_family16() {

@@ -18,6 +18,10 @@ QTB_HIDDEN int qtb_serv_cpu_has_sse41();
 QTB_HIDDEN int qtb_serv_cpu_has_ssse3();
 QTB_HIDDEN int qtb_serv_cpu_has_sse3();
 
+// The answer of qtb_serv_cpu_has_sse41, asked once per process and kept: what every product of a tier with a family of
+// kernels for SSE4.1 wants to know.
+QTB_HIDDEN int qtb_serv_cpu_takes_sse41();
+
 // 1 on the vendor "AuthenticAMD" with base family 15 and extended family 1; cached after the first call.
 QTB_HIDDEN int qtb_serv_cpu_is_amd_family16();
 

@@ -21,7 +21,7 @@ struct ThisProcess {
   static bool dynamic() { return qtb_serv_get_dynamic() == 1; }
   // Fills cache_size_entries numbers.
   static void cache_sizes(std::uint32_t *table) { qtb_serv_get_cache_sizes(table); }
-  static bool has_sse41() { return qtb_serv_cpu_has_sse41() != 0; }
+  static bool has_sse41() { return qtb_serv_cpu_takes_sse41() != 0; }
   static bool is_amd_family16() { return qtb_serv_cpu_is_amd_family16() != 0; }
   // Whether the calling thread works inside a parallel region already.
   static bool in_parallel() { return omp_in_parallel() != 0; }

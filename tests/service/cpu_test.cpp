@@ -119,6 +119,20 @@ TEST(CpuTests, LookAtOneBitEach) {
     }
 }
 
+TEST(CpuTests, WhetherProductsTakeSse41IsAskedOnceAndKept) {
+  for (const bool present : {false, true})
+    in_child([&] {
+      fake.processors[0].features_ecx = present ? sse41 : ~sse41;
+      const int before = fake.cpuid_calls;
+      EXPECT_EQ(qtb_serv_cpu_takes_sse41(), present);
+      const int asked = fake.cpuid_calls;
+      EXPECT_EQ(asked, before + 1);
+      fake.processors[0].features_ecx = ~fake.processors[0].features_ecx;
+      EXPECT_EQ(qtb_serv_cpu_takes_sse41(), present);
+      EXPECT_EQ(fake.cpuid_calls, asked);
+    });
+}
+
 TEST(CpuTests, TheVendorIsComparedWhole) {
   fake.processors[0].vendor = "GenuineBelmo";
   EXPECT_EQ(qtb_serv_cpu_is_belmo(), 1);

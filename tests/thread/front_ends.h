@@ -77,7 +77,7 @@ std::string reached_by(R (*front_end)(A...), const char *names, const std::map<s
 
 extern "C" {
 ProcessorTier qtb_serv_cpu_detect() { return qtb::test::asked_process.tier(); }
-int qtb_serv_cpu_has_sse41() { return qtb::test::asked_process.has_sse41(); }
+int qtb_serv_cpu_takes_sse41() { return qtb::test::asked_process.has_sse41(); }
 int qtb_serv_cpu_is_amd_family16() { return qtb::test::asked_process.is_amd_family16(); }
 std::int32_t qtb_serv_get_dynamic() { return qtb::test::asked_process.dynamic(), qtb::test::process_answers.dynamic; }
 void qtb_serv_get_cache_sizes(std::uint32_t *out) { qtb::test::asked_process.cache_sizes(out); }

@@ -3,14 +3,12 @@
 
 #include <algorithm>
 #include <initializer_list>
+#include <iterator>
 #include <utility>
 
+#include "blas/kernels/level3/gemm/limits.h"
 #include "service/cache.h"
 #include "tests/support/tiers.h"
-
-// The rules of all tiers can be read in any tier's build.
-#define QTB_TIER def
-#include "blas/kernels/level3/gemm/tiles.h"
 
 namespace {
 // The processor's caches, as the blocks routines see them in this program.
@@ -26,7 +24,7 @@ extern "C" void qtb_serv_get_cache_sizes(std::uint32_t *out) {
 namespace qtb::test {
 namespace {
 
-using def::GemmBlocks, def::Family;
+using tiles::GemmBlocks, tiles::Family;
 
 void set_caches(std::uint32_t count, std::uint32_t second, std::uint32_t third) {
   const std::uint32_t table[5] = {count, 32768, second, third, 0};
@@ -45,10 +43,10 @@ GemmBlocks blocks(Query<T> *query, QtbInt m, QtbInt n, QtbInt k, GemmBlocks impo
 
 // The same from the row of the table, for families that no slot asks.
 GemmBlocks blocks_of(char kind, ProcessorTier tier, QtbInt m, QtbInt n, QtbInt k) {
-  for (const def::GemmRules &row : def::gemm_rules)
+  for (const tiles::GemmRules &row : tiles::gemm_rules)
     if (row.kind == kind && (row.tiers >> tier & 1U) != 0 && row.family == Family::base) {
       GemmBlocks b{};
-      def::fill_blocks(row, m, n, k, cache_table, b);
+      tiles::fill_blocks(row, m, n, k, cache_table, b);
       return b;
     }
   ADD_FAILURE() << "no family " << kind << " in tier " << tier_name(tier);
@@ -66,10 +64,10 @@ void expect_blocks(const GemmBlocks &got, const GemmBlocks &want) {
 
 TEST(GemmBlocks, DepthFollowsItsRuleAtEveryEdge) {
   using Pairs = std::initializer_list<std::pair<QtbInt, QtbInt>>;  // k, kb
-  const auto expect = [](def::DepthRule rule, Pairs pairs) {
-    for (const auto &[k, kb] : pairs) EXPECT_EQ(def::block_depth(rule, k), kb) << "k = " << k;
+  const auto expect = [](tiles::DepthRule rule, Pairs pairs) {
+    for (const auto &[k, kb] : pairs) EXPECT_EQ(tiles::block_depth(rule, k), kb) << "k = " << k;
   };
-  using def::Depth;
+  using tiles::Depth;
   expect({Depth::halved, 256}, {{0, 128},
                                 {1, 128},
                                 {128, 128},
@@ -123,6 +121,18 @@ TEST(GemmBlocks, DepthFollowsItsRuleAtEveryEdge) {
   expect({Depth::halved_down, 128}, {{128, 128}, {129, 64}, {130, 64}, {136, 68}, {256, 128}, {257, 128}});
   expect({Depth::whole, 256}, {{1, 128}, {130, 132}, {255, 256}, {256, 256}, {300, 256}});
   expect({Depth::fixed, 64}, {{1, 64}, {64, 64}, {65, 64}, {1000, 64}});
+}
+
+TEST(GemmBlocks, TheRemainderOfAFixedDepthComesFirst) {
+  using tiles::Depth, tiles::first_depth;
+  const auto first = [](QtbInt k) { return first_depth({Depth::fixed, 112}, 112, k); };
+  EXPECT_EQ(first(1), 1);
+  EXPECT_EQ(first(112), 112);
+  EXPECT_EQ(first(113), 1);
+  EXPECT_EQ(first(224), 112);
+  EXPECT_EQ(first(300), 76);
+  EXPECT_EQ(first_depth({Depth::halved, 256}, 152, 300), 152);
+  EXPECT_EQ(first_depth({Depth::halved, 256}, 128, 100), 100);
 }
 
 TEST(GemmBlocks, SlotsGiveTheSizesOfTheirFamily) {
@@ -205,6 +215,52 @@ TEST(GemmBlocks, ImposedSizesStayButInTheDoublePrecisionFamilyOfAvx) {
   expect_blocks(blocks<cfloat>(qtb_blas_ssse3_xcgemm_blocks, 9999, 9, 300, {0, 0, 64, 0, 0, 0}),
                 {1760, 9, 64, 4, 2, 2});
   expect_blocks(blocks<double>(qtb_blas_avx_xdgemm_blocks, 3000, 3000, 300, imposed), {512, 3000, 152, 8, 4, 4});
+}
+
+// The limits below which a body packs nothing, in m, n and k, written down a second time: where a panel would have no
+// row in any case, no test of a product can tell them.
+TEST(GemmBlocks, LimitsOfTheSmallPathAreThoseOfTheirBody) {
+  using tiles::BodyForm;
+  constexpr auto full = BodyForm::full, in_place = BodyForm::b_in_place, a_packed = BodyForm::a_packed;
+  constexpr auto base = Family::base, sse41 = Family::sse41, def_a = Family::def_a;
+  const struct {
+    char kind;
+    int tier;
+    Family family;
+    BodyForm form;
+    QtbInt m, n, k;
+  } limits[] = {
+      {'s', tier_def, base, full, 8, 8, 8},        {'s', tier_sse3, base, full, 8, 8, 8},
+      {'s', tier_ssse3, base, full, 9, 3, 3},      {'s', tier_ssse3, base, in_place, 8, 2, 2},
+      {'s', tier_ssse3, sse41, full, 9, 5, 5},     {'s', tier_ssse3, sse41, in_place, 8, 4, 4},
+      {'s', tier_sse42, base, full, 5, 5, 5},      {'s', tier_sse42, base, in_place, 4, 4, 4},
+      {'s', tier_avx, base, full, 5, 5, 5},        {'s', tier_avx, base, in_place, 4, 4, 4},
+      {'d', tier_def, base, full, 2, 2, 2},        {'d', tier_def, def_a, full, 2, 2, 2},
+      {'d', tier_sse3, base, full, 3, 3, 3},       {'d', tier_ssse3, base, full, 3, 3, 3},
+      {'d', tier_ssse3, base, in_place, 2, 2, 2},  {'d', tier_ssse3, sse41, full, 5, 5, 5},
+      {'d', tier_ssse3, sse41, in_place, 4, 4, 4}, {'d', tier_sse42, base, full, 3, 5, 5},
+      {'d', tier_sse42, base, a_packed, 2, 4, 4},  {'d', tier_avx, base, full, 3, 3, 3},
+      {'c', tier_def, base, full, 4, 8, 8},        {'c', tier_sse3, base, full, 4, 8, 8},
+      {'c', tier_ssse3, base, full, 5, 3, 3},      {'c', tier_ssse3, sse41, full, 5, 3, 5},
+      {'c', tier_sse42, base, full, 3, 5, 5},      {'c', tier_avx, base, full, 3, 5, 5},
+      {'z', tier_def, base, full, 4, 8, 8},        {'z', tier_sse3, base, full, 4, 8, 8},
+      {'z', tier_ssse3, base, full, 3, 3, 3},      {'z', tier_ssse3, sse41, full, 3, 3, 5},
+      {'z', tier_sse42, base, full, 3, 5, 5},      {'z', tier_avx, base, full, 3, 5, 5},
+  };
+  std::size_t bodies = 0;
+  for (const tiles::LimitRow &row : tiles::limit_rows)
+    for (int tier = 0; tier < tier_count; tier++) bodies += row.tiers >> tier & 1U;
+  EXPECT_EQ(bodies, std::size(limits));
+  for (const auto &want : limits) {
+    const auto found = std::find_if(std::begin(tiles::limit_rows), std::end(tiles::limit_rows), [&](const auto &row) {
+      return row.kind == want.kind && (row.tiers >> want.tier & 1U) != 0 && row.family == want.family &&
+             row.form == want.form;
+    });
+    ASSERT_NE(found, std::end(tiles::limit_rows)) << want.kind << " of " << tier_name(want.tier);
+    EXPECT_EQ(found->limits.m, want.m) << want.kind << " of " << tier_name(want.tier);
+    EXPECT_EQ(found->limits.n, want.n) << want.kind << " of " << tier_name(want.tier);
+    EXPECT_EQ(found->limits.k, want.k) << want.kind << " of " << tier_name(want.tier);
+  }
 }
 
 TEST(GemmBlocks, NoDepthIsNoDivisionByZero) {

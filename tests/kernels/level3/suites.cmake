@@ -1,9 +1,15 @@
 # Level 3, tier by tier.
 qtb_add_test(gemm_blocks_test SOURCES kernels/level3/gemm_blocks_test.cpp LIBRARIES qtb_static)
-qtb_add_test(gemm_body_test SOURCES kernels/level3/gemm_body_test.cpp LIBRARIES qtb_static qtb_platform_fake SHARDS 4)
+# A process keeps its processor, on which the family of two tiers depends.
+set(gemm_processors "plain=QTB_TEST_PROCESSOR=plain" "sse41=QTB_TEST_PROCESSOR=sse41"
+  "family16=QTB_TEST_PROCESSOR=family16")
+qtb_add_test(gemm_body_test SOURCES kernels/level3/gemm_body_test.cpp LIBRARIES qtb_static qtb_platform_fake
+  RUNS ${gemm_processors} SHARDS 4)
 qtb_add_test(gemm_in_place_test SOURCES kernels/level3/gemm_in_place_test.cpp LIBRARIES qtb_static qtb_platform_fake)
 qtb_add_test(gemm_kernels_test SOURCES kernels/level3/gemm_kernels_test.cpp LIBRARIES qtb_static)
 qtb_add_test(gemm_low_kernels_test SOURCES kernels/level3/gemm_low_kernels_test.cpp LIBRARIES qtb_static)
+qtb_add_test(gemm_memory_test SOURCES kernels/level3/gemm_memory_test.cpp LIBRARIES qtb_static qtb_platform_fake
+  RUNS ${gemm_processors} "family16_of_sse3=QTB_TEST_PROCESSOR=family16_of_sse3" SHARDS 2)
 qtb_add_test(gemm_pack_test SOURCES kernels/level3/gemm_pack_test.cpp LIBRARIES qtb_static qtb_platform_fake)
 qtb_add_test(gemm_pieces_test SOURCES kernels/level3/gemm_pieces_test.cpp LIBRARIES qtb_static qtb_platform_fake)
 qtb_add_test(triangle_pieces_test SOURCES kernels/level3/triangle_pieces_test.cpp LIBRARIES qtb_static SHARDS 2)

@@ -1,169 +1,52 @@
-// The blocked loops of a GEMM body: C := alpha*op(A)*op(B) + beta*C on one thread, in the tiers from ssse3 on.
+// The GEMM bodies: C := alpha*op(A)*op(B) + beta*C on one thread.
 //
-// A small problem takes the small path whole. Otherwise C is scaled by beta, and everything after that adds: over
-// blocks of nb columns and, inside, of kb of the depth, a block of op(B) is packed, and over blocks of mb rows one of
-// op(A) with alpha folded in, on which the inner kernel works. Rows beyond a multiple of mr take the small path, block
-// by block. A body may get A, B or both as panels that its caller has packed, or read B in place; of an operand that
-// the caller has packed the matrix itself is read only by the small path.
+// C is m x n with columns ldc apart, op(A) m x k, op(B) k x n. A beta of 0 stores without reading C, an alpha of 0
+// reads neither A nor B. A and B do not overlap C. A small problem takes the small path whole; any other is scaled by
+// beta, where the family's kernels do not apply it, and goes to the walk over its blocks.
 #pragma once
 
-#include "blas/kernels/level3/gemm/buffers.h"
-#include "blas/kernels/level3/gemm/kernels.h"
-#include "blas/kernels/level3/gemm/parts.h"
-#include "service/cache.h"
+#include "blas/kernels/level3/gemm/limits.h"
+#include "blas/kernels/level3/gemm/walk.h"
 
 namespace qtb::QTB_TIER {
 namespace {
 
-// A problem with m, n or k below these takes the small path.
-struct SmallLimits {
-  QtbInt m, n, k;
-};
-
-enum class BodyForm { full, b_in_place, a_packed };
-
-struct LimitRow {
-  char kind;
-  unsigned tiers;
-  Family family;
-  BodyForm form;
-  SmallLimits limits;
-};
-
-// clang-format off
-constexpr LimitRow limit_rows[] = {
-  {'d', tier_set::AVX,    Family::base,  BodyForm::full,       {3, 3, 3}},
-  {'d', tier_set::SSE42,  Family::base,  BodyForm::full,       {3, 5, 5}},
-  {'d', tier_set::SSE42,  Family::base,  BodyForm::a_packed,   {2, 4, 4}},
-  {'d', tier_set::SSSE3,  Family::base,  BodyForm::full,       {3, 3, 3}},
-  {'d', tier_set::SSSE3,  Family::base,  BodyForm::b_in_place, {2, 2, 2}},
-  {'d', tier_set::SSSE3,  Family::sse41, BodyForm::full,       {5, 5, 5}},
-  {'d', tier_set::SSSE3,  Family::sse41, BodyForm::b_in_place, {4, 4, 4}},
-  {'s', tiers_from_sse42, Family::base,  BodyForm::full,       {5, 5, 5}},
-  {'s', tiers_from_sse42, Family::base,  BodyForm::b_in_place, {4, 4, 4}},
-  {'s', tier_set::SSSE3,  Family::base,  BodyForm::full,       {9, 3, 3}},
-  {'s', tier_set::SSSE3,  Family::base,  BodyForm::b_in_place, {8, 2, 2}},
-  {'s', tier_set::SSSE3,  Family::sse41, BodyForm::full,       {9, 5, 5}},
-  {'s', tier_set::SSSE3,  Family::sse41, BodyForm::b_in_place, {8, 4, 4}},
-  {'c', tiers_from_sse42, Family::base,  BodyForm::full,       {3, 5, 5}},
-  {'c', tier_set::SSSE3,  Family::base,  BodyForm::full,       {5, 3, 3}},
-  {'c', tier_set::SSSE3,  Family::sse41, BodyForm::full,       {5, 3, 5}},
-  {'z', tiers_from_sse42, Family::base,  BodyForm::full,       {3, 5, 5}},
-  {'z', tier_set::SSSE3,  Family::base,  BodyForm::full,       {3, 3, 3}},
-  {'z', tier_set::SSSE3,  Family::sse41, BodyForm::full,       {3, 3, 5}},
-  {'d', tier_set::SSE3,   Family::base,  BodyForm::full,       {3, 3, 3}},
-  {'d', tier_set::DEF,    Family::base,  BodyForm::full,       {2, 2, 2}},
-  {'d', tier_set::DEF,    Family::def_a, BodyForm::full,       {2, 2, 2}},
-  {'s', tiers_to_sse3,    Family::base,  BodyForm::full,       {8, 8, 8}},
-  {'c', tiers_to_sse3,    Family::base,  BodyForm::full,       {4, 8, 8}},
-  {'z', tiers_to_sse3,    Family::base,  BodyForm::full,       {4, 8, 8}},
-};
-// clang-format on
-
-// A form without a row of its own has the limits of the full body.
-consteval SmallLimits find_limits(char kind, ProcessorTier tier, Family family, BodyForm form) {
-  for (const LimitRow &row : limit_rows)
-    if (row.kind == kind && (row.tiers >> tier & 1U) != 0 && row.family == family && row.form == form)
-      return row.limits;
-  return find_limits(kind, tier, family, BodyForm::full);
+// The arguments of the shape gemm as a Product.
+template <class T>
+Product<T> product(const char *transa, const char *transb, const QtbInt *m, const QtbInt *n, const QtbInt *k,
+                   const T *alpha, const T *a, const QtbInt *lda, const T *b, const QtbInt *ldb, T *c,
+                   const QtbInt *ldc) {
+  return {transa, transb, *m, *n, *k, *alpha, a, *lda, b, *ldb, c, *ldc};
 }
+
 template <class T, Family family, BodyForm form>
 constexpr SmallLimits limits_of = find_limits(kind_of<T>, this_tier, family, form);
 
-// One call, with its matrices as they lie in memory.
-template <class T>
-struct Product {
-  const char *transa, *transb;
-  QtbInt m, n, k;
-  T alpha;
-  const T *a;
-  QtbInt lda;
-  const T *b;
-  QtbInt ldb;
-  T *c;
-  QtbInt ldc;
-};
-
-// A panel that the caller has packed; no panels where it has not.
-template <class T>
-struct CallersPanel {
-  const T *panels = nullptr;
-  QtbInt ldp = 0;
-};
-
-template <class T>
-bool is_small(const Product<T> &p, SmallLimits limits) {
-  return p.m < limits.m || p.n < limits.n || p.k < limits.k;
+constexpr BodyForm form_of(Source a, Source b) {
+  if (b == Source::in_place) return BodyForm::b_in_place;
+  return a == Source::given && b == Source::packed ? BodyForm::a_packed : BodyForm::full;
 }
 
-constexpr float one_of(float) { return 1; }
-constexpr double one_of(double) { return 1; }
-template <class R>
-constexpr Complex<R> one_of(Complex<R>) {
-  return {1, 0};
-}
-
-// C := beta*C + alpha*op(A)*op(B) over rows i0 and up, columns j0 to j0 + n and depth l0 to l0 + k, without packing.
-template <class T>
-void run_small(const Product<T> &p, bool a_is_n, bool b_is_n, QtbInt i0, QtbInt j0, QtbInt n, QtbInt l0, QtbInt k,
-               T beta) {
-  const QtbInt m = p.m - i0;
-  small_path<T>(p.transa, p.transb, &m, &n, &k, &p.alpha, p.a + (a_is_n ? i0 + l0 * p.lda : l0 + i0 * p.lda), &p.lda,
-                p.b + (b_is_n ? l0 + j0 * p.ldb : j0 + l0 * p.ldb), &p.ldb, &beta, p.c + i0 + j0 * p.ldc, &p.ldc);
-}
-template <class T>
-void add_small(const Product<T> &p, bool a_is_n, bool b_is_n, QtbInt i0, QtbInt j0, QtbInt n, QtbInt l0, QtbInt k) {
-  run_small(p, a_is_n, b_is_n, i0, j0, n, l0, k, one_of(p.alpha));
-}
-
-// Scales C. False where nothing is left to do: no rows or columns, an alpha of 0, which reads neither A nor B, or a
-// small problem, which takes the small path whole.
-template <class T>
-bool begin_product(const Product<T> &p, const T *beta, SmallLimits limits) {
+// False where nothing is left to multiply: no rows or columns, an alpha of 0, a small problem.
+template <class T, Family family, BodyForm form = BodyForm::full>
+bool begin_product(const Product<T> &p, const T *beta) {
+  constexpr SmallLimits limits = limits_of<T, family, form>;
   if (p.m < 1 || p.n < 1) return false;
   const bool multiplies = !is_zero(p.alpha);
-  if (multiplies && is_small(p, limits)) {
-    run_small(p, read_op<T>(p.transa) == Op::none, read_op<T>(p.transb) == Op::none, 0, 0, p.n, 0, p.k, *beta);
+  if (multiplies && (p.m < limits.m || p.n < limits.n || p.k < limits.k)) {
+    small_path<T>(p.transa, p.transb, &p.m, &p.n, &p.k, &p.alpha, p.a, &p.lda, p.b, &p.ldb, beta, p.c, &p.ldc);
     return false;
   }
-  if (!is_one(*beta)) scale_columns<T>(&p.m, &p.n, beta, p.c, &p.ldc);
+  const bool kernels_scale = multiplies && rules_of<T, family>.walk.kernels_apply_beta;
+  if (!kernels_scale && !is_one(*beta)) scale_columns<T>(&p.m, &p.n, beta, p.c, &p.ldc);
   return multiplies;
-}
-
-template <class T, Family family>
-void run_kernel(bool aligned, QTB_INNER_KERNEL_PARAMS(T)) {
-  if (aligned)
-    InnerKernel<T, family>::run_aligned(m, n, kp, ap, ldap, bp, ldbp, c, ldc, stage);
-  else
-    InnerKernel<T, family>::run(m, n, kp, ap, ldap, bp, ldbp, c, ldc, stage);
-}
-
-// The kernel on a slice of the depth, l0 to l0 + kp, of panels that hold more. ap and bp are the whole panels; the edge
-// micro-panels of B have widths, and so offsets, of their own.
-template <class T, Family family>
-void run_kernel_on_slice(bool aligned, QtbInt l0, QTB_INNER_KERNEL_PARAMS(T)) {
-  constexpr QtbInt mr = rules_of<T, family>.mr, nr = rules_of<T, family>.nr;
-  ap += l0 * mr;
-  const QtbInt full = round_down(n, nr);
-  if (full > 0) run_kernel<T, family>(aligned, m, full, kp, ap, ldap, bp + l0 * nr, ldbp, c, ldc, stage);
-  bp += full / nr * ldbp;
-  for (QtbInt j0 = full, w; j0 < n; j0 += w, bp += ldbp) {
-    w = panel_width(nr, n - j0);
-    run_kernel<T, family>(aligned, m, w, kp, ap, ldap, bp + l0 * w, ldbp, c + j0 * ldc, ldc, stage);
-  }
-}
-
-// Whether every column of C begins on a 16-byte boundary.
-template <class T>
-bool columns_aligned(const T *c, QtbInt ldc) {
-  return phase(c) == 0 && ldc * static_cast<QtbInt>(sizeof(T)) % vector_bytes == 0;
 }
 
 // The block sizes of a body. More rows than a problem has are as good as any, so that the caches are asked only where
 // the reduced number of rows would cut it.
-template <class T, Family family>
+template <class T, Family family, Source source_b = Source::packed>
 GemmBlocks body_blocks(const Product<T> &p) {
-  constexpr GemmRules rules = rules_of<T, family>;
+  constexpr GemmRules rules = with_rows_in_place(rules_of<T, family>, source_b == Source::in_place);
   std::uint32_t caches[cache_size_entries] = {};
   GemmBlocks blocks{};
   if constexpr (reads_caches(rules)) {
@@ -173,108 +56,119 @@ GemmBlocks body_blocks(const Product<T> &p) {
       qtb_serv_get_cache_sizes(caches);
   }
   fill_blocks(rules, p.m, p.n, p.k, caches, blocks);
+  if constexpr (source_b == Source::in_place) blocks.nb = p.n;
   return blocks;
 }
 
-// Whether one block holds the whole problem.
+// Whether C lies on a 16-byte boundary with all its columns.
 template <class T>
-bool fit(const GemmBlocks &blocks, const Product<T> &p) {
-  return p.m <= blocks.mb && p.n <= blocks.nb && p.k <= blocks.kb;
+bool columns_aligned(const T *c, QtbInt ldc) {
+  return phase(c) == 0 && ldc * static_cast<QtbInt>(sizeof(T)) % vector_bytes == 0;
 }
 
-// Where the block after that at first begins. One block that holds all has none after it: compilers see that there is
-// no loop, and small problems, which have one block, are spared what goes ahead of loops.
-template <bool one_block>
-QtbInt next_block(QtbInt first, QtbInt step, QtbInt total) {
-  return one_block ? total : first + step;
-}
+// The kernels of kernels.def, which add.
+template <class T, Family family, Source source_b>
+struct AddingKernels {
+  static constexpr auto inner = inner_kernel<T, family>;
+  static constexpr auto in_place = in_place_kernel<T, family>;
+  static constexpr QtbInt stage_per_k = source_b == Source::in_place ? in_place.stage_per_k : inner.stage_per_k;
 
-// C += alpha*op(A)*op(B), with B packed here or by the caller, and A likewise.
-template <class T, Family family, bool a_given, bool b_given, bool one_block>
-void walk_blocks(const Product<T> &p, GemmBlocks blocks, CallersPanel<T> given_a, CallersPanel<T> given_b) {
-  constexpr GemmRules rules = rules_of<T, family>;
-  const Op op_a = read_op<T>(p.transa), op_b = read_op<T>(p.transb);
-  const bool a_is_n = op_a == Op::none, b_is_n = op_b == Op::none, aligned = columns_aligned(p.c, p.ldc);
-  const QtbInt full_m = round_down(p.m, rules.mr), depth_step = blocks.kb;
-  const QtbInt column_step = b_given ? p.n : blocks.nb, row_step = a_given ? full_m : blocks.mb;
-  if (full_m == 0) return add_small(p, a_is_n, b_is_n, 0, 0, p.n, 0, p.k);
-  PanelCopy<T> *const copy_a = copies_of<T, family>.a[static_cast<int>(op_a)];
-  PanelCopy<T> *const copy_b = copies_of<T, family>.b[static_cast<int>(op_b)];
+  bool b_is_n, aligned;
+  AddingKernels(const Product<T> &p, T)
+      : b_is_n(read_op<T>(p.transb) == Op::none), aligned(columns_aligned(p.c, p.ldc)) {}
 
-  const GemmBuffers<T> buffers = get_buffers<T, family>(a_given ? 0 : blocks.mb, b_given ? 0 : blocks.nb, blocks.kb,
-                                                        InnerKernel<T, family>::stage_bytes(largest_depth));
-  if (buffers.allocation == nullptr) return add_small(p, a_is_n, b_is_n, 0, 0, p.n, 0, p.k);
-  for (QtbInt j0 = 0; j0 < p.n; j0 = next_block<one_block>(j0, column_step, p.n)) {
-    const QtbInt n = smaller(column_step, p.n - j0);
-    for (QtbInt l0 = 0; l0 < p.k; l0 = next_block<one_block>(l0, depth_step, p.k)) {
-      const QtbInt k = smaller(depth_step, p.k - l0), kp = round_up(k, rules.ku);
-      const QtbInt step_a = kp * rules.mr, step_b = kp * rules.nr;
-      if constexpr (!b_given)
-        copy_b(&k, &n, p.b + (b_is_n ? l0 + j0 * p.ldb : j0 + l0 * p.ldb), &p.ldb, buffers.b, &step_b, nullptr);
-      for (QtbInt i0 = 0; i0 < full_m; i0 = next_block<one_block>(i0, row_step, full_m)) {
-        const QtbInt m = smaller(row_step, full_m - i0);
-        T *const c = p.c + i0 + j0 * p.ldc;
-        if constexpr (!a_given)
-          copy_a(&m, &k, p.a + (a_is_n ? i0 + l0 * p.lda : l0 + i0 * p.lda), &p.lda, buffers.a, &step_a, &p.alpha);
-        if constexpr (!a_given && !b_given)
-          run_kernel<T, family>(aligned, m, n, kp, buffers.a, step_a, buffers.b, step_b, c, p.ldc, buffers.stage);
-        else if constexpr (a_given && !b_given)
-          run_kernel<T, family>(aligned, m, n, kp, given_a.panels + l0 * rules.mr, given_a.ldp, buffers.b, step_b, c,
-                                p.ldc, buffers.stage);
-        else if constexpr (!a_given)
-          // The slice of a panel of A that was packed here begins at the panel's start.
-          run_kernel_on_slice<T, family>(aligned, l0, m, n, kp, buffers.a - l0 * rules.mr, step_a, given_b.panels,
-                                         given_b.ldp, c, p.ldc, buffers.stage);
-        else
-          run_kernel_on_slice<T, family>(aligned, l0, m, n, kp, given_a.panels, given_a.ldp, given_b.panels,
-                                         given_b.ldp, c, p.ldc, buffers.stage);
-      }
-      if (full_m < p.m) add_small(p, a_is_n, b_is_n, full_m, j0, n, l0, k);
-    }
+  void run_inner(QTB_INNER_KERNEL_PARAMS(T)) const {
+    if (aligned)
+      inner.aligned(m, n, kp, ap, ldap, bp, ldbp, c, ldc, stage);
+    else
+      inner.any(m, n, kp, ap, ldap, bp, ldbp, c, ldc, stage);
   }
-  free_buffers(buffers);
-}
-template <class T, Family family, bool a_given, bool b_given>
-void add_blocks(const Product<T> &p, GemmBlocks blocks, CallersPanel<T> given_a, CallersPanel<T> given_b) {
-  if constexpr (!a_given && !b_given)
-    if (fit(blocks, p)) return walk_blocks<T, family, false, false, true>(p, blocks, given_a, given_b);
-  walk_blocks<T, family, a_given, b_given, false>(p, blocks, given_a, given_b);
-}
-
-// C += alpha*op(A)*op(B), with B in place: over blocks of the depth and of rows, A packed and all columns at once.
-template <class T, Family family, bool one_block>
-void walk_blocks_in_place(const Product<T> &p, GemmBlocks blocks) {
-  constexpr GemmRules rules = rules_of<T, family>;
-  const Op op_a = read_op<T>(p.transa), op_b = read_op<T>(p.transb);
-  const bool a_is_n = op_a == Op::none, b_is_n = op_b == Op::none, aligned = columns_aligned(p.c, p.ldc);
-  const QtbInt full_m = round_down(p.m, rules.mr);
-  if (full_m == 0) return add_small(p, a_is_n, b_is_n, 0, 0, p.n, 0, p.k);
-  PanelCopy<T> *const copy_a = copies_of<T, family>.a[static_cast<int>(op_a)];
-
-  const GemmBuffers<T> buffers =
-      get_buffers<T, family>(blocks.mb, 0, blocks.kb, InPlaceKernel<T, family>::stage_bytes(largest_depth));
-  if (buffers.allocation == nullptr) return add_small(p, a_is_n, b_is_n, 0, 0, p.n, 0, p.k);
-  for (QtbInt l0 = 0; l0 < p.k; l0 = next_block<one_block>(l0, blocks.kb, p.k)) {
-    const QtbInt k = smaller(blocks.kb, p.k - l0), step_a = round_up(k, rules.ku) * rules.mr;
-    const T *const b = p.b + (b_is_n ? l0 : l0 * p.ldb);
-    for (QtbInt i0 = 0; i0 < full_m; i0 = next_block<one_block>(i0, blocks.mb, full_m)) {
-      const QtbInt m = smaller(blocks.mb, full_m - i0);
-      copy_a(&m, &k, p.a + (a_is_n ? i0 + l0 * p.lda : l0 + i0 * p.lda), &p.lda, buffers.a, &step_a, &p.alpha);
+  void run(const Block<T> &x, bool) const {
+    if constexpr (source_b == Source::packed) {
+      run_inner(x.m, x.n, x.kp, x.a, x.lda, x.b, x.ldb, x.c, x.ldc, x.stage);
+    } else if constexpr (source_b == Source::in_place) {
       if (aligned)
-        InPlaceKernel<T, family>::run_aligned(!b_is_n, m, p.n, k, buffers.a, step_a, b, p.ldb, p.c + i0, p.ldc,
-                                              buffers.stage);
+        in_place.aligned(!b_is_n, x.m, x.n, x.depth, x.a, x.lda, x.b, x.ldb, x.c, x.ldc, x.stage);
       else
-        InPlaceKernel<T, family>::run(!b_is_n, m, p.n, k, buffers.a, step_a, b, p.ldb, p.c + i0, p.ldc, buffers.stage);
+        in_place.any(!b_is_n, x.m, x.n, x.depth, x.a, x.lda, x.b, x.ldb, x.c, x.ldc, x.stage);
+    } else {
+      run_on_slice(x);
     }
-    if (full_m < p.m) add_small(p, a_is_n, b_is_n, full_m, 0, p.n, l0, k);
   }
-  free_buffers(buffers);
+  void run_on_slice(const Block<T> &x) const {
+    constexpr QtbInt nr = rules_of<T, family>.nr;
+    const QtbInt full = round_down(x.n, nr);
+    if (full > 0) run_inner(x.m, full, x.kp, x.a, x.lda, x.b + x.l0_of_b * nr, x.ldb, x.c, x.ldc, x.stage);
+    const T *bp = x.b + full / nr * x.ldb;
+    for (QtbInt j0 = full, w; j0 < x.n; j0 += w, bp += x.ldb) {
+      w = panel_width(nr, x.n - j0);
+      run_inner(x.m, w, x.kp, x.a, x.lda, bp + x.l0_of_b * w, x.ldb, x.c + j0 * x.ldc, x.ldc, x.stage);
+    }
+  }
+};
+
+// C := beta*C + alpha*op(A)*op(B) by the walk of a family; beta is 1 where C is scaled. Where one block holds all of a
+// problem the walk is one without loops, unless panels come from a caller, who cuts large problems only.
+template <class T, Family family, Source source_a, Source source_b, class Kernels = AddingKernels<T, family, source_b>>
+void add_blocks(const Product<T> &p, const GemmBlocks &blocks, const T *beta, CallersPanel<T> given_a = {},
+                CallersPanel<T> given_b = {}) {
+  if constexpr (source_a != Source::given && source_b != Source::given)
+    if (p.m <= blocks.mb && p.n <= blocks.nb && p.k <= blocks.kb)
+      return walk_blocks<T, family, source_a, source_b, Kernels, true>(p, blocks, beta, given_a, given_b);
+  walk_blocks<T, family, source_a, source_b, Kernels, false>(p, blocks, beta, given_a, given_b);
 }
+
+// A whole product by a family whose kernels add.
+template <class T, Family family, Source source_a, Source source_b>
+void multiply(const Product<T> &p, const T *beta, CallersPanel<T> given_a = {}, CallersPanel<T> given_b = {}) {
+  if (begin_product<T, family, form_of(source_a, source_b)>(p, beta))
+    add_blocks<T, family, source_a, source_b>(p, body_blocks<T, family, source_b>(p), &one<T>, given_a, given_b);
+}
+
+// Bytes of the slice of B that a block of a family holds at most.
+constexpr QtbInt slice_bytes(const GemmRules &rules, QtbInt width, QtbInt n, QtbInt k) {
+  return smaller(k, largest_depth) * smaller(n, rules.nb.cap) * width;
+}
+
+// The same with B in place where the family reads so small a slice there.
 template <class T, Family family>
-void add_blocks_in_place(const Product<T> &p, GemmBlocks blocks) {
-  blocks.nb = p.n;
-  if (fit(blocks, p)) return walk_blocks_in_place<T, family, true>(p, blocks);
-  walk_blocks_in_place<T, family, false>(p, blocks);
+void multiply_by_slice(const Product<T> &p, const T *beta) {
+  constexpr GemmRules rules = rules_of<T, family>;
+  if constexpr (rules.in_place.most_bytes > 0)
+    if (slice_bytes(rules, sizeof(T), p.n, p.k) <= rules.in_place.most_bytes)
+      return multiply<T, family, Source::packed, Source::in_place>(p, beta);
+  multiply<T, family, Source::packed, Source::packed>(p, beta);
+}
+
+// ---- The procedures of a family ----
+
+template <class T, Family family = Family::base>
+QTB_FUNCTION(gemm, T, gemm_by_slice) {
+  multiply_by_slice<T, family>(product(transa, transb, m, n, k, alpha, a, lda, b, ldb, c, ldc), beta);
+}
+
+template <class T, Family family = Family::base>
+QTB_FUNCTION(gemm, T, gemm_in_place) {
+  multiply<T, family, Source::packed, Source::in_place>(product(transa, transb, m, n, k, alpha, a, lda, b, ldb, c, ldc),
+                                                        beta);
+}
+
+template <class T, Family family = Family::base>
+QTB_FUNCTION(gemm_bpacked, T, gemm_of_packed_b) {
+  multiply<T, family, Source::packed, Source::given>(product(transa, transb, m, n, k, alpha, a, lda, b, ldb, c, ldc),
+                                                     beta, {}, {bp, *ldbp});
+}
+
+template <class T, Family family = Family::base>
+QTB_FUNCTION(gemm_apacked, T, gemm_of_packed_a) {
+  multiply<T, family, Source::given, Source::packed>(product(transa, transb, m, n, k, alpha, a, lda, b, ldb, c, ldc),
+                                                     beta, {ap, *ldap});
+}
+
+template <class T, Family family = Family::base>
+QTB_FUNCTION(gemm_packed, T, gemm_of_packed) {
+  multiply<T, family, Source::given, Source::given>(product(transa, transb, m, n, k, alpha, a, lda, b, ldb, c, ldc),
+                                                    beta, {ap, *ldap}, {bp, *ldbp});
 }
 
 }  // namespace

@@ -1,14 +1,12 @@
-// The inner kernels of GEMM, as bodies call them.
+// The inner kernels of GEMM by tier, type and family, as bodies call them (kernels.def has the list).
 //
-// InnerKernel<T, family>::run: C(0:m, 0:n) += Ap*Bp. m is a multiple of mr, kp of ku, n is any; ap and bp point to
-// micro-panels that begin ldap and ldbp elements apart (tiles.h has their format; the width of each micro-panel of B is
-// panel_width of the columns that are left). run_aligned does the same where C lies on a 16-byte boundary and ldc is a
-// multiple of 16 bytes. stage holds stage_bytes(kp) bytes on a 64-byte boundary, for the kernel's own use.
+// inner_kernel<T, family>: C(0:m, 0:n) += Ap*Bp by any, and by aligned where C lies on a 16-byte boundary and ldc is a
+// multiple of 16 bytes. m is a multiple of mr, kp of ku, n is any; ap and bp point to micro-panels that begin ldap and
+// ldbp elements apart (tiles.h has their format; the width of each micro-panel of B is panel_width of the columns that
+// are left). stage holds kp*stage_per_k bytes on a 64-byte boundary, for the kernel's own use.
 //
-// InPlaceKernel<T, family>::run: C(0:m, 0:n) += Ap*op(B), where b is the first element of the depth x n block of op(B)
-// as it lies in memory. The panel of A is filled up with zeros as ever.
-//
-// Both take the procedures of kernels.def.
+// in_place_kernel<T, family>: C(0:m, 0:n) += Ap*op(B), where b is the first element of the depth x n block of op(B) as
+// it lies in memory. The panel of A is filled up with zeros as ever; stage_per_k is per step of the depth filled up.
 #pragma once
 
 #include "blas/kernels/element.h"
@@ -39,78 +37,57 @@ using InnerProcedure = void(QTB_INNER_KERNEL_PARAMS(T));
 template <class T>
 using InPlaceProcedure = void(QTB_IN_PLACE_KERNEL_PARAMS(T));
 
-template <class T, InnerProcedure<T> &any, InnerProcedure<T> &aligned, QtbInt stage_per_k>
-struct TunedKernel {
-  static void run(QTB_INNER_KERNEL_PARAMS(T)) { any(m, n, kp, ap, ldap, bp, ldbp, c, ldc, stage); }
-  static void run_aligned(QTB_INNER_KERNEL_PARAMS(T)) { aligned(m, n, kp, ap, ldap, bp, ldbp, c, ldc, stage); }
-  static constexpr QtbInt stage_bytes(QtbInt kp) { return stage_per_k * kp; }
+template <class Procedure>
+struct KernelRecord {
+  Procedure *any, *aligned;
+  QtbInt stage_per_k;
 };
 
-// The kernels by tier: every tier's build sees the whole list and takes its own.
+// Every tier's build sees the whole list and takes its own.
 template <ProcessorTier tier, class T, Family family>
-struct KernelOf;
-#define QTB_INNER_KERNEL(tier, T, family, any, aligned, stage) \
-  template <>                                                  \
-  struct KernelOf<tier_##tier, T, Family::family>              \
-      : TunedKernel<T, qtb_blas_##tier##_##any, qtb_blas_##tier##_##aligned, stage> {};
+constexpr KernelRecord<InnerProcedure<T>> inner_kernel_in{};
+#define QTB_INNER_KERNEL(tier, T, family, any, aligned, stage)                                  \
+  template <>                                                                                   \
+  constexpr KernelRecord<InnerProcedure<T>> inner_kernel_in<tier_##tier, T, Family::family> = { \
+      qtb_blas_##tier##_##any, qtb_blas_##tier##_##aligned, stage};
 #include "blas/kernels/level3/gemm/kernels.def"
 
 template <class T, Family family>
-struct InnerKernel : KernelOf<this_tier, T, family> {};
+constexpr KernelRecord<InnerProcedure<T>> inner_kernel = inner_kernel_in<this_tier, T, family>;
 
-// Without a kernel of its own for B in place, a family packs one micro-panel at a time into the stage, ahead of what
-// the inner kernel has there. One of its own has the stage of the inner kernel.
-template <class T, Family family>
-struct StagedKernel {
-  static constexpr QtbInt stage_bytes(QtbInt kp) {
-    return kp * rules_of<T, family>.nr * static_cast<QtbInt>(sizeof(T)) + InnerKernel<T, family>::stage_bytes(kp);
+// A family without a kernel of its own for B in place: one micro-panel at a time is packed into the stage, ahead of
+// what the inner kernel has there.
+template <class T, Family family, bool aligned>
+void run_staged(QTB_IN_PLACE_KERNEL_PARAMS(T)) {
+  constexpr GemmRules rules = rules_of<T, family>;
+  constexpr KernelRecord<InnerProcedure<T>> kernel = inner_kernel<T, family>;
+  const QtbInt kp = round_up(depth, rules.ku), ldbp = kp * rules.nr;
+  T *const inner_stage = stage + ldbp;
+  const auto multiply = [&](QtbInt j0, QtbInt w) __attribute__((always_inline)) {
+    copies_of<T, family>.b[transb ? 1 : 0](&depth, &w, transb ? b + j0 : b + j0 * ldb, &ldb, stage, &ldbp, nullptr);
+    (aligned ? kernel.aligned : kernel.any)(m, w, kp, ap, ldap, stage, ldbp, c + j0 * ldc, ldc, inner_stage);
+  };
+  // A single micro-panel, as small products have it, is spared what goes ahead of the loop.
+  if (n == panel_width(rules.nr, n)) return multiply(0, n);
+  for (QtbInt j0 = 0, w; j0 < n; j0 += w) {
+    w = panel_width(rules.nr, n - j0);
+    multiply(j0, w);
   }
-  template <bool aligned>
-  static void run_staged(QTB_IN_PLACE_KERNEL_PARAMS(T)) {
-    constexpr GemmRules rules = rules_of<T, family>;
-    const QtbInt kp = round_up(depth, rules.ku), ldbp = kp * rules.nr;
-    T *const inner_stage = stage + ldbp;
-    const auto multiply = [&](QtbInt j0, QtbInt w) __attribute__((always_inline)) {
-      copies_of<T, family>.b[transb ? 1 : 0](&depth, &w, transb ? b + j0 : b + j0 * ldb, &ldb, stage, &ldbp, nullptr);
-      if constexpr (aligned)
-        InnerKernel<T, family>::run_aligned(m, w, kp, ap, ldap, stage, ldbp, c + j0 * ldc, ldc, inner_stage);
-      else
-        InnerKernel<T, family>::run(m, w, kp, ap, ldap, stage, ldbp, c + j0 * ldc, ldc, inner_stage);
-    };
-    // A single micro-panel, as small products have it, is spared what goes ahead of the loop.
-    if (n == panel_width(rules.nr, n)) return multiply(0, n);
-    for (QtbInt j0 = 0, w; j0 < n; j0 += w) {
-      w = panel_width(rules.nr, n - j0);
-      multiply(j0, w);
-    }
-  }
-  static void run(QTB_IN_PLACE_KERNEL_PARAMS(T)) {
-    run_staged<false>(transb, m, n, depth, ap, ldap, b, ldb, c, ldc, stage);
-  }
-  static void run_aligned(QTB_IN_PLACE_KERNEL_PARAMS(T)) {
-    run_staged<true>(transb, m, n, depth, ap, ldap, b, ldb, c, ldc, stage);
-  }
-};
-
-template <class T, Family family, InPlaceProcedure<T> &any, InPlaceProcedure<T> &aligned>
-struct TunedInPlaceKernel {
-  static constexpr QtbInt stage_bytes(QtbInt kp) { return InnerKernel<T, family>::stage_bytes(kp); }
-  static void run(QTB_IN_PLACE_KERNEL_PARAMS(T)) { any(transb, m, n, depth, ap, ldap, b, ldb, c, ldc, stage); }
-  static void run_aligned(QTB_IN_PLACE_KERNEL_PARAMS(T)) {
-    aligned(transb, m, n, depth, ap, ldap, b, ldb, c, ldc, stage);
-  }
-};
+}
 
 template <ProcessorTier tier, class T, Family family>
-struct InPlaceKernelOf : StagedKernel<T, family> {};
-#define QTB_IN_PLACE_KERNEL(tier, T, family, any, aligned) \
-  template <>                                              \
-  struct InPlaceKernelOf<tier_##tier, T, Family::family>   \
-      : TunedInPlaceKernel<T, Family::family, qtb_blas_##tier##_##any, qtb_blas_##tier##_##aligned> {};
+constexpr KernelRecord<InPlaceProcedure<T>> in_place_kernel_in = {
+    run_staged<T, family, false>, run_staged<T, family, true>,
+    rules_of<T, family>.nr *static_cast<QtbInt>(sizeof(T)) + inner_kernel<T, family>.stage_per_k};
+#define QTB_IN_PLACE_KERNEL(tier, T, family, any, aligned)                                           \
+  template <>                                                                                        \
+  constexpr KernelRecord<InPlaceProcedure<T>> in_place_kernel_in<tier_##tier, T, Family::family> = { \
+      qtb_blas_##tier##_##any, qtb_blas_##tier##_##aligned,                                          \
+      inner_kernel_in<tier_##tier, T, Family::family>.stage_per_k};
 #include "blas/kernels/level3/gemm/kernels.def"
 
 template <class T, Family family>
-struct InPlaceKernel : InPlaceKernelOf<this_tier, T, family> {};
+constexpr KernelRecord<InPlaceProcedure<T>> in_place_kernel = in_place_kernel_in<this_tier, T, family>;
 
 }  // namespace
 }  // namespace qtb::QTB_TIER

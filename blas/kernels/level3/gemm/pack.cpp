@@ -1,36 +1,8 @@
-// gemm_acopy, gemm_bcopy: packing of a block of op(A) or op(B) into the panel of its GEMM family (pack.h).
-//
-// rows x cols is the block of op(A) or op(B), src its first element as it lies in memory, ldp the step of the
-// micro-panels. A B copy does not read alpha. Fewer than one row or column: nothing is written.
-#include "blas/kernels/level3/gemm/pack.h"
-
-#include "blas/kernels/level3/gemm/copies.h"
+// The copy routines of the base families.
+#include "blas/kernels/level3/gemm/define_copies.h"
 
 namespace qtb::QTB_TIER {
-namespace {
 
-template <class T, Op op, Family family>
-QTB_FUNCTION(panel_copy, T, copy_a) {
-  pack_a<T, op, family>(*rows, *cols, src, *ld, dst, *ldp, *alpha);
-}
-
-template <class T, Op op, Family family>
-void copy_b(const QtbInt *rows, const QtbInt *cols, const T *src, const QtbInt *ld, T *dst, const QtbInt *ldp,
-            const T *) {
-  pack_b<T, op, family>(*rows, *cols, src, *ld, dst, *ldp);
-}
-
-}  // namespace
-
-#define QTB_DEFINE_COPIES_NT(name, T, family)                                           \
-  QTB_KERNEL(name##_acopy_n, panel_copy, T, (copy_a<T, Op::none, Family::family>))      \
-  QTB_KERNEL(name##_acopy_t, panel_copy, T, (copy_a<T, Op::transpose, Family::family>)) \
-  QTB_KERNEL(name##_bcopy_n, panel_copy, T, (copy_b<T, Op::none, Family::family>))      \
-  QTB_KERNEL(name##_bcopy_t, panel_copy, T, (copy_b<T, Op::transpose, Family::family>))
-#define QTB_DEFINE_COPIES_NTC(name, T, family)                                          \
-  QTB_DEFINE_COPIES_NT(name, T, family)                                                 \
-  QTB_KERNEL(name##_acopy_c, panel_copy, T, (copy_a<T, Op::conjugate, Family::family>)) \
-  QTB_KERNEL(name##_bcopy_c, panel_copy, T, (copy_b<T, Op::conjugate, Family::family>))
-QTB_COPY_FAMILIES(QTB_DEFINE_COPIES_NT, QTB_DEFINE_COPIES_NTC)
+QTB_COPIES_BASE
 
 }  // namespace qtb::QTB_TIER

@@ -9,7 +9,7 @@
 #pragma once
 
 #include "blas/kernels/element.h"
-#include "blas/kernels/level3/gemm/tiles.h"
+#include "blas/kernels/level3/gemm/family.h"
 #include "blas/kernels/simd/repeat.h"
 
 namespace qtb::QTB_TIER {
@@ -202,11 +202,6 @@ void pack_panels(QtbInt count, QtbInt depth, QtbInt padded, const T *src, QtbInt
   }
 }
 
-// Whether a panel of A takes the rows beyond a multiple of mr, in a last micro-panel filled up with zeros: its kernels
-// then store the rows that there are.
-template <class T>
-constexpr bool takes_all_rows = this_tier == tier_sse3 &&kind_of<T> == 'd';
-
 // So many rows, fewer than mr; element (i, l) at src[i*row + l*step].
 template <class T>
 void pack_last_rows(QtbInt rows, QtbInt mr, QtbInt depth, QtbInt padded, const T *src, QtbInt row, QtbInt step, T *dst,
@@ -216,8 +211,8 @@ void pack_last_rows(QtbInt rows, QtbInt mr, QtbInt depth, QtbInt padded, const T
     for (QtbInt i = 0; i < rows; i++) dst[l * mr + i] = alpha * load_single(src + i * row + l * step);
 }
 
-// The A panel of a family from a rows x depth block of op(A): alpha folded in; rows beyond a multiple of mr are left
-// out, where the panel does not take all.
+// The A panel of a family from a rows x depth block of op(A): alpha folded in. Rows beyond a multiple of mr are left
+// out, but where the kernels take edges: a last micro-panel then has them.
 template <class T, Op op, Family family>
 void pack_a(QtbInt rows, QtbInt depth, const T *src, QtbInt ld, T *dst, QtbInt ldp, T alpha) {
   constexpr GemmRules rules = rules_of<T, family>;
@@ -228,7 +223,7 @@ void pack_a(QtbInt rows, QtbInt depth, const T *src, QtbInt ld, T *dst, QtbInt l
     pack_panels<T, mr, mr, false>(whole, depth, padded, src, ld, dst, ldp, ScaledConjugate<T>(alpha));
   else
     pack_panels<T, mr, mr, op == Op::none>(whole, depth, padded, src, ld, dst, ldp, Scaled<T>(alpha));
-  if constexpr (takes_all_rows<T>) {
+  if constexpr (rules.walk.kernels_take_edges) {
     const QtbInt row = op == Op::none ? 1 : ld, step = op == Op::none ? ld : 1;
     if (whole < rows)
       pack_last_rows(rows - whole, rules.mr, depth, padded, src + whole * row, row, step, dst + whole / rules.mr * ldp,
@@ -236,12 +231,12 @@ void pack_a(QtbInt rows, QtbInt depth, const T *src, QtbInt ld, T *dst, QtbInt l
   }
 }
 
-// The B panel of a family from a depth x columns block of op(B). A tile of 12 columns leaves out fewer than 4.
+// The B panel of a family from a depth x columns block of op(B). Fewer columns than its walk packs are left out.
 template <class T, Op op, Family family>
 void pack_b(QtbInt depth, QtbInt columns, const T *src, QtbInt ld, T *dst, QtbInt ldp) {
   constexpr GemmRules rules = rules_of<T, family>;
   constexpr int nr = static_cast<int>(rules.nr);
-  constexpr QtbInt least = nr > 8 ? 4 : 1;
+  constexpr QtbInt least = rules.walk.columns;
   if (depth <= 0 || columns <= 0) return;
   const QtbInt padded = round_up(depth, rules.ku);
   if constexpr (op == Op::conjugate)

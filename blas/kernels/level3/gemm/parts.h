@@ -1,18 +1,19 @@
-// What surrounds the blocked loops of this tier's GEMM bodies, by type: the small path and the scaling of C.
+// What surrounds the walk of this tier's GEMM bodies, by type: the small path and the scaling of C.
 //
 // small_path<T>: C := alpha*op(A)*op(B) + beta*C with the arguments of gemm, without packing (small.cpp).
 // scale_columns<T>: C := beta*C (scale_c.cpp).
 #pragma once
 
-#include "blas/kernels/level3/gemm/tiles.h"
+#include "blas/kernels/kernel.h"
 
 namespace qtb::QTB_TIER {
 
 #define QTB_PARTS(X) X(s, float) X(d, double) X(c, cfloat) X(z, cdouble)
-#define QTB_DECLARE_PARTS(t, T)                                                 \
-  extern "C" QTB_HIDDEN QTB_FUNCTION(gemm, T, QTB_TIER_NAME(x##t##gemm_small)); \
-  extern "C" QTB_HIDDEN QTB_FUNCTION(scale_c, T, QTB_TIER_NAME(x##t##gemm_scale_c));
-QTB_PARTS(QTB_DECLARE_PARTS)
+
+// No slot has the small path.
+#define QTB_DECLARE_SMALL(t, T) extern "C" QTB_HIDDEN QTB_FUNCTION(gemm, T, QTB_TIER_NAME(x##t##gemm_small));
+QTB_PARTS(QTB_DECLARE_SMALL)
+#undef QTB_DECLARE_SMALL
 
 namespace {
 
@@ -30,6 +31,7 @@ constexpr ScaleProcedure<T> *scale_columns = nullptr;
   template <>                                                                  \
   constexpr ScaleProcedure<T> *scale_columns<T> = QTB_TIER_NAME(x##t##gemm_scale_c);
 QTB_PARTS(QTB_NAME_PARTS)
+#undef QTB_NAME_PARTS
 
 }  // namespace
 }  // namespace qtb::QTB_TIER

@@ -22,7 +22,7 @@ struct Finish {
   template <class Load>
   Vec<T> operator()(Vec<T> sum, Load load_c) const {
     Vec<T> v = alpha.times(sum);
-    if (!reads_c) return v;
+    if (!reads_c) return add(zero<T>(), v);  // what is added to a C of zeros: never -0
     const Vec<T> old = load_c();
     return add(scales_c ? beta.times(old) : old, v);
   }

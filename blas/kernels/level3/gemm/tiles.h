@@ -1,16 +1,20 @@
-// The shapes of the GEMM families: register tiles, block sizes and the packed format that follows from them.
+// The GEMM families of all tiers: register tiles, block sizes, the packed format that follows from them, and how a body
+// walks its blocks.
 //
 // A family packs mb x kb of op(A) and kb x nb of op(B) at a time, in micro-panels of mr rows and nr columns, k the slow
 // index. The depth of a panel is filled up with zeros to a multiple of ku. Sizes are elements, a complex one counting
 // as one. A tier has one base family per type; ssse3 has a second one for processors with SSE4.1, and def two for
 // double precision on one processor family.
 //
-// What stands here is data and arithmetic, the same in every tier's build, so that a row of another tier can be read.
+// What stands here is data and arithmetic, the same in every tier's build and outside of them: family.h names the rows
+// of the tier that is built.
 #pragma once
 
-#include "blas/kernels/kernel.h"
+#include "blas/tiers.h"
+#include "blas/types.h"
+#include "service/cache.h"
 
-namespace qtb::QTB_TIER {
+namespace qtb::tiles {
 namespace {
 
 struct GemmBlocks {
@@ -54,6 +58,34 @@ struct ColumnRule {
   QtbInt floor, cap, multiple = 1;
 };
 
+// What a walk over blocks does beside packing and multiplying.
+struct WalkRule {
+  bool kernels_apply_beta = false;  // those of the first block of depth; otherwise C is scaled ahead of the walk
+  bool kernels_take_edges = false;  // rows beyond a multiple of mr, packed with zeros; otherwise the small path does
+  QtbInt columns = 1;               // packed in multiples of so many; the small path takes the rest, at the end
+  bool callers_blocks_stay = true;  // a size that the caller of gemm_blocks gives
+};
+
+// What a body asks of the memory service (regions.h).
+enum class Request {
+  largest,    // room for the largest blocks, so that a thread which repeats its requests gets the same memory; bytes:
+              // from the end of A to where B may begin
+  of_blocks,  // room for the blocks at hand, with a vector of 32 bytes for each of four columns per step of depth;
+              // bytes: from there to where B may begin
+  tight       // room for the blocks at hand, A beyond the start of the allocation; bytes: what the boundaries cost
+};
+struct BufferRule {
+  Request request;
+  QtbInt bytes;
+};
+
+// A serial body reads B in place where a slice of B has at most so many bytes: it then stays in a cache by itself. Its
+// blocks of A have rows of their own where a rule says so.
+struct InPlaceRule {
+  QtbInt most_bytes = 0;
+  RowRule mb = {Rows::fixed, 0};
+};
+
 struct GemmRules {
   char kind;
   unsigned tiers;
@@ -62,39 +94,49 @@ struct GemmRules {
   RowRule mb;
   ColumnRule nb;
   DepthRule kb;
+  WalkRule walk;
+  BufferRule buffers;
+  InPlaceRule in_place;
 };
-
-// A cache level of at most so many bytes is small; a level that the processor does not report is, too, unless it
-// reports none at all.
-constexpr std::uint32_t small_l2_bytes = 3145728, small_l3_bytes = 4194304;
 
 // clang-format off
 constexpr DepthRule depth_halved{Depth::halved, 256}, depth_stepped{Depth::stepped, 256};
 
 constexpr unsigned tiers_from_sse42 = tier_set::SSE42 | tier_set::AVX, tiers_to_sse3 = tier_set::DEF | tier_set::SSE3;
 
+constexpr WalkRule adding{}, folding{.kernels_apply_beta = true};
+
+// What lies between A and B has room for a micro-panel of B, or for one whose elements are doubled.
+constexpr BufferRule plain_stage{Request::largest, 8960}, doubled_stage{Request::largest, 17152};
+// Four pages and what keeps the stage apart from A; some room to spare.
+constexpr BufferRule tight{Request::tight, 4 * 4096 + 1280}, tight_spare{Request::tight, 18176};
+
+constexpr QtbInt slice_256k = 262144, slice_2m = 2097152;
+constexpr InPlaceRule never{};
+constexpr InPlaceRule slice_2m_sse41{slice_2m, {Rows::small_l2, 600, 448}};
+
 constexpr GemmRules gemm_rules[] = {
-  // type, tiers, family                          mr nr ku  mb                              nb             kb
-  {'d', tier_set::AVX,    Family::base,            8, 4, 4, {Rows::fixed, 512},             {4, 10000},    depth_halved},
-  {'d', tier_set::SSE42,  Family::base,            2, 8, 4, {Rows::small_l3, 640, 384},     {8, 5000, 8},  depth_halved},
-  {'d', tier_set::SSSE3,  Family::base,            4, 4, 4, {Rows::fixed, 512},             {4, 10000},    depth_halved},
-  {'d', tier_set::SSSE3,  Family::sse41,           4, 4, 4, {Rows::small_l2, 1000, 448},    {4, 10000, 4}, depth_halved},
-  {'d', tier_set::SSE3,   Family::base,            4, 4, 4, {Rows::flat_or_huge, 480, 512}, {0, 2000},     {Depth::halved_down, 112}},
-  {'d', tier_set::DEF,    Family::base,            2, 12, 4, {Rows::flat, 512},             {0, 4992},     {Depth::halved_down, 128}},
-  {'d', tier_set::DEF,    Family::def_a,           4, 4, 4, {Rows::area_of_kb, 61440, 8},   {4, 5000},     depth_halved},
-  {'d', tier_set::DEF,    Family::def_b,           4, 4, 4, {Rows::capped, 128, 4},         {4, 384},      {Depth::whole, 256}},
-  {'s', tiers_from_sse42, Family::base,            4, 8, 4, {Rows::small_l3, 1280, 768},    {8, 5000, 8},  depth_halved},
-  {'s', tier_set::SSSE3,  Family::base,            8, 4, 4, {Rows::fixed, 1024},            {4, 5000},     depth_halved},
-  {'s', tier_set::SSSE3,  Family::sse41,           8, 4, 4, {Rows::small_l2, 2000, 1024},   {4, 5000, 4},  depth_halved},
-  {'s', tiers_to_sse3,    Family::base,            8, 4, 4, {Rows::fixed, 640},             {0, 2000},     {Depth::fixed, 112}},
-  {'c', tiers_from_sse42, Family::base,            2, 4, 4, {Rows::small_l3, 512, 320},     {4, 5000, 4},  depth_stepped},
-  {'c', tier_set::SSSE3,  Family::base,            4, 2, 2, {Rows::area_of_k, 112640, 4},   {2, 5000},     {Depth::dividing, 256}},
-  {'c', tier_set::SSSE3,  Family::sse41,           4, 2, 4, {Rows::small_l2, 1000, 448},    {2, 5000, 2},  depth_stepped},
-  {'c', tiers_to_sse3,    Family::base,            4, 4, 4, {Rows::fixed, 320},             {0, 2000},     {Depth::fixed, 64}},
-  {'z', tiers_from_sse42, Family::base,            1, 4, 4, {Rows::small_l3, 256, 160},     {4, 2000, 4},  depth_stepped},
-  {'z', tier_set::SSSE3,  Family::base,            2, 2, 2, {Rows::area_of_k, 56320, 2},    {2, 2000},     {Depth::dividing, 224}},
-  {'z', tier_set::SSSE3,  Family::sse41,           2, 2, 4, {Rows::small_l2, 512, 256},     {2, 5000, 2},  depth_stepped},
-  {'z', tiers_to_sse3,    Family::base,            2, 4, 4, {Rows::fixed, 320},             {0, 2000},     {Depth::fixed, 64}},
+  // type, tiers, family                          mr nr ku  mb                              nb             kb            walk                                                           buffers                    B in place
+  {'d', tier_set::AVX,    Family::base,            8, 4, 4, {Rows::fixed, 512},             {4, 10000},    depth_halved, {.callers_blocks_stay = false},                                {Request::of_blocks, 768}, never},
+  {'d', tier_set::SSE42,  Family::base,            2, 8, 4, {Rows::small_l3, 640, 384},     {8, 5000, 8},  depth_halved, adding,                                                        doubled_stage,             never},
+  {'d', tier_set::SSSE3,  Family::base,            4, 4, 4, {Rows::fixed, 512},             {4, 10000},    depth_halved, adding,                                                        doubled_stage,             {slice_2m}},
+  {'d', tier_set::SSSE3,  Family::sse41,           4, 4, 4, {Rows::small_l2, 1000, 448},    {4, 10000, 4}, depth_halved, adding,                                                        plain_stage,               slice_2m_sse41},
+  {'d', tier_set::SSE3,   Family::base,            4, 4, 4, {Rows::flat_or_huge, 480, 512}, {0, 2000},     {Depth::halved_down, 112}, {.kernels_apply_beta = true, .kernels_take_edges = true}, tight_spare,      never},
+  {'d', tier_set::DEF,    Family::base,            2, 12, 4, {Rows::flat, 512},             {0, 4992},     {Depth::halved_down, 128}, {.columns = 4},                                   tight_spare,               never},
+  {'d', tier_set::DEF,    Family::def_a,           4, 4, 4, {Rows::area_of_kb, 61440, 8},   {4, 5000},     depth_halved, adding,                                                        doubled_stage,             {slice_256k}},
+  {'d', tier_set::DEF,    Family::def_b,           4, 4, 4, {Rows::capped, 128, 4},         {4, 384},      {Depth::whole, 256}, adding,                                                 doubled_stage,             never},
+  {'s', tiers_from_sse42, Family::base,            4, 8, 4, {Rows::small_l3, 1280, 768},    {8, 5000, 8},  depth_halved, adding,                                                        doubled_stage,             {slice_256k}},
+  {'s', tier_set::SSSE3,  Family::base,            8, 4, 4, {Rows::fixed, 1024},            {4, 5000},     depth_halved, adding,                                                        doubled_stage,             {slice_2m}},
+  {'s', tier_set::SSSE3,  Family::sse41,           8, 4, 4, {Rows::small_l2, 2000, 1024},   {4, 5000, 4},  depth_halved, adding,                                                        plain_stage,               slice_2m_sse41},
+  {'s', tiers_to_sse3,    Family::base,            8, 4, 4, {Rows::fixed, 640},             {0, 2000},     {Depth::fixed, 112}, folding,                                                tight,                     never},
+  {'c', tiers_from_sse42, Family::base,            2, 4, 4, {Rows::small_l3, 512, 320},     {4, 5000, 4},  depth_stepped, adding,                                                       doubled_stage,             never},
+  {'c', tier_set::SSSE3,  Family::base,            4, 2, 2, {Rows::area_of_k, 112640, 4},   {2, 5000},     {Depth::dividing, 256}, adding,                                              doubled_stage,             never},
+  {'c', tier_set::SSSE3,  Family::sse41,           4, 2, 4, {Rows::small_l2, 1000, 448},    {2, 5000, 2},  depth_stepped, adding,                                                       plain_stage,               never},
+  {'c', tiers_to_sse3,    Family::base,            4, 4, 4, {Rows::fixed, 320},             {0, 2000},     {Depth::fixed, 64}, folding,                                                 tight,                     never},
+  {'z', tiers_from_sse42, Family::base,            1, 4, 4, {Rows::small_l3, 256, 160},     {4, 2000, 4},  depth_stepped, adding,                                                       doubled_stage,             never},
+  {'z', tier_set::SSSE3,  Family::base,            2, 2, 2, {Rows::area_of_k, 56320, 2},    {2, 2000},     {Depth::dividing, 224}, adding,                                              doubled_stage,             never},
+  {'z', tier_set::SSSE3,  Family::sse41,           2, 2, 4, {Rows::small_l2, 512, 256},     {2, 5000, 2},  depth_stepped, adding,                                                       plain_stage,               never},
+  {'z', tiers_to_sse3,    Family::base,            2, 4, 4, {Rows::fixed, 320},             {0, 2000},     {Depth::fixed, 64}, folding,                                                 tight,                     never},
 };
 // clang-format on
 
@@ -105,13 +147,15 @@ consteval GemmRules find_rules(char kind, ProcessorTier tier, Family family) {
   __builtin_unreachable();
 }
 
+// The rules of a walk with B in place, which may have a row rule of its own.
+consteval GemmRules with_rows_in_place(GemmRules rules, bool in_place) {
+  if (in_place && rules.in_place.mb.value != 0) rules.mb = rules.in_place.mb;
+  return rules;
+}
+
 template <class T>
 constexpr char kind_of = is_complex<T> ? (sizeof(Real<T>) == sizeof(float) ? 'c' : 'z')
                                        : (sizeof(T) == sizeof(float) ? 's' : 'd');
-
-// The rules of this build's tier.
-template <class T, Family family = Family::base>
-constexpr GemmRules rules_of = find_rules(kind_of<T>, this_tier, family);
 
 constexpr QtbInt smaller(QtbInt a, QtbInt b) { return a < b ? a : b; }
 constexpr QtbInt larger(QtbInt a, QtbInt b) { return a > b ? a : b; }
@@ -145,28 +189,31 @@ constexpr QtbInt block_depth(DepthRule kb, QtbInt k) {
   __builtin_unreachable();
 }
 
+// The depth of the first of the blocks that are kb deep.
+constexpr QtbInt first_depth(DepthRule rule, QtbInt kb, QtbInt k) {
+  const QtbInt remainder = rule.rule == Depth::fixed ? k % kb : 0;
+  return remainder != 0 ? remainder : smaller(kb, k);
+}
+
 // Many rows and columns over a small depth: with a depth this small, a block of A may have so many rows.
 constexpr bool is_flat(QtbInt m, QtbInt n, QtbInt k, QtbInt largest_k) { return k <= largest_k && m + n >= 10000; }
 constexpr QtbInt flat_rows(QtbInt depth) { return depth <= 16 ? 1536 : depth <= 32 ? 1024 : depth <= 64 ? 768 : 512; }
 // All three large, and m + n so large that larger blocks pay.
 constexpr bool is_huge(QtbInt m, QtbInt n, QtbInt k) { return m >= 4000 && n >= 4000 && k >= 4000 && m + n >= 12000; }
 
-// caches is the table of service/cache.h.
-inline bool level_is_small(const std::uint32_t *caches, int level, std::uint32_t bytes) {
-  return caches[0] != 0 && caches[level] <= bytes;
-}
-
 constexpr bool reads_caches(const GemmRules &rules) {
   return rules.mb.rule == Rows::small_l2 || rules.mb.rule == Rows::small_l3;
 }
 
-inline QtbInt block_rows(const GemmRules &rules, QtbInt m, QtbInt n, QtbInt k, QtbInt kb, const std::uint32_t *caches) {
+// caches is the table of service/cache.h.
+constexpr QtbInt block_rows(const GemmRules &rules, QtbInt m, QtbInt n, QtbInt k, QtbInt kb,
+                            const std::uint32_t *caches) {
   const QtbInt value = rules.mb.value, reduced = rules.mb.reduced_or_step, step = rules.mb.reduced_or_step;
   const QtbInt twice = 2 * rules.kb.value;
   switch (rules.mb.rule) {
     case Rows::fixed: return value;
-    case Rows::small_l2: return level_is_small(caches, 2, small_l2_bytes) ? reduced : value;
-    case Rows::small_l3: return level_is_small(caches, 3, small_l3_bytes) ? reduced : value;
+    case Rows::small_l2: return cache_is_small(caches, cache_second_size, small_second_cache_bytes) ? reduced : value;
+    case Rows::small_l3: return cache_is_small(caches, cache_third_size, small_third_cache_bytes) ? reduced : value;
     case Rows::area_of_k:
       return smaller(larger(m, rules.mr),
                      round_down(value / smaller(kb, larger(round_up(k, rules.ku), rules.ku)), step));
@@ -180,15 +227,15 @@ inline QtbInt block_rows(const GemmRules &rules, QtbInt m, QtbInt n, QtbInt k, Q
   __builtin_unreachable();
 }
 
-inline QtbInt block_columns(const GemmRules &rules, QtbInt m, QtbInt n, QtbInt k) {
+constexpr QtbInt block_columns(const GemmRules &rules, QtbInt m, QtbInt n, QtbInt k) {
   constexpr QtbInt wide_cap = 5000;  // of the one rule that widens with the problem
   const bool wide = rules.mb.rule == Rows::flat_or_huge && (is_flat(m, n, k, 2 * rules.kb.value) || is_huge(m, n, k));
   return round_up(smaller(larger(n, rules.nb.floor), wide ? wide_cap : rules.nb.cap), rules.nb.multiple);
 }
 
 // Fills in each of mb, nb and kb that is 0, and sets the tile. caches may be null where reads_caches says no.
-inline void fill_blocks(const GemmRules &rules, QtbInt m, QtbInt n, QtbInt k, const std::uint32_t *caches,
-                        GemmBlocks &blocks) {
+constexpr void fill_blocks(const GemmRules &rules, QtbInt m, QtbInt n, QtbInt k, const std::uint32_t *caches,
+                           GemmBlocks &blocks) {
   if (blocks.kb == 0) blocks.kb = block_depth(rules.kb, k);
   if (blocks.mb == 0) blocks.mb = block_rows(rules, m, n, k, blocks.kb, caches);
   if (blocks.nb == 0) blocks.nb = block_columns(rules, m, n, k);
@@ -198,4 +245,4 @@ inline void fill_blocks(const GemmRules &rules, QtbInt m, QtbInt n, QtbInt k, co
 }
 
 }  // namespace
-}  // namespace qtb::QTB_TIER
+}  // namespace qtb::tiles

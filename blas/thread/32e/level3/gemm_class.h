@@ -6,9 +6,6 @@
 
 namespace qtb {
 
-// A second cache level of at most so many bytes is small.
-constexpr std::uint32_t gemm_small_l2_bytes = 3145728;
-
 // process answers has_sse41() and is_amd_family16(), which cost a query of the processor and are asked only where the
 // class depends on them. cache is the table of service/cache.h.
 template <class Process>
@@ -17,8 +14,8 @@ GemmMachineClass gemm_machine_class(ProcessorTier tier, const std::uint32_t *cac
     case tier_def: return process.is_amd_family16() ? machine_family16 : machine_plain;
     case tier_ssse3:
       if (!process.has_sse41()) return machine_ssse3;
-      return cache[cache_count] != 0 && cache[cache_second_size] <= gemm_small_l2_bytes ? machine_sse41_small_l2
-                                                                                        : machine_sse41_large_l2;
+      return cache_is_small(cache, cache_second_size, small_second_cache_bytes) ? machine_sse41_small_l2
+                                                                                : machine_sse41_large_l2;
     case tier_sse42: return machine_sse42;
     case tier_avx: return machine_avx;
     default: return machine_plain;

@@ -164,7 +164,6 @@ void select_grid_sse42(Selection<T> &s) {
 }
 
 void select_acopy(Selection<double> &s) {
-  constexpr std::uint32_t small_l3_bytes = 4194304;
   s.make_even();
   const QtbInt rows = s.m == 512 || s.m == 256 || s.t % 4 != 0 ? 2 : 4;
   s.plan.strategy = &qtb_blas_dgemm_2d_acopy_n;
@@ -175,7 +174,7 @@ void select_acopy(Selection<double> &s) {
   s.grid_of(rows, s.t / rows);
   s.plan.a_buffers = static_cast<std::int32_t>(rows);
   s.plan.nb = 10000;
-  s.plan.mb = s.plan.cache[cache_count] != 0 && s.plan.cache[cache_third_size] <= small_l3_bytes ? 384 : 1000;
+  s.plan.mb = cache_is_small(s.plan.cache, cache_third_size, small_third_cache_bytes) ? 384 : 1000;
 }
 
 void select_sse42(Selection<double> &s) {

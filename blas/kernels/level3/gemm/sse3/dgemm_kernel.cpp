@@ -120,7 +120,10 @@ template <Steps steps, Beta beta, int rows, int columns, class B>
       sums_over<double, vectors, columns, steps, fixed_depth>(k, InPlaceA<rows>{a, lda}, b);
   const __m128d factor = load_aligned(alpha);
   for (int j = 0; j < columns; j++)
-    for (int v = 0; v < vectors; v++) sums.v[j][v] = mul(sums.v[j][v], factor);
+    for (int v = 0; v < vectors; v++) {
+      sums.v[j][v] = mul(sums.v[j][v], factor);
+      if constexpr (beta == Beta::zero) sums.v[j][v] = add(zero<double>(), sums.v[j][v]);  // as added to zeros: no -0
+    }
   store_rows<beta, rows>(sums, c, ldc, lanes_of_beta);
 }
 

@@ -15,9 +15,8 @@
 // the micro-panel of B is first copied to the stage, every element filling a vector.
 #pragma once
 
-#include <smmintrin.h>
-
 #include "blas/kernels/level3/gemm/kernels.h"
+#include "blas/kernels/simd/lanes.h"
 #include "blas/kernels/simd/repeat.h"
 #include "blas/kernels/simd/vec.h"
 
@@ -26,24 +25,6 @@ namespace {
 
 // Depth of one turn of the depth loop, and of a panel's unit of depth, which one shorter turn may complete.
 constexpr QtbInt turn_depth = 8, unit_depth = 4;
-
-// Lanes 0 and 1 exchanged, and lanes 2 and 3. The integer shuffle writes another register than it reads.
-inline __m128 exchanged(__m128 v) { return _mm_castsi128_ps(_mm_shuffle_epi32(_mm_castps_si128(v), 0xB1)); }
-inline __m128d exchanged(__m128d v) { return _mm_castsi128_pd(_mm_shuffle_epi32(_mm_castpd_si128(v), 0x4E)); }
-
-// Even lanes of the first, odd lanes of the second.
-inline __m128 even_odd(__m128 even, __m128 odd) { return _mm_blend_ps(even, odd, 0b1010); }
-inline __m128d even_odd(__m128d even, __m128d odd) { return _mm_blend_pd(even, odd, 0b10); }
-
-// The real parts of two vectors of direct sums, and the imaginary parts of two of crossed sums.
-inline __m128 pairwise_differences(__m128 a, __m128 b) { return _mm_hsub_ps(a, b); }
-inline __m128d pairwise_differences(__m128d a, __m128d b) { return _mm_hsub_pd(a, b); }
-inline __m128 pairwise_sums(__m128 a, __m128 b) { return _mm_hadd_ps(a, b); }
-inline __m128d pairwise_sums(__m128d a, __m128d b) { return _mm_hadd_pd(a, b); }
-inline __m128 interleaved_low(__m128 a, __m128 b) { return _mm_unpacklo_ps(a, b); }
-inline __m128d interleaved_low(__m128d a, __m128d b) { return _mm_unpacklo_pd(a, b); }
-inline __m128 interleaved_high(__m128 a, __m128 b) { return _mm_unpackhi_ps(a, b); }
-inline __m128d interleaved_high(__m128d a, __m128d b) { return _mm_unpackhi_pd(a, b); }
 
 // direct += rows*b, crossed += exchanged*b, b a vector of B: two columns of real elements, or one staged element of a
 // complex column. The last pair of a step may overwrite the rows, and loads b once.
@@ -128,8 +109,8 @@ struct Tile {
     if constexpr (is_complex<T>) {
       repeat<(width + 1) / 2>([&](auto q) __attribute__((always_inline)) {
         constexpr int left = 2 * q.value, right = left + 1 < width ? left + 1 : left;
-        const V re = pairwise_differences(direct[left], direct[right]);
-        const V im = pairwise_sums(crossed[left], crossed[right]);
+        const V re = neighbour_differences(direct[left], direct[right]);
+        const V im = neighbour_sums(crossed[left], crossed[right]);
         update_column<aligned>(c + left * ldc, interleaved_low(re, im));
         if constexpr (right != left) update_column<aligned>(c + right * ldc, interleaved_high(re, im));
       });
@@ -210,3 +191,12 @@ void diagonal_kernel(QTB_INNER_KERNEL_PARAMS(T)) {
 
 }  // namespace
 }  // namespace qtb::QTB_TIER
+
+// The procedures of a type, by the start of their names.
+#define QTB_DIAGONAL_KERNELS(name, T)                                           \
+  extern "C" void QTB_TIER_NAME(name##_kernel_cu)(QTB_INNER_KERNEL_PARAMS(T)) { \
+    diagonal_kernel<T, false>(m, n, kp, ap, ldap, bp, ldbp, c, ldc, stage);     \
+  }                                                                             \
+  extern "C" void QTB_TIER_NAME(name##_kernel_ca)(QTB_INNER_KERNEL_PARAMS(T)) { \
+    diagonal_kernel<T, true>(m, n, kp, ap, ldap, bp, ldbp, c, ldc, stage);      \
+  }

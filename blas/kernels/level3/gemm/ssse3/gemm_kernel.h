@@ -20,6 +20,7 @@
 #pragma once
 
 #include "blas/kernels/level3/gemm/kernels.h"
+#include "blas/kernels/simd/lanes.h"
 #include "blas/kernels/simd/repeat.h"
 #include "blas/kernels/simd/vec.h"
 
@@ -51,26 +52,6 @@ template <int order>
 __m128d reordered(__m128d v) {
   return _mm_castsi128_pd(_mm_shuffle_epi32(_mm_castpd_si128(v), order));
 }
-
-// Neighbours exchanged.
-inline __m128 exchanged(__m128 v) { return reordered<0xB1>(v); }
-inline __m128d exchanged(__m128d v) { return reordered<0x4E>(v); }
-
-// Even lanes of the first and odd lanes of the second.
-inline __m128 even_odd(__m128 even, __m128 odd) {
-  const __m128 odd_lanes = _mm_castsi128_ps(_mm_set_epi32(-1, 0, -1, 0));
-  return _mm_or_ps(_mm_andnot_ps(odd_lanes, even), _mm_and_ps(odd_lanes, odd));
-}
-inline __m128d even_odd(__m128d even, __m128d odd) { return _mm_move_sd(odd, even); }
-
-inline __m128 neighbour_differences(__m128 a, __m128 b) { return _mm_hsub_ps(a, b); }
-inline __m128d neighbour_differences(__m128d a, __m128d b) { return _mm_hsub_pd(a, b); }
-inline __m128 neighbour_sums(__m128 a, __m128 b) { return _mm_hadd_ps(a, b); }
-inline __m128d neighbour_sums(__m128d a, __m128d b) { return _mm_hadd_pd(a, b); }
-inline __m128 interleaved_low(__m128 a, __m128 b) { return _mm_unpacklo_ps(a, b); }
-inline __m128d interleaved_low(__m128d a, __m128d b) { return _mm_unpacklo_pd(a, b); }
-inline __m128 interleaved_high(__m128 a, __m128 b) { return _mm_unpackhi_ps(a, b); }
-inline __m128d interleaved_high(__m128d a, __m128d b) { return _mm_unpackhi_pd(a, b); }
 
 // v *= the vector at p, a multiple of 16 bytes, and sum += v. Told in the instructions' own words: compilers load a
 // vector that is used twice into a register of its own, and add to whichever operand they like and copy the sum back.
