@@ -15,11 +15,11 @@
 //                 difference of neighbours in the first sum and their total in the second are the parts.
 //   CrossedPairs  (SSE4.1 family, d, an even number of columns) the same pairs. A vector of the panel is (b0, b1) as it
 //                 is, so that the stage holds (b1, b0) alone.
-//   ShuffledPairs (SSE4.1 family, d, an odd number of columns) pairs from the panel, with the rows exchanged by a
-//                 shuffle, and a last column by itself.
+//   ShuffledPairs (SSE4.1 family, d, otherwise) pairs from the panel, with the rows exchanged by a shuffle, and a last
+//                 column without a neighbour by itself.
 //
 // On processors whose shuffles run in the pipes of the additions and multiplications, the two shuffles of a step cost
-// what two of these 16 cost; so where columns pair up they are made once per column group.
+// what two of these 16 cost; so where columns pair up they are made once per column group, if enough rows pass.
 #pragma once
 
 #include "blas/kernels/level3/gemm/kernels.h"
@@ -194,15 +194,15 @@ struct CrossedPairs : StagedPairs<double, columns> {
   }
 };
 
-// The last column fills a vector and meets the rows in their own order alone.
+// A last column without a neighbour fills a vector and meets the rows in their own order alone.
 template <int columns>
 struct ShuffledPairs {
   using V = __m128d;
-  static constexpr int width = columns, pairs = columns / 2, operands = pairs + 1, row_forms = 2 * row_vectors;
+  static constexpr int width = columns, pairs = columns / 2, operands = (columns + 1) / 2, row_forms = 2 * row_vectors;
   static constexpr bool staged = false;
   static constexpr QtbInt panel_step = columns, stage_step = 0;
   static constexpr int products(int j) { return j < pairs ? row_forms : row_vectors; }
-  static constexpr bool in_memory(int) { return false; }
+  static constexpr bool in_memory(int j) { return columns % 2 == 0 && j % 2 != 0; }
 
   template <int j>
   static const double *operand(int k, const double *panel, const double *) {
@@ -212,6 +212,8 @@ struct ShuffledPairs {
   static V load_b(const double *b) {
     if constexpr (j == pairs)
       return broadcast(*b);
+    else if constexpr (columns % 2 == 0)
+      return load_aligned(b);
     else
       return load_unaligned(b);
   }
@@ -226,7 +228,7 @@ struct ShuffledPairs {
         c.at[2 * q.value][i.value] = even_odd(direct, crossed);
         c.at[2 * q.value + 1][i.value] = even_odd(crossed, direct);
       });
-      c.at[columns - 1][i.value] = sums.at[pairs][i.value];
+      if constexpr (pairs < operands) c.at[columns - 1][i.value] = sums.at[pairs][i.value];
     });
   }
 };
@@ -239,13 +241,18 @@ struct SchemeOf<float, Family::sse41, 4> : StagedPairs<float, 4> {};
 template <>
 struct SchemeOf<float, Family::sse41, 2> : StagedPairs<float, 2> {};
 template <int columns>
-requires(columns % 2 == 0) struct SchemeOf<double, Family::sse41, columns> : CrossedPairs<columns> {
-};
-template <int columns>
-requires(columns % 2 != 0) struct SchemeOf<double, Family::sse41, columns> : ShuffledPairs<columns> {
-};
+struct SchemeOf<double, Family::sse41, columns> : ShuffledPairs<columns> {};
 template <class R, int columns>
 struct SchemeOf<Complex<R>, Family::sse41, columns> : StagedPairs<Complex<R>, columns> {};
+
+// The one for so many rows that a stage pays which a few do without: it saves the tile of each four rows a sixteenth at
+// best, and costs what a third of a tile does.
+constexpr QtbInt rows_for_stage = 64;
+template <class T, Family family, int columns>
+struct SchemeOfMany : SchemeOf<T, family, columns> {};
+template <int columns>
+requires(columns % 2 == 0) struct SchemeOfMany<double, Family::sse41, columns> : CrossedPairs<columns> {
+};
 
 // ---- The stage ----
 
@@ -330,12 +337,12 @@ template <class R, class V>
 
 // The rows of A against one micro-panel, by what a scheme reads of it and of its stage. fixed_lines > 0: of that many
 // lines, in straight-line code; otherwise each turn takes the least depth that kp is a multiple of.
-template <class T, Family family, int width, bool aligned, int fixed_lines>
+template <class T, Family family, class Scheme, bool aligned, int fixed_lines>
 [[gnu::noinline, gnu::flatten]] void multiply_rows(QtbInt m, QtbInt kp, const T *ap, QtbInt ldap, const Real<T> *panel,
                                                    const Real<T> *stage, T *c, QtbInt ldc) {
-  using Scheme = SchemeOf<T, family, width>;
   using R = Real<T>;
   constexpr GemmRules rules = rules_of<T, family>;
+  constexpr int width = Scheme::width;
   constexpr int lines_per_turn = static_cast<int>(rules.ku) / 2, step = static_cast<int>(lanes<R>);
   constexpr QtbInt line = line_bytes / static_cast<QtbInt>(sizeof(R));
   for (; m > 0; m -= rules.mr, ap += ldap, c += rules.mr) {
@@ -402,9 +409,18 @@ void multiply_panels(QTB_INNER_KERNEL_PARAMS(T)) {
   for (QtbInt width; n > 0; n -= width, bp += ldbp, c += width * ldc) {
     width = panel_width(nr, n);
     with_width<nr>(width, [&](auto w) {
-      using Scheme = SchemeOf<T, family, w.value>;
-      if constexpr (Scheme::staged) stage_panel<Scheme::orders>(kp * w.value * parts_of<T>, parts(bp), parts(stage));
-      multiply_rows<T, family, w.value, aligned, fixed_lines>(m, kp, ap, ldap, parts(bp), parts(stage), c, ldc);
+      const auto multiply_by = [&]<class Scheme>(Scheme) {
+        if constexpr (Scheme::staged) stage_panel<Scheme::orders>(kp * w.value * parts_of<T>, parts(bp), parts(stage));
+        multiply_rows<T, family, Scheme, aligned, fixed_lines>(m, kp, ap, ldap, parts(bp), parts(stage), c, ldc);
+      };
+      using Few = SchemeOf<T, family, w.value>;
+      using Many = SchemeOfMany<T, family, w.value>;
+      if constexpr (Few::staged)
+        multiply_by(Few());
+      else if (m < rows_for_stage)
+        multiply_by(Few());
+      else
+        multiply_by(Many());
     });
   }
 }
@@ -418,7 +434,8 @@ void multiply_in_place(QTB_IN_PLACE_KERNEL_PARAMS(T)) {
     width = panel_width(nr, n);
     with_width<nr>(width, [&](auto w) {
       stage_in_place<w.value>(depth, kp, b, row_step, column_step, stage);
-      multiply_rows<T, Family::base, w.value, aligned, 0>(m, kp, ap, ldap, nullptr, stage, c, ldc);
+      multiply_rows<T, Family::base, SchemeOf<T, Family::base, w.value>, aligned, 0>(m, kp, ap, ldap, nullptr, stage, c,
+                                                                                     ldc);
     });
   }
 }
