@@ -95,15 +95,18 @@ struct Tile {
 template <int width, bool aligned>
 [[gnu::noinline]] void multiply_micro_panel(QtbInt m, QtbInt kp, const double *ap, QtbInt ldap, const double *bp,
                                             double *c, QtbInt ldc, double *stage) {
-  for (QtbInt e = 0; e < kp * width; e += ku * width)
+  // Rows that pass but once take the micro-panel as it is.
+  const bool staged = m > mr;
+  for (QtbInt e = 0; staged && e < kp * width; e += ku * width)
     repeat<width>([&](auto v) {
       _mm256_store_pd(stage + e + v.value * vector_length, _mm256_load_pd(bp + e + v.value * vector_length));
     });
+  const double *const b = staged ? stage : bp;
   for (; m > 0; m -= mr, ap += ldap, c += mr) {
     for (int j = 0; j < width; j++) prefetch(c + j * ldc, prefetch_c);
     Tile<width> tile;
     tile.clear();
-    tile.add_panel(kp, ap, stage);
+    tile.add_panel(kp, ap, b);
     tile.template update<aligned>(c, ldc);
   }
 }
