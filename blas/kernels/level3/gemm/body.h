@@ -130,12 +130,25 @@ bool begin_product(const Product<T> &p, const T *beta, SmallLimits limits) {
   return multiplies;
 }
 
+// Bytes of a panel of A that stay in the second cache level beside what else passes through it, B and C.
+constexpr QtbInt resident_bytes = 384 * 1024;
+
+// Rows of a panel that the kernel takes at a time: all of them, or about equal slices that stay in the cache while the
+// columns pass.
+template <class T, Family family>
+QtbInt rows_at_a_time(QtbInt m, QtbInt kp) {
+  const QtbInt bytes = m * kp * static_cast<QtbInt>(sizeof(T));
+  if (bytes <= resident_bytes) return m;
+  const QtbInt slices = (bytes + resident_bytes - 1) / resident_bytes;
+  return round_up((m + slices - 1) / slices, rules_of<T, family>.mr);
+}
+
 template <class T, Family family>
 void run_kernel(bool aligned, QTB_INNER_KERNEL_PARAMS(T)) {
-  if (aligned)
-    InnerKernel<T, family>::run_aligned(m, n, kp, ap, ldap, bp, ldbp, c, ldc, stage);
-  else
-    InnerKernel<T, family>::run(m, n, kp, ap, ldap, bp, ldbp, c, ldc, stage);
+  const auto kernel = aligned ? InnerKernel<T, family>::run_aligned : InnerKernel<T, family>::run;
+  const QtbInt step = rows_at_a_time<T, family>(m, kp);
+  for (QtbInt i0 = 0; i0 < m; i0 += step)
+    kernel(smaller(step, m - i0), n, kp, ap + i0 / rules_of<T, family>.mr * ldap, ldap, bp, ldbp, c + i0, ldc, stage);
 }
 
 // The kernel on a slice of the depth, l0 to l0 + kp, of panels that hold more. ap and bp are the whole panels; the edge
