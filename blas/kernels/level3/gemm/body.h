@@ -66,6 +66,19 @@ bool columns_aligned(const T *c, QtbInt ldc) {
   return phase(c) == 0 && ldc * static_cast<QtbInt>(sizeof(T)) % vector_bytes == 0;
 }
 
+// Bytes of a panel of A that stay in the second cache level beside what else passes through it, B and C.
+constexpr QtbInt resident_bytes = 384 * 1024;
+
+// Rows of a panel that a kernel takes at a time: all of them, or about equal slices that stay in the cache while the
+// columns pass.
+template <class T>
+QtbInt rows_at_a_time(QtbInt m, QtbInt kp, QtbInt mr) {
+  const QtbInt bytes = m * kp * static_cast<QtbInt>(sizeof(T));
+  if (bytes <= resident_bytes) return m;
+  const QtbInt slices = (bytes + resident_bytes - 1) / resident_bytes;
+  return round_up((m + slices - 1) / slices, mr);
+}
+
 // The kernels of kernels.def, which add.
 template <class T, Family family, Source source_b>
 struct AddingKernels {
@@ -78,10 +91,11 @@ struct AddingKernels {
       : b_is_n(read_op<T>(p.transb) == Op::none), aligned(columns_aligned(p.c, p.ldc)) {}
 
   void run_inner(QTB_INNER_KERNEL_PARAMS(T)) const {
-    if (aligned)
-      inner.aligned(m, n, kp, ap, ldap, bp, ldbp, c, ldc, stage);
-    else
-      inner.any(m, n, kp, ap, ldap, bp, ldbp, c, ldc, stage);
+    constexpr QtbInt mr = rules_of<T, family>.mr;
+    const auto kernel = aligned ? inner.aligned : inner.any;
+    const QtbInt step = rows_at_a_time<T>(m, kp, mr);
+    for (QtbInt i0 = 0; i0 < m; i0 += step)
+      kernel(smaller(step, m - i0), n, kp, ap + i0 / mr * ldap, ldap, bp, ldbp, c + i0, ldc, stage);
   }
   void run(const Block<T> &x, bool) const {
     if constexpr (source_b == Source::packed) {

@@ -6,95 +6,20 @@
 // with the operands exchanged and C written row by row. Where both operands have the depth side by side, a tile of
 // elements is formed as dot products. Every element is scaled and added once: beta*C + alpha*sum. A beta of 0 stores
 // without reading C. No alignment is asked for, and nothing outside the operands is read.
-#include "blas/kernels/element.h"
 #include "blas/kernels/level3/gemm/parts.h"
-#include "blas/kernels/simd/repeat.h"
+#include "blas/kernels/level3/gemm/short_depth.h"
 
 namespace qtb::QTB_TIER {
 namespace {
 
-// beta*C + alpha*sum, by vector.
-template <class T>
-struct Finish {
-  Factor<T> alpha, beta;
-  bool reads_c, scales_c;
-  Finish(T a, T b) : alpha(a), beta(b), reads_c(!is_zero(b)), scales_c(!is_one(b)) {}
-  template <class Load>
-  Vec<T> operator()(Vec<T> sum, Load load_c) const {
-    Vec<T> v = alpha.times(sum);
-    if (!reads_c) return add(zero<T>(), v);  // what is added to a C of zeros: never -0
-    const Vec<T> old = load_c();
-    return add(scales_c ? beta.times(old) : old, v);
-  }
-};
-
-// count elements of a vector, zeros in the other lanes, and their store; steps of inc apart for the store of a row.
-template <int count, class T>
-Vec<T> load_part(const T *p) {
-  if constexpr (count == lanes<T>)
-    return load_unaligned(p);
-  else if constexpr (count == 2)
-    return _mm_castpd_ps(load_lowest(reinterpret_cast<const double *>(p)));
-  else
-    return load_lowest(p);
-}
-template <int count, class T>
-void store_part(T *p, Vec<T> v) {
-  if constexpr (count == lanes<T>)
-    store_unaligned(p, v);
-  else if constexpr (count == 2)
-    store_lowest(reinterpret_cast<double *>(p), _mm_castps_pd(v));
-  else
-    store_lowest(p, v);
-}
-template <int count, class T>
-Vec<T> gather_part(const T *p, QtbInt inc) {
-  if constexpr (count == 1)
-    return load_lowest(p);
-  else if constexpr (count == 2 && lanes<T> == 4)
-    return _mm_unpacklo_ps(load_lowest(p), load_lowest(p + inc));
-  else
-    return gather(p, inc);
-}
-template <int count, class T>
-void scatter_part(T *p, QtbInt inc, Vec<T> v) {
-  if constexpr (count == 1) {
-    store_lowest(p, v);
-  } else if constexpr (lanes<T> == 4) {
-    store_lowest(p, v);
-    store_lowest(p + inc, _mm_shuffle_ps(v, v, 1));
-    if constexpr (count == 4) {
-      store_lowest(p + 2 * inc, _mm_shuffle_ps(v, v, 2));
-      store_lowest(p + 3 * inc, _mm_shuffle_ps(v, v, 3));
-    }
-  } else {
-    scatter(p, inc, v);
-  }
+// Elements in vector v of a tile: all of them are whole but the last one, which has last.
+template <int vectors, int last, class T>
+constexpr int count_of(int v) {
+  return v + 1 < vectors ? static_cast<int>(lanes<T>) : last;
 }
 
-// An operand whose elements along the vector lie side by side: element (v, l) at x[v + l*ld].
-template <class T>
-struct SideBySide {
-  const T *x;
-  QtbInt ld;
-  bool conjugated;
-};
-// The other operand, element by element: (l, e) at y[l*by_depth + e*by_element].
-template <class T>
-struct ByElement {
-  const T *y;
-  QtbInt by_depth, by_element;
-  bool conjugated;
-};
-// C, from the tile's first element: (v, e) at c[v*along + e*across]; along is 1 unless C is written by rows.
-template <class T>
-struct Target {
-  T *c;
-  QtbInt along, across;
-};
-
-// The sums of a tile of vectors x columns, count elements to a vector: real products.
-template <int vectors, int columns, int count, class T>
+// The sums of a tile of vectors x columns: real products.
+template <int vectors, int columns, int last, class T>
 struct Sums {
   Vec<T> sum[vectors][columns];
   void clear() {
@@ -102,7 +27,8 @@ struct Sums {
   }
   void add_step(const T *x, const T *y, QtbInt by_element) {
     Vec<T> a[vectors];
-    repeat<vectors>([&](auto v) { a[v.value] = load_part<count>(x + v.value * lanes<T>); });
+    repeat<vectors>(
+        [&](auto v) { a[v.value] = load_part<count_of<vectors, last, T>(v.value)>(x + v.value * lanes<T>); });
     repeat<columns>([&](auto e) {
       const Vec<T> b = broadcast(load_single(y + e.value * by_element));
       repeat<vectors>([&](auto v) { sum[v.value][e.value] = add(sum[v.value][e.value], mul(a[v.value], b)); });
@@ -112,8 +38,8 @@ struct Sums {
 };
 
 // Complex products: x times the real part of y and x times the imaginary part are summed apart.
-template <int vectors, int columns, int count, class R>
-struct Sums<vectors, columns, count, Complex<R>> {
+template <int vectors, int columns, int last, class R>
+struct Sums<vectors, columns, last, Complex<R>> {
   using T = Complex<R>;
   Vec<T> by_re[vectors][columns], by_im[vectors][columns];
   void clear() {
@@ -123,7 +49,8 @@ struct Sums<vectors, columns, count, Complex<R>> {
   }
   void add_step(const T *x, const T *y, QtbInt by_element) {
     Vec<T> a[vectors];
-    repeat<vectors>([&](auto v) { a[v.value] = load_part<count>(x + v.value * lanes<T>); });
+    repeat<vectors>(
+        [&](auto v) { a[v.value] = load_part<count_of<vectors, last, T>(v.value)>(x + v.value * lanes<T>); });
     repeat<columns>([&](auto e) {
       const R *b = parts(y + e.value * by_element);
       const Vec<T> re = broadcast(load_single(b)), im = broadcast(load_single(b + 1));
@@ -133,52 +60,81 @@ struct Sums<vectors, columns, count, Complex<R>> {
       });
     });
   }
-  // (x.re*y.re - x.im*y.im, x.im*y.re + x.re*y.im), with the signs that conjugation changes.
   Vec<T> total(int v, int e, bool x_conjugated, bool y_conjugated) const {
-    const R negative = -R{0}, none = 0;
-    const Vec<T> first = alternate(none, x_conjugated ? negative : none);
-    const Vec<T> second = alternate(x_conjugated == y_conjugated ? negative : none, y_conjugated ? negative : none);
-    return add(bit_xor(first, by_re[v][e]), bit_xor(second, swap_parts(by_im[v][e])));
+    return join_products<T>(by_re[v][e], by_im[v][e], x_conjugated, y_conjugated);
   }
 };
 
-template <int vectors, int columns, int count, class T>
+template <bool by_rows, int vectors, int columns, int last, class T>
 void update_tile(QtbInt k, SideBySide<T> x, ByElement<T> y, const Finish<T> &finish, Target<T> to) {
-  Sums<vectors, columns, count, T> sums;
+  Sums<vectors, columns, last, T> sums;
   sums.clear();
   for (QtbInt l = 0; l < k; l++) sums.add_step(x.x + l * x.ld, y.y + l * y.by_depth, y.by_element);
   repeat<columns>([&](auto e) {
     repeat<vectors>([&](auto v) {
-      T *c = to.c + v.value * lanes<T> * to.along + e.value * to.across;
+      constexpr int count = count_of<vectors, last, T>(v.value);
       const Vec<T> sum = sums.total(v.value, e.value, x.conjugated, y.conjugated);
-      if (to.along == 1)
-        store_part<count>(c, finish(sum, [&] { return load_part<count>(c); }));
-      else
+      if constexpr (by_rows) {
+        T *c = to.c + v.value * lanes<T> * to.along + e.value;
         scatter_part<count>(c, to.along, finish(sum, [&] { return gather_part<count>(c, to.along); }));
+      } else {
+        T *c = to.c + v.value * lanes<T> + e.value * to.across;
+        store_part<count>(c, finish(sum, [&] { return load_part<count>(c); }));
+      }
     });
   });
 }
 
-// A strip of vectors*count elements along the vector, over all columns.
-template <int vectors, int count, class T>
-void update_strip(QtbInt columns, QtbInt k, SideBySide<T> x, ByElement<T> y, const Finish<T> &finish, Target<T> to) {
-  constexpr int at_once = is_complex<T> ? 2 : 4;
-  QtbInt e = 0;
-  for (; e + at_once <= columns; e += at_once, y.y += at_once * y.by_element, to.c += at_once * to.across)
-    update_tile<vectors, at_once, count>(k, x, y, finish, to);
-  for (; e < columns; e++, y.y += y.by_element, to.c += to.across) update_tile<vectors, 1, count>(k, x, y, finish, to);
+// Columns that are summed at once: enough sums to hide the latency of an addition, and as many as there are registers
+// for beside two vectors.
+template <class T>
+constexpr int columns_at_once = is_complex<T> ? 2 : 4;
+
+// Vectors that are summed at once beside so many columns: a cache line of them where there are registers for its sums.
+template <class T>
+constexpr int vectors_at_once(int columns) {
+  constexpr int most_sums = 8, line_vectors = 4, sums = is_complex<T> ? 2 : 1;
+  return columns * line_vectors * sums <= most_sums ? line_vectors : 2;
 }
 
-template <int vectors, int count, class T>
-void update_strips(QtbInt elements, QtbInt columns, QtbInt k, SideBySide<T> x, ByElement<T> y, const Finish<T> &finish,
+// All elements against one group of columns.
+template <bool by_rows, int columns, class T>
+void update_group(QtbInt elements, QtbInt k, SideBySide<T> x, ByElement<T> y, const Finish<T> &finish, Target<T> to) {
+  constexpr int whole = static_cast<int>(lanes<T>), vectors = vectors_at_once<T>(columns);
+  const auto update_some = [&](auto count, auto last) __attribute__((always_inline)) {
+    constexpr QtbInt taken = (count.value - 1) * whole + last.value;
+    update_tile<by_rows, count.value, columns, last.value>(k, x, y, finish, to);
+    elements -= taken;
+    x.x += taken;
+    to.c += taken * to.along;
+  };
+  if constexpr (vectors > 2)
+    while (elements >= vectors * whole) update_some(Constant<vectors>(), Constant<whole>());
+  while (elements >= 2 * whole) update_some(Constant<2>(), Constant<whole>());
+  if (elements > whole) with_count<whole>(elements - whole, [&](auto last) { update_some(Constant<2>(), last); });
+  if (elements > 0) with_count<whole>(elements, [&](auto last) { update_some(Constant<1>(), last); });
+}
+
+template <bool by_rows, class T>
+void update_groups(QtbInt elements, QtbInt columns, QtbInt k, SideBySide<T> x, ByElement<T> y, const Finish<T> &finish,
                    Target<T> to) {
-  constexpr QtbInt strip = vectors * count;
-  for (; elements >= strip; elements -= strip, x.x += strip, to.c += strip * to.along)
-    update_strip<vectors, count>(columns, k, x, y, finish, to);
-  if constexpr (vectors > 1)
-    update_strips<1, count>(elements, columns, k, x, y, finish, to);
-  else if constexpr (count > 1)
-    update_strips<1, count / 2>(elements, columns, k, x, y, finish, to);
+  constexpr int at_once = columns_at_once<T>;
+  for (; columns >= at_once; columns -= at_once, y.y += at_once * y.by_element, to.c += at_once * to.across)
+    update_group<by_rows, at_once>(elements, k, x, y, finish, to);
+  if (columns > 0)
+    with_count<at_once - 1>(columns,
+                            [&](auto left) { update_group<by_rows, left.value>(elements, k, x, y, finish, to); });
+}
+
+// The smaller operand is the one that is passed over again.
+template <bool by_rows, class T>
+void update(QtbInt elements, QtbInt columns, QtbInt k, SideBySide<T> x, ByElement<T> y, const Finish<T> &finish,
+            Target<T> to) {
+  constexpr QtbInt strip = 2 * lanes<T>;
+  if (elements <= columns || columns <= columns_at_once<T>)
+    return update_groups<by_rows>(elements, columns, k, x, y, finish, to);
+  for (; elements > 0; elements -= strip, x.x += strip, to.c += strip * to.along)
+    update_groups<by_rows>(smaller(elements, strip), columns, k, x, y, finish, to);
 }
 
 // ---- Dot products ----
@@ -251,11 +207,14 @@ void dot_tile(QtbInt k, const T *x, QtbInt ldx, bool x_conjugated, const T *y, Q
 template <int rows, class T>
 void dot_rows(QtbInt n, QtbInt k, const T *x, QtbInt ldx, bool x_conjugated, const T *y, QtbInt ldy,
               const Finish<T> &finish, T *c, QtbInt ldc) {
-  constexpr int at_once = is_complex<T> ? 2 : 4;
+  constexpr int at_once = columns_at_once<T>;
   QtbInt j = 0;
   for (; j + at_once <= n; j += at_once)
     dot_tile<rows, at_once>(k, x, ldx, x_conjugated, y + j * ldy, ldy, finish, c + j * ldc, ldc);
-  for (; j < n; j++) dot_tile<rows, 1>(k, x, ldx, x_conjugated, y + j * ldy, ldy, finish, c + j * ldc, ldc);
+  if (j < n)
+    with_count<at_once - 1>(n - j, [&](auto left) {
+      dot_tile<rows, left.value>(k, x, ldx, x_conjugated, y + j * ldy, ldy, finish, c + j * ldc, ldc);
+    });
 }
 
 template <class T>
@@ -265,18 +224,23 @@ QTB_FUNCTION(gemm, T, small) {
   const bool a_is_n = op_a == Op::none, b_is_n = op_b == Op::none;
   const QtbInt rows = *m, columns = *n, depth = *k;
   if (depth <= 0) return scale_columns<T>(m, n, beta, c, ldc);  // no sum, so that no alpha makes a NaN of it
-  constexpr int whole = static_cast<int>(lanes<T>);
+  constexpr QtbInt whole = lanes<T>;
   const Finish<T> finish(*alpha, *beta);
-  // Rows that do not fill a vector go along the columns instead where those lie side by side.
-  const bool by_rows = !b_is_n && (!a_is_n || (rows < whole && columns >= whole));
-  if (by_rows) {
-    update_strips<2, whole>(columns, rows, depth, SideBySide<T>{b, *ldb, b_conjugated},
-                            ByElement<T>{a, a_is_n ? *lda : 1, a_is_n ? 1 : *lda, a_conjugated}, finish,
-                            Target<T>{c, *ldc, 1});
+  const ByElement<T> by_column{b, b_is_n ? 1 : *ldb, b_is_n ? *ldb : 1, b_conjugated};
+  // A few rows go along the columns instead where those lie side by side: whole vectors, and more of a line at a time.
+  constexpr QtbInt few = 3;
+  const bool by_rows = !b_is_n && (!a_is_n || (rows <= few && columns >= whole));
+  const bool by_lanes = !a_is_n && b_is_n;
+  if (rows >= whole && depth <= (by_lanes || !is_complex<T> ? longest_short_depth<T> : longest_in_sequence)) {
+    if (a_is_n)
+      multiply_short(rows, columns, depth, SideBySide<T>{a, *lda, false}, by_column, finish, c, *ldc);
+    else
+      multiply_short_transposed(rows, columns, depth, a, *lda, a_conjugated, by_lanes, by_column, finish, c, *ldc);
+  } else if (by_rows) {
+    update<true>(columns, rows, depth, SideBySide<T>{b, *ldb, b_conjugated},
+                 ByElement<T>{a, a_is_n ? *lda : 1, a_is_n ? 1 : *lda, a_conjugated}, finish, Target<T>{c, *ldc, 1});
   } else if (a_is_n) {
-    update_strips<2, whole>(rows, columns, depth, SideBySide<T>{a, *lda, false},
-                            ByElement<T>{b, b_is_n ? 1 : *ldb, b_is_n ? *ldb : 1, b_conjugated}, finish,
-                            Target<T>{c, 1, *ldc});
+    update<false>(rows, columns, depth, SideBySide<T>{a, *lda, false}, by_column, finish, Target<T>{c, 1, *ldc});
   } else {
     QtbInt i = 0;
     for (; i + 2 <= rows; i += 2)

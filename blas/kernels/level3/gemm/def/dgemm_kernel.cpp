@@ -24,6 +24,15 @@ template <int columns>
   for (int j = 0; j < columns; j++) add_product(sums.v[j][0], a, from_b.at + j * lanes<double>);
 }
 
+// Elements of the micro-panel as it is, for rows that pass but once.
+template <int columns>
+struct PanelB {
+  static constexpr bool paced = false;
+  const double *at;
+  [[gnu::always_inline]] __m128d load(int j) const { return broadcast(load_single(at + j)); }
+  [[gnu::always_inline]] void next() { at += columns; }
+};
+
 // The lines of A behind the tile at hand, for the tiles to come.
 inline void ask_for_rows(const double *a) {
   constexpr int nearest = 128, farthest = 512, line = 64;
@@ -35,6 +44,10 @@ inline void ask_for_rows(const double *a) {
 template <Steps steps, int columns>
 [[gnu::noinline]] void run_columns(QtbInt m, QtbInt kp, const double *ap, QtbInt ldap, const double *bp, double *c,
                                    QtbInt ldc, double *stage) {
+  if (m <= tile_rows)
+    return store_tile<double, Beta::one>(
+        sums_over<double, 1, columns, Steps::fours, 0>(kp, PackedA<double, 1, 0>(ap), PanelB<columns>{bp}), c, ldc,
+        nullptr);
   fill_stage<double, columns>(kp, {bp, kp, columns, 1}, stage);
   for (QtbInt i0 = 0; i0 < m; i0 += tile_rows, ap += ldap, c += tile_rows) {
     ask_for_rows(ap);

@@ -13,10 +13,13 @@
 //                 holds (b0, b1) and (b1, b0), whose products with the rows are summed apart and sorted into columns
 //                 after the last step. Complex products are made the same way, with (br, bi) and (bi, br): the
 //                 difference of neighbours in the first sum and their total in the second are the parts.
-//   ShuffledPairs (SSE4.1 family, d) the same pairs from the panel as it is, with the rows exchanged by a shuffle.
+//   CrossedPairs  (SSE4.1 family, d, an even number of columns) the same pairs. A vector of the panel is (b0, b1) as it
+//                 is, so that the stage holds (b1, b0) alone.
+//   ShuffledPairs (SSE4.1 family, d, otherwise) pairs from the panel, with the rows exchanged by a shuffle, and a last
+//                 column without a neighbour by itself.
 //
 // On processors whose shuffles run in the pipes of the additions and multiplications, the two shuffles of a step cost
-// what two of these 16 cost; so the types that need not have them in the loop have them made once per column group.
+// what two of these 16 cost; so where columns pair up they are made once per column group, if enough rows pass.
 #pragma once
 
 #include "blas/kernels/level3/gemm/kernels.h"
@@ -67,8 +70,10 @@ __m128d reordered(__m128d v) {
 // ---- Schemes ----
 //
 // width       columns of the tile
-// operands    vectors of B per step, and b_step the real parts from one step's to the next
-// orders      of each vector of the panel, the lane orders that go to the stage; none: B is read where it is
+// operands    vectors of B per step
+// orders      of each vector of the panel, the lane orders that go to the stage, if it is staged
+// operand     where one lies, by its step, in the panel or the stage: real parts from one step's to the next are
+//             panel_step and stage_step, 0 of what no operand is read from
 // in_memory(j) whether operand j stays in memory: see multiply_add_line
 // products(j) how many of the row forms meet operand j: the first of them
 // finish      the sums, by operand and row form, into the columns, by column and row vector
@@ -91,7 +96,7 @@ struct Orders<float> {
 };
 template <>
 struct Orders<double> {
-  static constexpr int each_lane[] = {0x44, 0xEE}, pairs_both_ways[] = {0xE4, 0x4E};
+  static constexpr int each_lane[] = {0x44, 0xEE}, pairs_both_ways[] = {0xE4, 0x4E}, pairs_crossed[] = {0x4E};
 };
 
 template <class T, int columns>
@@ -99,13 +104,17 @@ struct StagedOperands {
   using V = Vec<T>;
   static constexpr int width = columns, operands = columns * parts_of<T>, row_forms = row_vectors;
   static constexpr bool staged = true;
-  static constexpr QtbInt b_step = operands * vector_step<T>;
+  static constexpr QtbInt panel_step = 0, stage_step = operands * vector_step<T>;
   static constexpr int products(int) { return row_vectors; }
   static constexpr bool in_memory(int j) { return j % 2 != 0; }
 
   template <int j>
+  static const Real<T> *operand(int k, const Real<T> *, const Real<T> *stage) {
+    return stage + k * stage_step + j * vector_step<T>;
+  }
+  template <int j>
   static V load_b(const Real<T> *b) {
-    return load_aligned(b + j * vector_step<T>);
+    return load_aligned(b);
   }
   static RowVectors<T, row_forms> load_rows(const Real<T> *a) {
     return {load_aligned(a), load_aligned(a + vector_step<T>)};
@@ -155,24 +164,39 @@ struct StagedPairs : StagedOperands<T, columns> {
   }
 };
 
+template <int columns>
+struct CrossedPairs : StagedPairs<double, columns> {
+  static constexpr const auto &orders = Orders<double>::pairs_crossed;
+  static constexpr QtbInt panel_step = columns, stage_step = columns;
+
+  template <int j>
+  static const double *operand(int k, const double *panel, const double *stage) {
+    return (j % 2 == 0 ? panel : stage) + k * columns + j / 2 * vector_step<double>;
+  }
+};
+
 // A last column without a neighbour fills a vector and meets the rows in their own order alone.
 template <int columns>
 struct ShuffledPairs {
   using V = __m128d;
   static constexpr int width = columns, pairs = columns / 2, operands = (columns + 1) / 2, row_forms = 2 * row_vectors;
   static constexpr bool staged = false;
-  static constexpr QtbInt b_step = columns;
+  static constexpr QtbInt panel_step = columns, stage_step = 0;
   static constexpr int products(int j) { return j < pairs ? row_forms : row_vectors; }
   static constexpr bool in_memory(int j) { return columns % 2 == 0 && j % 2 != 0; }
 
   template <int j>
+  static const double *operand(int k, const double *panel, const double *) {
+    return panel + k * panel_step + j * vector_step<double>;
+  }
+  template <int j>
   static V load_b(const double *b) {
     if constexpr (j == pairs)
-      return broadcast(b[2 * j]);
+      return broadcast(*b);
     else if constexpr (columns % 2 == 0)
-      return load_aligned(b + 2 * j);
+      return load_aligned(b);
     else
-      return load_unaligned(b + 2 * j);
+      return load_unaligned(b);
   }
   static RowVectors<double, row_forms> load_rows(const double *a) {
     const V upper = load_aligned(a), lower = load_aligned(a + 2);
@@ -202,6 +226,15 @@ struct SchemeOf<double, Family::sse41, columns> : ShuffledPairs<columns> {};
 template <class R, int columns>
 struct SchemeOf<Complex<R>, Family::sse41, columns> : StagedPairs<Complex<R>, columns> {};
 
+// The one for so many rows that a stage pays which a few do without: it saves the tile of each four rows a sixteenth at
+// best, and costs what a third of a tile does.
+constexpr QtbInt rows_for_stage = 64;
+template <class T, Family family, int columns>
+struct SchemeOfMany : SchemeOf<T, family, columns> {};
+template <int columns>
+requires(columns % 2 == 0) struct SchemeOfMany<double, Family::sse41, columns> : CrossedPairs<columns> {
+};
+
 // ---- The stage ----
 
 // What a pass over a micro-panel of B asks for ahead of itself: the panel, which is not needed again, and the stage.
@@ -211,15 +244,16 @@ constexpr QtbInt panel_ahead_bytes = 512, stage_ahead_bytes = 1024;
 template <const auto &orders, class R>
 void stage_panel(QtbInt count, const R *bp, R *stage) {
   constexpr int step = static_cast<int>(lanes<R>), vectors_per_line = static_cast<int>(line_bytes / vector_bytes);
+  constexpr int copies = static_cast<int>(sizeof(orders) / sizeof(orders[0]));
   const auto stage_vector = [&](QtbInt e) {
     const auto v = load_aligned(bp + e);
-    repeat<step>([&](auto s) { store_aligned(stage + (e + s.value) * step, reordered<orders[s.value]>(v)); });
+    repeat<copies>([&](auto s) { store_aligned(stage + e * copies + s.value * step, reordered<orders[s.value]>(v)); });
   };
   QtbInt e = 0;
   for (; e + vectors_per_line * step <= count; e += vectors_per_line * step) {
     prefetch<_MM_HINT_NTA>(bp + e, panel_ahead_bytes);
-    for (int line = 0; line < step; line++)
-      prefetch<_MM_HINT_T0>(stage + e * step, stage_ahead_bytes + line * line_bytes);
+    for (int line = 0; line < copies; line++)
+      prefetch<_MM_HINT_T0>(stage + e * copies, stage_ahead_bytes + line * line_bytes);
     repeat<vectors_per_line>([&](auto v) { stage_vector(e + v.value * step); });
   }
   for (; e < count; e += step) stage_vector(e);
@@ -248,24 +282,25 @@ constexpr QtbInt c_ahead_bytes = family == Family::sse41 ? 32 : 40;
 // unless this is its last use. Operands in registers cost an instruction for the load and one for the copy, operands in
 // memory two loads within the multiplications. By turns they fill neither the six places per cycle that a processor has
 // for such instructions, nor its two loads.
-template <class Scheme, class R, class T, int operands, int forms>
-[[gnu::always_inline]] inline void multiply_add_line(const R *a, const R *b, Grid<T, operands, forms> &sums) {
+template <class Scheme, int line, class R, class T, int operands, int forms>
+[[gnu::always_inline]] inline void multiply_add_line(const R *a, const R *panel, const R *stage,
+                                                     Grid<T, operands, forms> &sums) {
   constexpr int step = static_cast<int>(lanes<R>);
   prefetch<_MM_HINT_T0>(a, rows_ahead_bytes);
   repeat<2>([&](auto k) __attribute__((always_inline)) {
     const RowVectors<T, forms> rows = Scheme::load_rows(a + k.value * row_vectors * step);
-    const R *operands_of_k = b + k.value * Scheme::b_step;
     repeat<operands>([&](auto j) __attribute__((always_inline)) {
       constexpr bool in_memory = Scheme::in_memory(j.value);
+      const R *const b = Scheme::template operand<j.value>(2 * line + k.value, panel, stage);
       Vec<T> operand;
       if constexpr (!in_memory) {
-        operand = Scheme::template load_b<j.value>(operands_of_k);
+        operand = Scheme::template load_b<j.value>(b);
         keep_in_place(operand);
       }
       repeat<Scheme::products(j.value)>([&](auto i) __attribute__((always_inline)) {
         Vec<T> product = rows.at[i.value];
         if constexpr (in_memory)
-          multiply_by_memory(product, operands_of_k + j.value * step);
+          multiply_by_memory(product, b);
         else
           product = mul(operand, product);
         add_to(sums.at[j.value][i.value], product);
@@ -281,14 +316,14 @@ template <class R, class V>
   __asm__("" : "+r"(address), "+x"(sum));
 }
 
-// The rows of A against the operands of one micro-panel. fixed_lines > 0: of that many lines, in straight-line code;
-// otherwise each turn takes the least depth that kp is a multiple of.
-template <class T, Family family, int width, bool aligned, int fixed_lines>
-[[gnu::noinline, gnu::flatten]] void multiply_rows(QtbInt m, QtbInt kp, const T *ap, QtbInt ldap, const Real<T> *b,
-                                                   T *c, QtbInt ldc) {
-  using Scheme = SchemeOf<T, family, width>;
+// The rows of A against one micro-panel, by what a scheme reads of it and of its stage. fixed_lines > 0: of that many
+// lines, in straight-line code; otherwise each turn takes the least depth that kp is a multiple of.
+template <class T, Family family, class Scheme, bool aligned, int fixed_lines>
+[[gnu::noinline, gnu::flatten]] void multiply_rows(QtbInt m, QtbInt kp, const T *ap, QtbInt ldap, const Real<T> *panel,
+                                                   const Real<T> *stage, T *c, QtbInt ldc) {
   using R = Real<T>;
   constexpr GemmRules rules = rules_of<T, family>;
+  constexpr int width = Scheme::width;
   constexpr int lines_per_turn = static_cast<int>(rules.ku) / 2, step = static_cast<int>(lanes<R>);
   constexpr QtbInt line = line_bytes / static_cast<QtbInt>(sizeof(R));
   for (; m > 0; m -= rules.mr, ap += ldap, c += rules.mr) {
@@ -300,25 +335,26 @@ template <class T, Family family, int width, bool aligned, int fixed_lines>
       repeat<Scheme::products(j.value)>([&](auto i)
                                             __attribute__((always_inline)) { sums.at[j.value][i.value] = zero<T>(); });
     });
-    const R *a = parts(ap), *operand = b;
+    const R *a = parts(ap), *direct = panel, *staged = stage;
     if constexpr (fixed_lines > 0) {
       QTB_WRITTEN_OUT
       for (int l = 0; l < fixed_lines; l++) {
-        multiply_add_line<Scheme>(a, operand, sums);
+        multiply_add_line<Scheme, 0>(a, direct, staged, sums);
         // Offsets of one byte: the speed of straight-line code is that at which it can be fetched.
         a += line;
-        operand += 2 * Scheme::b_step;
+        staged += 2 * Scheme::stage_step;
         keep_apart(a, sums.at[0][0]);
-        keep_apart(operand, sums.at[0][0]);
+        keep_apart(staged, sums.at[0][0]);
       }
     } else {
       for (QtbInt left = kp; left > 0; left -= rules.ku) {
         repeat<lines_per_turn>([&](auto l) __attribute__((always_inline)) {
-          multiply_add_line<Scheme>(a + l.value * line, operand + l.value * 2 * Scheme::b_step, sums);
+          multiply_add_line<Scheme, l.value>(a + l.value * line, direct, staged, sums);
           keep_apart(a, sums.at[0][0]);
         });
         a += lines_per_turn * line;
-        operand += lines_per_turn * 2 * Scheme::b_step;
+        direct += lines_per_turn * 2 * Scheme::panel_step;
+        staged += lines_per_turn * 2 * Scheme::stage_step;
       }
     }
     Grid<T, width, row_vectors> columns;
@@ -354,13 +390,18 @@ void multiply_panels(QTB_INNER_KERNEL_PARAMS(T)) {
   for (QtbInt width; n > 0; n -= width, bp += ldbp, c += width * ldc) {
     width = panel_width(nr, n);
     with_width<nr>(width, [&](auto w) {
-      using Scheme = SchemeOf<T, family, w.value>;
-      const Real<T> *b = parts(bp);
-      if constexpr (Scheme::staged) {
-        stage_panel<Scheme::orders>(kp * w.value * parts_of<T>, b, parts(stage));
-        b = parts(stage);
-      }
-      multiply_rows<T, family, w.value, aligned, fixed_lines>(m, kp, ap, ldap, b, c, ldc);
+      const auto multiply_by = [&]<class Scheme>(Scheme) {
+        if constexpr (Scheme::staged) stage_panel<Scheme::orders>(kp * w.value * parts_of<T>, parts(bp), parts(stage));
+        multiply_rows<T, family, Scheme, aligned, fixed_lines>(m, kp, ap, ldap, parts(bp), parts(stage), c, ldc);
+      };
+      using Few = SchemeOf<T, family, w.value>;
+      using Many = SchemeOfMany<T, family, w.value>;
+      if constexpr (Few::staged)
+        multiply_by(Few());
+      else if (m < rows_for_stage)
+        multiply_by(Few());
+      else
+        multiply_by(Many());
     });
   }
 }
@@ -374,7 +415,8 @@ void multiply_in_place(QTB_IN_PLACE_KERNEL_PARAMS(T)) {
     width = panel_width(nr, n);
     with_width<nr>(width, [&](auto w) {
       stage_in_place<w.value>(depth, kp, b, row_step, column_step, stage);
-      multiply_rows<T, Family::base, w.value, aligned, 0>(m, kp, ap, ldap, stage, c, ldc);
+      multiply_rows<T, Family::base, SchemeOf<T, Family::base, w.value>, aligned, 0>(m, kp, ap, ldap, nullptr, stage, c,
+                                                                                     ldc);
     });
   }
 }
