@@ -38,6 +38,12 @@ constexpr MachineRow machines[] = {{tier_def, machine_plain, "def"},
                                    {tier_ssse3, machine_sse41_small_l2, "ssse3 and SSE4.1, small second cache level"},
                                    {tier_sse42, machine_sse42, "sse42"},
                                    {tier_avx, machine_avx, "avx"}};
+consteval bool machines_of_every_tier() {
+  unsigned found = 0;
+  for (const MachineRow &row : machines) found |= 1U << row.tier;
+  return found == tier_set::ALL;
+}
+static_assert(machines_of_every_tier(), "bench/load_balance.cpp: write a row for each machine class of every tier");
 
 // ---- What a thread computes: elements of C, by strategy ----
 

@@ -78,8 +78,14 @@ set(QTB_KERNEL_SOURCES_avx
   blas/kernels/level3/gemm/pieces.cpp
   blas/kernels/level3/gemm/sse42/gemm_kernel.cpp
 )
-set(qtb_tier_sources ${QTB_KERNEL_SOURCES_def} ${QTB_KERNEL_SOURCES_sse3} ${QTB_KERNEL_SOURCES_ssse3}
-  ${QTB_KERNEL_SOURCES_sse42} ${QTB_KERNEL_SOURCES_avx})
+set(qtb_tier_sources "")
+foreach(tier IN LISTS QTB_TIERS)
+  if(NOT DEFINED QTB_KERNEL_SOURCES_${tier})
+    message(FATAL_ERROR "cmake/sources.cmake: write QTB_KERNEL_SOURCES_${tier}, the kernels that the tier has beside "
+      "those of all tiers: its products at least")
+  endif()
+  list(APPEND qtb_tier_sources ${QTB_KERNEL_SOURCES_${tier}})
+endforeach()
 # Of these, the ones in the wider encoding: tests/product/mnemonics/vex_objects.txt has the same list.
 set(QTB_WIDE_KERNEL_SOURCES
   blas/kernels/level3/gemm/avx/dgemm_kernel.cpp

@@ -1,16 +1,29 @@
-# The tiers' instruction sets. Flags stand here and nowhere else; blas/tiers.h has the list of tiers in the same order.
+# The tiers and their instruction sets, which are columns of the list in blas/tiers.h.
 #
-# -mno-popcnt and its kin keep out what a compiler would add on its own to the instruction set that the tier names.
-#
-set(QTB_TIERS def sse3 ssse3 sse42 avx)
+# QTB_TIERS: their names, lowest first, so that a place in the list is the number. QTB_TIER_FLAGS_<tier>: the flags.
+set(qtb_tier_list ${PROJECT_SOURCE_DIR}/blas/tiers.h)
+set_property(DIRECTORY APPEND PROPERTY CMAKE_CONFIGURE_DEPENDS ${qtb_tier_list})
+file(READ ${qtb_tier_list} qtb_text)
+string(REGEX MATCHALL "\n *ROW\\(" qtb_begun "${qtb_text}")
+string(REGEX MATCHALL "\n *ROW\\([a-z0-9]+, *[A-Z0-9]+, *\"[^\"]*\"" qtb_rows "${qtb_text}")
+list(LENGTH qtb_begun qtb_begun)
+list(LENGTH qtb_rows qtb_read)
+if(qtb_read EQUAL 0 OR NOT qtb_read EQUAL qtb_begun)
+  message(FATAL_ERROR "${qtb_tier_list}: of ${qtb_begun} tiers ${qtb_read} begin as "
+    "ROW(name, NAME, \"compiler flags\", on a line of their own")
+endif()
+set(QTB_TIERS "")
+foreach(row IN LISTS qtb_rows)
+  string(REGEX MATCH "ROW\\(([a-z0-9]+), *[A-Z0-9]+, *\"([^\"]*)\"" row "${row}")
+  list(APPEND QTB_TIERS ${CMAKE_MATCH_1})
+  separate_arguments(QTB_TIER_FLAGS_${CMAKE_MATCH_1} UNIX_COMMAND "${CMAKE_MATCH_2}")
+endforeach()
+string(REGEX MATCH "largest_asked_tier = ([0-9]+);" row "${qtb_text}")
+set(QTB_LARGEST_ASKED_TIER ${CMAKE_MATCH_1})
+
 # The product holds a source once per tier that lists it. A tool that reads sources wants each of them once.
 option(QTB_EACH_SOURCE_ONCE "Kernels in the highest tier alone that lists them: for tools, not a product" OFF)
-set(QTB_TIER_FLAGS_def   -march=x86-64)
-set(QTB_TIER_FLAGS_sse3  -march=x86-64 -msse3)
-set(QTB_TIER_FLAGS_ssse3 -march=x86-64 -mssse3)
-set(QTB_TIER_FLAGS_sse42 -march=x86-64 -msse4.2 -mno-popcnt -mno-crc32)
-# The avx tier's kernels are those of sse42; only the double-precision GEMM kernel is built with the wider encoding.
-set(QTB_TIER_FLAGS_avx   -march=x86-64 -msse4.2 -mno-popcnt -mno-crc32)
+
 # On top of the tier's, for the sources in QTB_WIDE_KERNEL_SOURCES.
 set(QTB_WIDE_FLAGS -mavx)
 

@@ -18,13 +18,25 @@ using namespace qtb::cpuid;
 constexpr std::int32_t no_override = -666;  // outside every value that atoi's result may set the tier to
 
 std::atomic<std::int32_t> cached_tier{-1};        // negative until decided
-std::atomic<std::int32_t> avx_enabled{-1};        // -1 not looked at, 0 off, 1 on: the avx tier is never taken unasked
+std::atomic<std::int32_t> asked_tiers{-1};        // -1 not looked at; else those asked for that are never taken unasked
 std::atomic<std::int32_t> sse41_cached{-1};       // -1 until asked
 std::atomic<std::int32_t> amd_family_cached{-1};  // -1 until tested
 
 constexpr auto relaxed = std::memory_order_relaxed;
 
 std::uint32_t feature_bits() { return platform_cpuid(leaf_features, 0).ecx; }
+
+// What the lowest tier needs every processor has.
+int qtb_serv_cpu_has_baseline() { return 1; }
+
+enum Taken { by_itself, if_asked };
+struct TierTest {
+  int (*passes)();
+  Taken taken;
+};
+#define QTB_TIER_TEST(tier, TIER, flags, processor, taken, ...) {qtb_serv_cpu_has_##processor, taken},
+constexpr TierTest tier_tests[tier_count] = {QTB_TIER_ROWS(QTB_TIER_TEST)};
+#undef QTB_TIER_TEST
 
 // The tier that QTB_DEBUG_CPU_TYPE asks for, or no_override. A number may be followed by anything, except that 0 has to
 // stand alone: every text without a number reads as 0.
@@ -33,15 +45,17 @@ std::int32_t tier_override() {
   if (platform_environment("QTB_DEBUG_CPU_TYPE", text, sizeof text) == 0) return no_override;
   const std::int32_t number = std::atoi(text);
   if (number == 0) return text[0] == '0' && text[1] == '\0' ? 0 : no_override;
-  return number > 0 && number < tier_count ? number : no_override;
+  return number > 0 && number <= qtb::largest_asked_tier ? number : no_override;
 }
 
+// From the highest tier down, the first whose test passes; no test is made behind it.
 std::int32_t tier_of_processor() {
   if (!qtb_serv_cpu_is_belmo()) return tier_def;
-  if (avx_enabled.load(relaxed) == 1 && qtb_serv_cpu_has_avx()) return tier_avx;
-  if (qtb_serv_cpu_has_sse42()) return tier_sse42;
-  if (qtb_serv_cpu_has_ssse3()) return tier_ssse3;
-  if (qtb_serv_cpu_has_sse3()) return tier_sse3;
+  const std::int32_t asked = asked_tiers.load(relaxed);
+  for (std::int32_t tier = tier_count - 1; tier > tier_def; --tier) {
+    const TierTest &test = tier_tests[tier];
+    if ((test.taken == by_itself || (asked >> tier & 1) != 0) && test.passes()) return tier;
+  }
   return tier_def;
 }
 
@@ -53,8 +67,8 @@ ProcessorTier qtb_serv_cpu_detect() {
   if (known >= 0) return static_cast<ProcessorTier>(known);
 
   const std::int32_t asked = tier_override();
-  if (avx_enabled.load(relaxed) == -1) avx_enabled.store(0, relaxed);
-  if (asked == tier_avx) avx_enabled.store(1, relaxed);
+  if (asked_tiers.load(relaxed) == -1) asked_tiers.store(0, relaxed);
+  if (asked != no_override && tier_tests[asked].taken == if_asked) asked_tiers.store(1 << asked, relaxed);
   const std::int32_t computed = tier_of_processor();
   const std::int32_t tier = asked != no_override ? asked : computed;
   cached_tier.store(tier, relaxed);

@@ -6,7 +6,7 @@
 
 extern "C" {
 
-// The tier of this process, 0 to 4 (ProcessorTier). Decided at the first call, from QTB_DEBUG_CPU_TYPE or the
+// The tier of this process. Decided at the first call, from QTB_DEBUG_CPU_TYPE or the
 // processor, and kept; later calls are a load and a test. Never fails.
 QTB_HIDDEN ProcessorTier qtb_serv_cpu_detect();
 

@@ -27,7 +27,21 @@ struct ThisProcess {
   static bool in_parallel() { return omp_in_parallel() != 0; }
 };
 
-// Levels 1 and 2 have a parallel path on these tiers only.
-inline bool tier_has_parallel_vectors(ProcessorTier tier) { return tier == tier_ssse3 || tier == tier_sse42; }
+// How calls of Levels 1 and 2 take threads, by the tier's row in blas/tiers.h. Level 1 has a rule of limits for each of
+// the others (level1_threads); Level 2 has one for both.
+enum class VectorThreads {
+  serial,    // never
+  by_cache,  // from larger vectors on; how many, by the second-level cache as well
+  capped,    // how many, by the length alone
+};
+
+inline VectorThreads vector_threads(ProcessorTier tier) {
+#define QTB_TIER_THREADS(tier, TIER, flags, processor, taken, vectors, threads, ...) VectorThreads::threads,
+  static constexpr VectorThreads of_tier[tier_count] = {QTB_TIER_ROWS(QTB_TIER_THREADS)};
+#undef QTB_TIER_THREADS
+  return of_tier[tier];
+}
+
+inline bool tier_has_parallel_vectors(ProcessorTier tier) { return vector_threads(tier) != VectorThreads::serial; }
 
 }  // namespace qtb

@@ -3,9 +3,9 @@ if(NOT QTB_INSTRUMENT)
   foreach(tier IN LISTS QTB_TIERS)
     set(list ${CMAKE_CURRENT_BINARY_DIR}/tier_objects_${tier}.txt)
     file(GENERATE OUTPUT ${list} CONTENT "$<JOIN:$<TARGET_OBJECTS:qtb_${tier}>,\n>\n")
-    qtb_add_script_test(tier_objects_test.${tier} COMMAND product/tier_objects_test.sh ${tier} ${list})
+    qtb_add_script_test(tier_objects_test.${tier} COMMAND product/tier_objects_test.sh ${tier} ${list} ${QTB_TIERS})
   endforeach()
-  qtb_add_script_test(tier_objects_self_test COMMAND product/tier_objects_self_test.sh)
+  qtb_add_script_test(tier_objects_self_test COMMAND product/tier_objects_self_test.sh ${QTB_TIERS})
   qtb_add_script_test(exports_test
     COMMAND product/exports_test.sh $<TARGET_FILE:qtb> ${PROJECT_SOURCE_DIR}/blas/routines.def)
   qtb_add_script_test(exports_self_test
@@ -16,6 +16,7 @@ qtb_add_test(interface_test SOURCES product/interface_test.cpp LIBRARIES qtb)
 qtb_add_script_test(kernel_types_test COMMAND product/kernel_types_test.sh ${PROJECT_SOURCE_DIR})
 qtb_add_script_test(repository_test COMMAND product/repository_test.sh ${PROJECT_SOURCE_DIR})
 qtb_add_script_test(repository_self_test COMMAND product/repository_self_test.sh)
+qtb_add_script_test(tier_words_test COMMAND product/tier_words_test.sh ${PROJECT_SOURCE_DIR} ${QTB_TIERS})
 qtb_add_script_test(packages_test COMMAND product/packages_test.sh ${PROJECT_SOURCE_DIR}/tools/packages.sh)
 
 # The exported routines of the shared library, each suite once per tier.

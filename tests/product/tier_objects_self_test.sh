@@ -1,7 +1,9 @@
 #!/bin/sh
-# tier_objects_self_test.sh: shows that tier_objects_test.sh passes a clean object and finds each kind of flaw. Every
-# case compiles a few lines as the object of a tier.
+# tier_objects_self_test.sh tier...: shows that tier_objects_test.sh passes a clean object and finds each kind of flaw.
+# Every case compiles a few lines as the object of a tier. The arguments are all tiers, lowest first.
 set -eu
+
+tiers=$*
 
 check=$(dirname "$0")/tier_objects_test.sh
 folder=$(mktemp -d)
@@ -17,7 +19,8 @@ compile() {
 
 # expect tier name finding: the check of the object finds this; an empty finding says that it passes.
 expect() {
-  if output=$("$check" "$1" "$folder/$2.list" 2>&1); then
+  # shellcheck disable=SC2086 # a list of tiers
+  if output=$("$check" "$1" "$folder/$2.list" $tiers 2>&1); then
     found=
   else
     found=$output
@@ -166,5 +169,10 @@ compile narrowed "" <<'END'
 extern "C" void qtb_blas_avx_xnarrowed(double *x) { x[0] += x[1]; }
 END
 expect avx narrowed "no instruction of the wider encoding"
+
+# A tier without a list of instructions is told to have one, and an unlisted one is not taken for another.
+expect sse5 clean "sse5 is not among the tiers"
+tiers="$tiers sse5"
+expect sse5 clean "into tests/product/mnemonics/sse5.txt"
 
 [ $failures -eq 0 ]

@@ -1,11 +1,12 @@
 #!/bin/sh
-# tier_objects_test.sh tier file: reads every object of a tier, whose paths file lists, and fails on what would let one
-# tier's code reach a processor of another.
+# tier_objects_test.sh tier file tier...: reads every object of a tier, whose paths file lists, and fails on what would
+# let one tier's code reach a processor of another. Behind the file stand all tiers, lowest first.
 #
 #   weak or unique symbols   the linker keeps one of several copies, perhaps that of a higher tier
 #   static initialisers      run at load on every processor
-#   instructions             only those of mnemonics/*.txt up to the tier; the wider encoding (VEX, EVEX) only in the
-#                            avx tier's objects that mnemonics/vex_objects.txt names, each of which has it
+#   instructions             only those of mnemonics/<tier>.txt, which has what a tier adds, up to the tier; the wider
+#                            encoding (VEX, EVEX) only from the first tier on that lists any of it, in the objects that
+#                            mnemonics/vex_objects.txt names, each of which has it
 #   defined global symbols   only qtb_blas_<tier>_x<name> and the inner kernels of GEMM, and a higher tier's name for
 #                            the same procedure
 #   undefined symbols        only the library's own, of no other tier, and the memory routines that a compiler calls
@@ -13,18 +14,9 @@ set -eu
 
 tier=$1
 objects=$2
+shift 2
 lists=$(dirname "$0")/mnemonics
 
-case $tier in
-  def) sets="x86-64" ;;
-  sse3) sets="x86-64 sse3" ;;
-  ssse3) sets="x86-64 sse3 ssse3" ;;
-  sse42 | avx) sets="x86-64 sse3 ssse3 sse42" ;;
-  *)
-    echo "tier_objects_test: no instruction set is known for the tier $tier" >&2
-    exit 2
-    ;;
-esac
 
 # One word per line, without comments.
 words() {
@@ -32,18 +24,29 @@ words() {
 }
 
 expected=$(grep -c . "$objects")
-allowed=$(for set in $sets; do words "$lists/$set.txt"; done | tr '\n' ' ')
-wide=
-vex_objects=
-if [ "$tier" = avx ]; then
-  wide=$(words "$lists/avx.txt" | tr '\n' ' ')
-  vex_objects=$(words "$lists/vex_objects.txt" | tr '\n' ' ')
+known=
+for lower in "$@"; do
+  if [ ! -f "$lists/$lower.txt" ]; then
+    echo "tier_objects_test: the tier $lower has no list of instructions: write what it adds to the tiers below it" \
+      "into tests/product/mnemonics/$lower.txt" >&2
+    exit 2
+  fi
+  known="$known $(words "$lists/$lower.txt" | tr '\n' ' ')"
+  [ "$lower" != "$tier" ] || break
+done
+if [ "$lower" != "$tier" ]; then
+  echo "tier_objects_test: $tier is not among the tiers $*" >&2
+  exit 2
 fi
+wide=$(echo "$known" | tr ' ' '\n' | grep '^v' | tr '\n' ' ' || true)
+allowed=$(echo "$known" | tr ' ' '\n' | grep -v '^v' | tr '\n' ' ')
+vex_objects=
+[ -z "$wide" ] || vex_objects=$(words "$lists/vex_objects.txt" | tr '\n' ' ')
 
 # awk's exit status is the pipeline's; an object that the disassembler cannot read shows as a missing one.
 xargs "${OBJDUMP:-objdump}" -h -t -d -w -M intel --no-show-raw-insn < "$objects" | awk \
   -v tier="$tier" -v allowed="$allowed" -v wide="$wide" -v vex_objects="$vex_objects" \
-  -v expected="$expected" '
+  -v expected="$expected" -v tiers="$*" '
   function reject(what) {
     print object ": " what
     rejected++
@@ -68,7 +71,7 @@ xargs "${OBJDUMP:-objdump}" -h -t -d -w -M intel --no-show-raw-insn < "$objects"
     split("", procedures)
   }
   BEGIN {
-    split("def sse3 ssse3 sse42 avx", order, " ")
+    split(tiers, order, " ")
     for (i in order) rank[order[i]] = i
     set_of(allowed, is_allowed)
     set_of(wide, is_wide)

@@ -12,15 +12,18 @@ inline const char *tier_name(int tier) {
   return names[tier];
 }
 
-// Whether this processor has the instructions of a tier, whatever its vendor.
+// Whether this processor has the instructions of a tier, whatever its vendor: the compiler's own test for each word of
+// the list of tiers.
 inline bool processor_runs(int tier) {
-  switch (tier) {
-    case tier_sse3: return __builtin_cpu_supports("sse3");
-    case tier_ssse3: return __builtin_cpu_supports("ssse3");
-    case tier_sse42: return __builtin_cpu_supports("sse4.2");
-    case tier_avx: return __builtin_cpu_supports("avx");
-    default: return true;
-  }
+  constexpr auto baseline = [] { return true; };
+  constexpr auto sse3 = [] { return __builtin_cpu_supports("sse3") != 0; };
+  constexpr auto ssse3 = [] { return __builtin_cpu_supports("ssse3") != 0; };
+  constexpr auto sse42 = [] { return __builtin_cpu_supports("sse4.2") != 0; };
+  constexpr auto avx = [] { return __builtin_cpu_supports("avx") != 0; };
+#define QTB_TIER_SUPPORTED(tier, TIER, flags, processor, ...) processor,
+  static constexpr bool (*supported[tier_count])() = {QTB_TIER_ROWS(QTB_TIER_SUPPORTED)};
+#undef QTB_TIER_SUPPORTED
+  return supported[tier]();
 }
 
 // f(tier) for each tier that this processor runs.

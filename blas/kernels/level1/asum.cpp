@@ -4,20 +4,24 @@
 // Contiguous vectors (increments 1 and -1) go by vectors whose sign bits are masked off, in four accumulators in
 // rotation. Other increments go one element at a time from the start of the walk; 0 adds element 0 n times.
 
+#include "blas/kernels/level1/tuning.h"
 #include "blas/kernels/simd/repeat.h"
 #include "blas/kernels/simd/vec.h"
 
 namespace qtb::QTB_TIER {
 namespace {
 
-// Elements of the main loop per pass:        def sse3 ssse3 sse42 avx
-constexpr QtbInt dasum_block[tier_count] = {16, 16, 32, 32, 32};
-constexpr QtbInt sasum_block[tier_count] = {32, 32, 32, 64, 64};
+// Elements of the main loop per pass, by column of tuning.h: def sse3 ssse3 sse42
+constexpr QtbInt dasum_block[] = {16, 16, 32, 32};
+constexpr QtbInt sasum_block[] = {32, 32, 32, 64};
+static_assert(sizeof dasum_block / sizeof *dasum_block == column_count &&
+                  sizeof sasum_block / sizeof *sasum_block == column_count,
+              "blas/kernels/level1/asum.cpp: write the elements per pass of every column of tuning.h");
 template <class T>
-constexpr QtbInt asum_block = sizeof(T) == sizeof(double) ? dasum_block[this_tier] : sasum_block[this_tier];
+constexpr QtbInt asum_block = sizeof(T) == sizeof(double) ? dasum_block[this_column] : sasum_block[this_column];
 
 // Whether this tier's processors want vectors on their boundary; the others read them wherever they are.
-constexpr bool peels = this_tier < tier_sse42;
+constexpr bool peels = this_column < column_sse42;
 
 constexpr QtbInt accumulators = 4;
 

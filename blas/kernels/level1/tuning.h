@@ -1,8 +1,8 @@
 // The sizes that tell the tiers of the basic vector kernels apart.
 //
-// A kernel takes its row and its tier's column; nothing else about unrolling or about operands of different alignment
-// is decided elsewhere. Sizes are elements per pass. The sse42 and avx tiers have one column: the same code in 16-byte
-// vectors.
+// A kernel takes its row and the column that its tier's row in blas/tiers.h names; nothing else about unrolling or
+// about operands of different alignment is decided elsewhere. Sizes are elements per pass. The sse42 and avx tiers have
+// one column: the same code in 16-byte vectors.
 #pragma once
 
 #include "blas/kernels/kernel.h"
@@ -31,6 +31,13 @@ struct Tuning {
   QtbInt short_limit = 0;  // if above 0: single elements below this length, or at an address between elements
 };
 
+// The columns, in the order of the tiers that have them first.
+enum Column { column_def, column_sse3, column_ssse3, column_sse42, column_count };
+#define QTB_TIER_COLUMN(tier, TIER, flags, processor, taken, vectors, ...) column_##vectors,
+constexpr Column tier_columns[tier_count] = {QTB_TIER_ROWS(QTB_TIER_COLUMN)};
+#undef QTB_TIER_COLUMN
+constexpr Column this_column = tier_columns[this_tier];
+
 enum Row {
   row_ddot,
   row_sdot,
@@ -54,7 +61,7 @@ enum Row {
 };
 
 // clang-format off
-constexpr Tuning tuning_table[row_count][4] = {
+constexpr Tuning tuning_table[row_count][column_count] = {
   //           def                            sse3                           ssse3                          sse42 and avx
   /* ddot  */ {{16,  8, 2, halves},          {32,  8, 2, halves},           {32, 32, 4, rejoin},           {32, 32, 1, no_peel}},
   /* sdot  */ {{32,  1, 1, singles},         {32,  1, 1, singles},          {32, 32, 4, halves},           {64, 64, 1, no_peel}},
@@ -77,25 +84,33 @@ constexpr Tuning tuning_table[row_count][4] = {
 };
 // clang-format on
 
+consteval bool tuning_table_is_full() {
+  for (const auto &row : tuning_table)
+    for (const Tuning &sizes : row)
+      if (sizes.same == 0) return false;
+  return true;
+}
+static_assert(tuning_table_is_full(), "blas/kernels/level1/tuning.h: write the sizes of every column into every row");
+
 template <Row row>
-constexpr Tuning tuning = tuning_table[row][this_tier < tier_sse42 ? this_tier : tier_sse42];
+constexpr Tuning tuning = tuning_table[row][this_column];
 
 // How a dot product joins its four accumulators: one after the other, ((a0 + a1) + a2) + a3, and single elements before
 // that in lane 0 of a0; or in pairs, (a3 + a2) + (a1 + a0), and single elements after the sum of the lanes.
 enum Joining { in_a_chain, in_pairs };
-constexpr Joining joining = this_tier < tier_sse42 ? in_a_chain : in_pairs;
+constexpr Joining joining = this_column < column_sse42 ? in_a_chain : in_pairs;
 
 // Whether two increments equal to -1 run the contiguous path, which pairs the same elements. Dot products and complex
 // axpy of the upper tiers walk them backwards instead.
-constexpr bool backward_is_contiguous_in_dots = this_tier < tier_sse42;
+constexpr bool backward_is_contiguous_in_dots = this_column < column_sse42;
 
 // Whether the loops of complex dot products duplicate the parts of x, rather than swap them.
-constexpr bool duplicates_parts = this_tier == tier_sse3 || this_tier == tier_ssse3;
+constexpr bool duplicates_parts = this_column == column_sse3 || this_column == column_ssse3;
 
 // Whether a scal returns at once for an alpha of one.
 template <Row row>
-constexpr bool returns_for_one = (row == row_dscal && this_tier >= tier_sse3) ||
-                                 (row == row_zscal && this_tier == tier_ssse3);
+constexpr bool returns_for_one = (row == row_dscal && this_column >= column_sse3) ||
+                                 (row == row_zscal && this_column == column_ssse3);
 
 }  // namespace
 }  // namespace qtb::QTB_TIER

@@ -31,6 +31,14 @@ void sow_zeros(Stored<T> &a) {
       if (generator() % 4 == 0) *a.at(i, j) = value<T>(generator() % 2 == 0 ? 0.0 : -0.0, -0.0);
 }
 
+TYPED_TEST(GemmCopies, HaveAFamilyOfEveryTier) {
+  for (int tier = 0; tier < tier_count; tier++) {
+    bool found = false;
+    for (const Pieces<TypeParam> &p : families<TypeParam>) found = found || p.tier == tier;
+    EXPECT_TRUE(found) << "write the tier " << tier_name(tier) << " into tests/kernels/level3/gemm_families.h";
+  }
+}
+
 TYPED_TEST(GemmCopies, PacksAWithAlphaBitByBitAndLeavesOutTheRowsBeyondATile) {
   using T = TypeParam;
   for (const Pieces<T> &p : families<T>) {

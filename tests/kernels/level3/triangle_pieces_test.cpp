@@ -10,6 +10,9 @@ namespace qtb::test {
 namespace {
 
 constexpr int block_tiers[] = {tier_ssse3, tier_sse42, tier_avx};
+static_assert(tier_set::PIECES == (tier_set::SSSE3 | tier_set::SSE42 | tier_set::AVX),
+              "tests/kernels/level3/triangle_pieces_test.cpp: write the new tier into block_tiers, and after SSSE3, "
+              "SSE42 and AVX wherever they stand below");
 #define QTB_BLOCK_TIERS(name) \
   { qtb_blas_ssse3_x##name, qtb_blas_sse42_x##name, qtb_blas_avx_x##name }
 

@@ -79,6 +79,9 @@ std::map<std::string, Rules> read_rules() {
   return rules;
 }
 
+static_assert(tier_count == 5,
+              "tests/thread/level1/decision_test.cpp: say in the transcription how calls of the new tier take threads, "
+              "and list it in front_ends_test.cpp beside it");
 Outcome transcription(const Rules &rules, QtbInt n, QtbInt incx, QtbInt incy, const Answers &answers) {
   const auto below = [&](Column column) { return rules[column].has_value() && n < *rules[column]; };
   if (below(min_n)) return {};

@@ -30,6 +30,10 @@ const GemvRule gemv_rules[] = {
     {"zgemv", gemv_limits::zgemv, 64, 32, 1024, 512, 32, 1024, 512, false},
 };
 
+static_assert(
+    tier_count == 5,
+    "tests/thread/level2/decision_test.cpp: say in the two rules and in the tiers that are listed how calls of "
+    "the new tier take threads, and list it in front_ends_test.cpp beside it");
 QtbInt ruled_threads(const GemvRule &r, char trans, QtbInt m, QtbInt n, const Answers &answers, std::string &asked) {
   asked = "";
   if (m < r.small_dim && n < r.small_dim) return 1;

@@ -97,6 +97,8 @@ bool in_triangle(char uplo, QtbInt i, QtbInt j) { return uplo == 'U' ? i <= j : 
 // ---- The world of a test ----
 
 // A tier's procedures behind the slots that the drivers call. The block slots begin with tier ssse3.
+static_assert(tier_set::PIECES == (tier_set::SSSE3 | tier_set::SSE42 | tier_set::AVX),
+              "tests/thread/level2/drivers_test.cpp: write the block of the new tier into QTB_BLOCK_TARGETS");
 #define QTB_BLOCK_TARGETS(name) \
   { qtb_blas_ssse3_x##name, qtb_blas_sse42_x##name, qtb_blas_avx_x##name }
 void put_behind_slots(int tier) {

@@ -32,6 +32,9 @@ GemmDecision decide(char type, Int m, Int n, Int k, const Answers &answers, std:
 
 // On every machine, for every number of threads, in and out of a region: the class, the road, and the questions in
 // their order. The product is one for which threads pay, or do not.
+static_assert(tier_count == 5,
+              "tests/thread/level3/gemm_rules.h: write the machine class of the new tier into class_of");
+
 TEST(GemmDecision, EveryMachineMatchesTheTranscriptionAndAsksInOrder) {
   constexpr std::uint32_t small_l2 = 3145728;
   for (int tier = -2; tier <= 7; ++tier)

@@ -37,6 +37,15 @@ inline constexpr GemmMachine gemm_machines[] = {
     {"sse42_small_l3", tier_sse42, machine_sse42, true, false, 256, 4096},
     {"avx", tier_avx, machine_avx, true, false, 256, 8192},
 };
+consteval bool machines_of_every_tier() {
+  unsigned found = 0;
+  for (const GemmMachine &machine : gemm_machines) found |= 1U << machine.tier;
+  return found == tier_set::ALL;
+}
+static_assert(
+    machines_of_every_tier(),
+    "tests/thread/level3/gemm_machines.h: write a row for each machine class of every tier, and its name into "
+    "tests/thread/suites.cmake");
 
 // Makes this process the machine. Ends it as skipped where the processor cannot run the machine's tier.
 inline void become(const GemmMachine &machine) {

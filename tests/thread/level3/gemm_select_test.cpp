@@ -117,7 +117,9 @@ TEST(GemmSelect, EveryThreadSelectsTheSamePlan) {
 // The tiers that a class is of.
 unsigned tiers_of(int machine_class) {
   using namespace qtb::tier_set;
-  const unsigned tiers[qtb::machine_class_count] = {DEF | SSE3, SSSE3, SSSE3, SSE42, SSSE3, AVX, DEF};
+  constexpr unsigned tiers[qtb::machine_class_count] = {DEF | SSE3, SSSE3, SSSE3, SSE42, SSSE3, AVX, DEF};
+  static_assert((tiers[0] | tiers[1] | tiers[2] | tiers[3] | tiers[4] | tiers[5] | tiers[6]) == ALL,
+                "tests/thread/level3/gemm_select_test.cpp: write every tier into the set of its machine class");
   return tiers[machine_class];
 }
 

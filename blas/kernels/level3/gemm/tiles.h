@@ -140,6 +140,19 @@ constexpr GemmRules gemm_rules[] = {
 };
 // clang-format on
 
+consteval bool every_tier_has_rules() {
+  constexpr char kinds[] = {'s', 'd', 'c', 'z'};
+  for (const char kind : kinds) {
+    unsigned found = 0;
+    for (const GemmRules &row : gemm_rules)
+      if (row.kind == kind && row.family == Family::base) found |= row.tiers;
+    if (found != tier_set::ALL) return false;
+  }
+  return true;
+}
+static_assert(every_tier_has_rules(),
+              "blas/kernels/level3/gemm/tiles.h: write every tier into a row of a base family of each type");
+
 // The row of a type, tier and family; one that does not exist is an error at compile time.
 consteval GemmRules find_rules(char kind, ProcessorTier tier, Family family) {
   for (const GemmRules &row : gemm_rules)

@@ -78,18 +78,24 @@ inline QtbInt level1_threads_large_cache(const Level1Limits &limits, QtbInt n, Q
 template <class Process>
 QtbInt level1_threads(const Level1Limits &limits, QtbInt n, QtbInt incx, QtbInt incy, Process &&process) {
   if (n < limits.min_n) return level1_serial;
-  const ProcessorTier tier = process.tier();
-  if (!tier_has_parallel_vectors(tier)) return level1_serial;
-  if (tier == tier_ssse3 && n < limits.min_n_ssse3) return level1_serial;
+  const VectorThreads rule = vector_threads(process.tier());
+  if (rule == VectorThreads::serial) return level1_serial;
+  if (rule == VectorThreads::by_cache && n < limits.min_n_ssse3) return level1_serial;
   if (incx == 0 || incy == 0) return level1_serial;
   const QtbInt threads = process.max_threads();
   if (threads < 2) return level1_serial;
   if (!process.dynamic()) return threads;
-  if (tier == tier_sse42) return level1_threads_sse42(limits, n, threads);
-  std::uint32_t cache_table[cache_size_entries];
-  process.cache_sizes(cache_table);
-  return has_small_second_level(cache_table) ? level1_threads_small_cache(limits, n, threads)
-                                             : level1_threads_large_cache(limits, n, threads);
+  switch (rule) {
+    case VectorThreads::serial: break;
+    case VectorThreads::capped: return level1_threads_sse42(limits, n, threads);
+    case VectorThreads::by_cache: {
+      std::uint32_t cache_table[cache_size_entries];
+      process.cache_sizes(cache_table);
+      return has_small_second_level(cache_table) ? level1_threads_small_cache(limits, n, threads)
+                                                 : level1_threads_large_cache(limits, n, threads);
+    }
+  }
+  return level1_serial;
 }
 
 // With dynamic mode off these routines run on one thread, the reverse of the others.

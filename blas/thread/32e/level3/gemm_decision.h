@@ -91,8 +91,7 @@ GemmDecision gemm_decision(QtbInt m, QtbInt n, QtbInt k, Process &&process) {
       if (decision.machine_class == machine_sse41_small_l2 && process.in_parallel()) decision.road = gemm_in_slices;
     return decision;
   }
-  const GemmMachineClass machine = decision.machine_class;
-  decision.tuned = machine != machine_plain && machine != machine_avx && machine != machine_family16;
+  decision.tuned = gemm_class_is_tuned(decision.machine_class);
   // Where strategies are not tuned, threads always pay.
   if (!decision.tuned || gemm_threads_pay<T>(m, n, k, decision.threads)) decision.road = gemm_parallel;
   return decision;

@@ -241,7 +241,9 @@ void select(Selection<double> &s) {
     case machine_sse42: return select_sse42(s);
     case machine_sse41_large_l2:
     case machine_sse41_small_l2: return select_sse41(s);
-    default: return s.row_or_col();
+    case machine_plain:
+    case machine_avx:
+    case machine_class_count: return s.row_or_col();
   }
 }
 
@@ -278,7 +280,10 @@ void select(Selection<float> &s) {
     case machine_sse42: s.make_even(); return select_grid_sse42(s);
     case machine_sse41_large_l2:
     case machine_sse41_small_l2: return select_sse41(s);
-    default: return s.row_or_col();
+    case machine_plain:
+    case machine_avx:
+    case machine_family16:
+    case machine_class_count: return s.row_or_col();
   }
 }
 
@@ -321,7 +326,10 @@ void select_complex(Selection<T> &s) {
       if (!is_large(s)) return s.bcopy_sse41();
       return s.abcopy(machine == machine_sse41_small_l2 ? complex_limits<T>.mb_small_l2
                                                         : complex_limits<T>.mb_large_l2);
-    default: return s.row_or_col();
+    case machine_plain:
+    case machine_avx:
+    case machine_family16:
+    case machine_class_count: return s.row_or_col();
   }
 }
 void select(Selection<cfloat> &s) { select_complex(s); }
