@@ -45,7 +45,7 @@ constexpr bool gemm_class_is_tuned(GemmMachineClass machine_class) {
     case machine_sse41_small_l2: return true;
     case machine_plain:
     case machine_avx:
-    case machine_family16:
+    case machine_family16: return false;
     case machine_class_count: break;
   }
   return false;
