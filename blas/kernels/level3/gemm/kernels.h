@@ -53,7 +53,14 @@ constexpr KernelRecord<InnerProcedure<T>> inner_kernel_in{};
 #include "blas/kernels/level3/gemm/kernels.def"
 
 template <class T, Family family>
-constexpr KernelRecord<InnerProcedure<T>> inner_kernel = inner_kernel_in<this_tier, T, family>;
+consteval KernelRecord<InnerProcedure<T>> find_inner_kernel() {
+  constexpr KernelRecord<InnerProcedure<T>> record = inner_kernel_in<this_tier, T, family>;
+  static_assert(record.any != nullptr,
+                "blas/kernels/level3/gemm/kernels.def: write the inner kernel of this family, type and tier");
+  return record;
+}
+template <class T, Family family>
+constexpr KernelRecord<InnerProcedure<T>> inner_kernel = find_inner_kernel<T, family>();
 
 // A family without a kernel of its own for B in place: one micro-panel at a time is packed into the stage, ahead of
 // what the inner kernel has there.

@@ -52,6 +52,19 @@ constexpr LimitRow limit_rows[] = {
 };
 // clang-format on
 
+consteval bool every_tier_has_limits() {
+  constexpr char kinds[] = {'s', 'd', 'c', 'z'};
+  for (const char kind : kinds) {
+    unsigned found = 0;
+    for (const LimitRow &row : limit_rows)
+      if (row.kind == kind && row.family == Family::base && row.form == BodyForm::full) found |= row.tiers;
+    if (found != tier_set::ALL) return false;
+  }
+  return true;
+}
+static_assert(every_tier_has_limits(),
+              "blas/kernels/level3/gemm/limits.h: write every tier into a row of the full body of each type");
+
 // A form without a row of its own has the limits of the full body.
 consteval SmallLimits find_limits(char kind, ProcessorTier tier, Family family, BodyForm form) {
   for (const LimitRow &row : limit_rows)
