@@ -18,22 +18,27 @@ set(QTB_KERNEL_SOURCES
   blas/kernels/level1/scal.cpp
   blas/kernels/level1/sparse.cpp
   blas/kernels/level1/swap.cpp
+  # level2
+  blas/kernels/level2/diagonal_kernels.cpp
+  blas/kernels/level2/gemv.cpp
+  blas/kernels/level2/ger.cpp
+  blas/kernels/level2/trmv.cpp
+  blas/kernels/level2/trsv.cpp
   # level3
   blas/kernels/level3/gemm/scale_c.cpp
   blas/kernels/level3/gemm/small.cpp
   # plain
-  blas/kernels/plain/gemv.cpp
-  blas/kernels/plain/ger.cpp
+  blas/kernels/plain/gbmv.cpp
   blas/kernels/plain/symm.cpp
   blas/kernels/plain/symv.cpp
   blas/kernels/plain/syr.cpp
   blas/kernels/plain/syr2.cpp
   blas/kernels/plain/syr2k.cpp
   blas/kernels/plain/syrk.cpp
+  blas/kernels/plain/tbmv.cpp
+  blas/kernels/plain/tbsv.cpp
   blas/kernels/plain/trmm.cpp
-  blas/kernels/plain/trmv.cpp
   blas/kernels/plain/trsm.cpp
-  blas/kernels/plain/trsv.cpp
 )
 
 # Compiled for some tiers only: these lists alone decide where.
@@ -47,6 +52,7 @@ set(QTB_KERNEL_SOURCES_def
   blas/kernels/level3/gemm/pack.cpp
 )
 set(QTB_KERNEL_SOURCES_sse3
+  blas/kernels/level2/gemv_kernels.cpp
   blas/kernels/level3/gemm/def/folding_gemm.cpp
   blas/kernels/level3/gemm/def/folding_kernels.cpp
   blas/kernels/level3/gemm/pack.cpp
@@ -54,6 +60,7 @@ set(QTB_KERNEL_SOURCES_sse3
   blas/kernels/level3/gemm/sse3/dgemm_kernel.cpp
 )
 set(QTB_KERNEL_SOURCES_ssse3
+  blas/kernels/level2/gemv_kernels.cpp
   blas/kernels/level3/gemm/blocks.cpp
   blas/kernels/level3/gemm/pieces.cpp
   blas/kernels/level3/gemm/ssse3/blocks.cpp
@@ -62,6 +69,7 @@ set(QTB_KERNEL_SOURCES_ssse3
   blas/kernels/level3/gemm/ssse3/pack.cpp
 )
 set(QTB_KERNEL_SOURCES_sse42
+  blas/kernels/level2/gemv_kernels.cpp
   blas/kernels/level3/gemm/blocks.cpp
   blas/kernels/level3/gemm/gemm.cpp
   blas/kernels/level3/gemm/pack.cpp
@@ -71,6 +79,7 @@ set(QTB_KERNEL_SOURCES_sse42
   blas/kernels/level3/gemm/sse42/pieces.cpp
 )
 set(QTB_KERNEL_SOURCES_avx
+  blas/kernels/level2/gemv_kernels.cpp
   blas/kernels/level3/gemm/avx/dgemm_kernel.cpp
   blas/kernels/level3/gemm/blocks.cpp
   blas/kernels/level3/gemm/gemm.cpp
@@ -108,6 +117,12 @@ if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
   foreach(routine asum complex_dot)
     set_property(SOURCE blas/kernels/level1/${routine}.cpp APPEND PROPERTY COMPILE_OPTIONS -frename-registers)
   endforeach()
+endif()
+
+# The inner kernels of GEMV read and write by halves what stands 8 bytes off a boundary: the compiler would join them.
+if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
+  set_property(SOURCE blas/kernels/level2/gemv_kernels.cpp APPEND PROPERTY COMPILE_OPTIONS
+    -mtune-ctrl=^sse_unaligned_load_optimal,^sse_unaligned_store_optimal)
 endif()
 
 # Compiled once.

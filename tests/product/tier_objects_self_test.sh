@@ -59,8 +59,17 @@ expect avx named "global symbol qtb_blas_ssse3_xnamed"
 compile kernel "" <<'END'
 extern "C" void qtb_blas_sse42_zgemm_kernel_cu(double *x) { x[0] += x[1]; }
 extern "C" void qtb_blas_sse42_sgemm_nobcopy_kernel(float *x) { x[0] += x[1]; }
+extern "C" void qtb_blas_sse42_cgemv_t_odd(float *x) { x[0] += x[1]; }
+extern "C" void qtb_blas_sse42_zgemv_c(double *x) { x[0] += x[1]; }
+extern "C" void qtb_blas_sse42_strsv_diag_unn(float *x) { x[0] += x[1]; }
+extern "C" void qtb_blas_sse42_ztrmv_diag(double *x) { x[0] += x[1]; }
 END
 expect sse42 kernel ""
+
+compile misnamed "" <<'END'
+extern "C" void qtb_blas_sse42_dgemv_n_third(double *x) { x[0] += x[1]; }
+END
+expect sse42 misnamed "global symbol qtb_blas_sse42_dgemv_n_third"
 expect avx kernel "global symbol qtb_blas_sse42_zgemm_kernel_cu"
 
 compile shared "" <<'END'

@@ -32,6 +32,13 @@ template <class T, int count, template <class> class Even, template <class> clas
 struct Columns {
   const T *p[count];
 
+  explicit Columns(const T *const (&columns)[count]) {
+    repeat<count>([&](auto j) __attribute__((always_inline)) { p[j.value] = columns[j.value]; });
+  }
+  // Side by side in a matrix.
+  Columns(const T *a, QtbInt lda) {
+    repeat<count>([&](auto j) __attribute__((always_inline)) { p[j.value] = a + j.value * lda; });
+  }
   template <int j>
   const T *row() const {
     return p[j];
@@ -49,6 +56,24 @@ struct Columns {
 };
 
 // ---- Single rows ----
+
+// An element at any address, in its parts.
+template <class T>
+T load_element(const T *p) {
+  if constexpr (is_complex<T>)
+    return {load_single(parts(p)), load_single(parts(p) + 1)};
+  else
+    return load_single(p);
+}
+template <class T>
+void store_element(T *p, T v) {
+  if constexpr (is_complex<T>) {
+    store_single(parts(p), v.re);
+    store_single(parts(p) + 1, v.im);
+  } else {
+    store_single(p, v);
+  }
+}
 
 // One element of an update: of a complex one the whole vector is filled with it, so that no lane computes anything
 // else.
@@ -149,6 +174,8 @@ struct ColumnSums {
   [[gnu::always_inline]] T total(int j) const {
     return sum_lanes(sum[j]);
   }
+  // Two columns as one: the vectors are added before their lanes.
+  void join_first_two() { sum[0] = add(sum[0], sum[1]); }
 };
 
 // The sum of a vector's complex elements.
@@ -180,6 +207,10 @@ struct ColumnSums<Complex<R>, count> {
   [[gnu::always_inline]] void add_lowest_product(V column, const RowFactor<Complex<R>> &x) {
     add_product<j>(column, x);
   }
+  void join_first_two() {
+    by_re[0] = add(by_re[0], by_re[1]);
+    by_im[0] = add(by_im[0], by_im[1]);
+  }
   template <bool conjugated>
   [[gnu::always_inline]] Complex<R> total(int j) const {
     const Complex<R> a = sum_complex(by_re[j]), b = sum_complex(by_im[j]);
@@ -189,6 +220,30 @@ struct ColumnSums<Complex<R>, count> {
       return {a.re - b.im, a.im + b.re};
   }
 };
+
+// The totals of two doubles or four floats at once, in the order in which sum_lanes() adds lanes.
+inline __m128d sum_lanes_of(const __m128d *v) { return add(_mm_unpacklo_pd(v[0], v[1]), _mm_unpackhi_pd(v[0], v[1])); }
+inline __m128 sum_lanes_of(const __m128 *v) {
+  const __m128 a = add(_mm_unpacklo_ps(v[0], v[1]), _mm_unpackhi_ps(v[0], v[1]));
+  const __m128 b = add(_mm_unpacklo_ps(v[2], v[3]), _mm_unpackhi_ps(v[2], v[3]));
+  return add(_mm_movelh_ps(a, b), _mm_movehl_ps(b, a));
+}
+
+// y[j] += alpha * the total of column j.
+template <int count, class T>
+[[gnu::always_inline]] inline void add_totals(const ColumnSums<T, count> &sums, bool conjugated, T alpha, T *y) {
+  if constexpr (!is_complex<T> && count % lanes<T> == 0) {
+    repeat<count / lanes<T>>([&](auto k) __attribute__((always_inline)) {
+      constexpr int at = k.value * lanes<T>;
+      store_halves(y + at, add(load_halves(y + at), mul(broadcast(alpha), sum_lanes_of(sums.sum + at))));
+    });
+  } else {
+    repeat<count>([&](auto j) __attribute__((always_inline)) {
+      const T sum = conjugated ? sums.template total<true>(j.value) : sums.template total<false>(j.value);
+      store_element(y + j.value, load_element(y + j.value) + alpha * sum);
+    });
+  }
+}
 
 // ---- Walks ----
 //
@@ -297,40 +352,69 @@ struct AddingDotRows {
 template <class T>
 constexpr QtbInt shortest_sweep = sizeof(T) == sizeof(float) ? 11 : 9;
 
-// Whether sweeps take vectors: there are enough rows, and single rows bring p to a boundary.
+// Whether a sweep over so many rows goes by vectors, with p on a boundary after some single rows.
 template <class T>
 bool sweeps_by_vectors(QtbInt rows, const T *p) {
   return rows >= shortest_sweep<T> && element_aligned(p);
 }
 
-// aligned is the operand of the walk that its passes expect on a boundary; its single rows bring it there.
-template <class T, class Walk, class Cursor>
-[[gnu::always_inline]] inline void sweep(QtbInt rows, Walk &walk, const Cursor &aligned) {
-  constexpr QtbInt pass = 8;
-  if (sweeps_by_vectors<T>(rows, static_cast<const T *>(aligned.p))) {
-    for (; phase(aligned.p) != 0; --rows) walk.single();
-    for (; rows >= pass; rows -= pass) walk.template pass<pass / lanes<T>>();
-  }
+constexpr QtbInt rows_per_pass = 8;
+
+// Passes as long as there are rows for one; returns how many rows are left.
+template <class T, class Walk>
+[[gnu::always_inline]] inline QtbInt passes(QtbInt rows, Walk &walk) {
+  for (; rows >= rows_per_pass; rows -= rows_per_pass) walk.template pass<rows_per_pass / lanes<T>>();
+  return rows;
+}
+template <class T, class Walk>
+[[gnu::always_inline]] inline QtbInt vector_rows(QtbInt rows, Walk &walk) {
+  for (; rows >= lanes<T>; rows -= lanes<T>) walk.template pass<1>();
+  return rows;
+}
+template <class Walk>
+[[gnu::always_inline]] inline void single_rows(QtbInt rows, Walk &walk) {
   for (; rows > 0; --rows) walk.single();
+}
+template <class Walk, class Cursor>
+[[gnu::always_inline]] inline QtbInt rows_to_boundary(QtbInt rows, Walk &walk, const Cursor &cursor) {
+  for (; phase(cursor.p) != 0; --rows) walk.single();
+  return rows;
 }
 
 template <class T, int count>
 using AnyColumns = Columns<T, count, Unaligned, Unaligned>;
 
+// An element of y does not depend on how its row is taken, so that few rows may go by vectors as well.
+template <int count, class T>
+[[gnu::always_inline]] inline void add_sweep(QtbInt rows, const AnyColumns<T, count> &columns,
+                                             const ColumnFactors<T, count> &factors, T *y) {
+  using Factors = ColumnFactors<T, count>;
+  if (!sweeps_by_vectors(rows, y)) {
+    AddingRows<T, AnyColumns<T, count>, Unaligned<T>, Factors> few{columns, {y}, factors};
+    return single_rows(vector_rows<T>(rows, few), few);
+  }
+  AddingRows<T, AnyColumns<T, count>, Aligned<T>, Factors> walk{columns, {y}, factors};
+  rows = passes<T>(rows_to_boundary(rows, walk, walk.y), walk);
+  single_rows(vector_rows<T>(rows, walk), walk);
+}
+
+template <int count, class T>
+[[gnu::always_inline]] inline void dot_sweep(QtbInt rows, const AnyColumns<T, count> &columns, const T *x,
+                                             ColumnSums<T, count> &sums) {
+  DotRows<T, count, AnyColumns<T, count>, Aligned<const T>> walk{columns, {x}, sums};
+  if (sweeps_by_vectors(rows, x)) rows = vector_rows<T>(passes<T>(rows_to_boundary(rows, walk, walk.x), walk), walk);
+  single_rows(rows, walk);
+}
+
 template <int count, class T>
 [[gnu::noinline]] void add_columns(QtbInt rows, const T *const (&columns)[count], const T (&factors)[count], T *y) {
-  const ColumnFactors<T, count> f(factors);
-  AddingRows<T, AnyColumns<T, count>, Aligned<T>, ColumnFactors<T, count>> walk{{}, {y}, f};
-  repeat<count>([&](auto j) { walk.columns.p[j.value] = columns[j.value]; });
-  sweep<T>(rows, walk, walk.y);
+  add_sweep(rows, AnyColumns<T, count>(columns), ColumnFactors<T, count>(factors), y);
 }
 
 template <int count, bool conjugated, class T>
 [[gnu::noinline]] void dot_columns(QtbInt rows, const T *const (&columns)[count], const T *x, T (&sums)[count]) {
   ColumnSums<T, count> s;
-  DotRows<T, count, AnyColumns<T, count>, Aligned<const T>> walk{{}, {x}, s};
-  repeat<count>([&](auto j) { walk.columns.p[j.value] = columns[j.value]; });
-  sweep<T>(rows, walk, walk.x);
+  dot_sweep(rows, AnyColumns<T, count>(columns), x, s);
   repeat<count>([&](auto j) { sums[j.value] += s.template total<conjugated>(j.value); });
 }
 
@@ -339,9 +423,10 @@ template <int count, bool conjugated, class T>
                                    T *y, T (&sums)[count]) {
   const ColumnFactors<T, count> f(factors);
   ColumnSums<T, count> s;
-  AddingDotRows<T, count, AnyColumns<T, count>, Unaligned<const T>, Aligned<T>> walk{{}, {x}, {y}, f, s};
-  repeat<count>([&](auto j) { walk.columns.p[j.value] = columns[j.value]; });
-  sweep<T>(rows, walk, walk.y);
+  AddingDotRows<T, count, AnyColumns<T, count>, Unaligned<const T>, Aligned<T>> walk{
+      AnyColumns<T, count>(columns), {x}, {y}, f, s};
+  if (sweeps_by_vectors(rows, y)) rows = passes<T>(rows_to_boundary(rows, walk, walk.y), walk);
+  single_rows(rows, walk);
   repeat<count>([&](auto j) { sums[j.value] += s.template total<conjugated>(j.value); });
 }
 

@@ -1,7 +1,8 @@
-// Cursors: an operand of a pass over contiguous elements, and how its vectors are reached.
+// Cursors: an operand of a pass over many elements, and how its vectors are reached.
 //
-// T is const for an operand that is only read. at(k) is the first element of vector k of the pass. Nothing but the
-// vectors themselves is touched; beyond, the number of elements that a load takes from behind its own vector, is 0.
+// T is const for an operand that is only read. p is the next element, at(k) the first one of vector k of the pass.
+// Nothing but the vectors themselves is touched: beyond, the number of elements that a load takes from behind its own
+// vector, is 0.
 #pragma once
 
 #include "blas/kernels/simd/vec.h"
@@ -37,6 +38,17 @@ struct Halves {
   auto load(int k) const { return load_halves(parts(p + k * lanes<T>)); }
   void store(int k, Vec<T> v) const { store_halves(parts(p + k * lanes<T>), v); }
   void advance(QtbInt elements) { p += elements; }
+};
+
+// Elements inc apart.
+template <class T>
+struct Strided {
+  static constexpr QtbInt beyond = 0;
+  T *p;
+  QtbInt inc;
+  auto load(int k) const { return gather(p + k * lanes<T> * inc, inc); }
+  void store(int k, Vec<T> v) const { scatter(p + k * lanes<T> * inc, inc, v); }
+  void advance(QtbInt elements) { p += elements * inc; }
 };
 
 }  // namespace

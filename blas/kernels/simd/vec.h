@@ -78,8 +78,8 @@ void store_single(T *p, T v) {
 
 // Two 8-byte loads, for the tiers whose processors read a misaligned vector slowly.
 inline __m128 load_halves(const float *p) {
-  return _mm_loadh_pi(_mm_loadl_pi(_mm_setzero_ps(), reinterpret_cast<const __m64 *>(p)),
-                      reinterpret_cast<const __m64 *>(p + 2));
+  const __m128d low = _mm_set_sd(load_single(reinterpret_cast<const double *>(p)));
+  return _mm_loadh_pi(_mm_castpd_ps(low), reinterpret_cast<const __m64 *>(p + 2));
 }
 inline __m128d load_halves(const double *p) { return _mm_set_pd(load_single(p + 1), load_single(p)); }
 inline void store_halves(float *p, __m128 v) {

@@ -1,15 +1,10 @@
-// trsv, tbsv, tpsv: x := op(T)^-1*x, in place, for a full, band or packed triangle.
+// tbsv, tpsv: x := op(T)^-1*x, in place, for a band or packed triangle.
 //
 // By substitution with true divisions; a zero on the diagonal gives infinities or NaNs.
 #include "blas/kernels/plain/triangular.h"
 
 namespace qtb::QTB_TIER {
 namespace {
-
-template <class T>
-QTB_FUNCTION(trmv, T, trsv) {
-  triangular_solve(triangle(uplo, a, *lda, *n), read_op<T>(trans), is_letter(*diag, 'U'), vector(x, *n, *incx));
-}
 
 template <class T>
 QTB_FUNCTION(tbmv, T, tbsv) {
@@ -24,10 +19,6 @@ QTB_FUNCTION(tpmv, T, tpsv) {
 
 }  // namespace
 
-QTB_KERNEL(strsv, trmv, float, trsv<float>)
-QTB_KERNEL(dtrsv, trmv, double, trsv<double>)
-QTB_KERNEL(ctrsv, trmv, cfloat, trsv<cfloat>)
-QTB_KERNEL(ztrsv, trmv, cdouble, trsv<cdouble>)
 QTB_KERNEL(stbsv, tbmv, float, tbsv<float>)
 QTB_KERNEL(dtbsv, tbmv, double, tbsv<double>)
 QTB_KERNEL(ctbsv, tbmv, cfloat, tbsv<cfloat>)
