@@ -18,6 +18,10 @@ set(QTB_KERNEL_SOURCES
   blas/kernels/level1/scal.cpp
   blas/kernels/level1/sparse.cpp
   blas/kernels/level1/swap.cpp
+  # level2
+  blas/kernels/level2/symv.cpp
+  blas/kernels/level2/syr.cpp
+  blas/kernels/level2/syr2.cpp
   # level3
   blas/kernels/level3/gemm/scale_c.cpp
   blas/kernels/level3/gemm/small.cpp
@@ -25,9 +29,6 @@ set(QTB_KERNEL_SOURCES
   blas/kernels/plain/gemv.cpp
   blas/kernels/plain/ger.cpp
   blas/kernels/plain/symm.cpp
-  blas/kernels/plain/symv.cpp
-  blas/kernels/plain/syr.cpp
-  blas/kernels/plain/syr2.cpp
   blas/kernels/plain/syr2k.cpp
   blas/kernels/plain/syrk.cpp
   blas/kernels/plain/trmm.cpp

@@ -27,16 +27,6 @@ namespace {
 //
 // beyond is the number of elements that a load takes from behind its own vector.
 
-template <class T>
-struct Strided {
-  static constexpr QtbInt beyond = 0;
-  T *p;
-  QtbInt inc;
-  auto load(int k) const { return gather(p + k * lanes<T> * inc, inc); }
-  void store(int k, Vec<T> v) const { scatter(p + k * lanes<T> * inc, inc, v); }
-  void advance(QtbInt elements) { p += elements * inc; }
-};
-
 // An operand offset bytes above a boundary. Each aligned vector of memory is loaded once and joined with its
 // predecessor; the first of them, which begins before the operand, is put together from the operand's own parts.
 template <class T, int offset>
