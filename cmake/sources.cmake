@@ -24,15 +24,15 @@ set(QTB_KERNEL_SOURCES
   blas/kernels/level2/ger.cpp
   blas/kernels/level2/trmv.cpp
   blas/kernels/level2/trsv.cpp
+  blas/kernels/level2/symv.cpp
+  blas/kernels/level2/syr.cpp
+  blas/kernels/level2/syr2.cpp
   # level3
   blas/kernels/level3/gemm/scale_c.cpp
   blas/kernels/level3/gemm/small.cpp
   # plain
   blas/kernels/plain/gbmv.cpp
   blas/kernels/plain/symm.cpp
-  blas/kernels/plain/symv.cpp
-  blas/kernels/plain/syr.cpp
-  blas/kernels/plain/syr2.cpp
   blas/kernels/plain/syr2k.cpp
   blas/kernels/plain/syrk.cpp
   blas/kernels/plain/tbmv.cpp

@@ -2,7 +2,6 @@
 //
 //   add_columns     y[i] += factor[0]*column[0][i] + ...                 y may be a column too: a rank update
 //   dot_columns     sum[j] += sum over i of column[j][i]*x[i]            or of its conjugate
-//   add_and_dot     both, with each element of the columns read once
 //
 // 0 <= i < rows. Columns and x stand at any address and are not changed; y overlaps none of them. Nothing outside the
 // rows is touched. y (x in a dot) is brought to a vector boundary by single rows; then go passes of eight rows, and
@@ -14,7 +13,7 @@
 // parts of the factors, and their join at the end knows about signs, so that a product and a conjugated one share
 // their loops.
 //
-// The pieces (Columns, ColumnFactors, ColumnSums, Rows) serve other walks too.
+// The pieces (Columns, ColumnFactors, ColumnSums) serve other walks too: symmetric_sweep.h has the one that does both.
 #pragma once
 
 #include "blas/kernels/element.h"
@@ -307,46 +306,7 @@ struct DotRows {
   }
 };
 
-template <class T, int count, class C, class X, class Y>
-struct AddingDotRows {
-  C columns;
-  X x;
-  Y y;
-  const ColumnFactors<T, count> &factors;
-  ColumnSums<T, count> &sums;
-
-  template <int vectors>
-  [[gnu::always_inline]] void pass() {
-    repeat<vectors>([&](auto k) __attribute__((always_inline)) {
-      const RowFactor<T> row(x.load(k.value));
-      y.store(k.value, factors.add_to(
-                           y.load(k.value), [&](auto j) __attribute__((always_inline)) {
-                             Vec<T> c = columns.template vector<j.value>(k.value);
-                             keep_in_place(c);
-                             sums.template add_product<j.value>(c, row);
-                             return c;
-                           }));
-    });
-    advance(vectors * lanes<T>);
-  }
-  [[gnu::always_inline]] void single() {
-    const RowFactor<T> row(load_lowest(x.p));
-    store_lowest(y.p, factors.add_to_lowest(
-                          load_row(y.p), [&](auto j) __attribute__((always_inline)) {
-                            const T *c = columns.template row<j.value>();
-                            sums.template add_lowest_product<j.value>(load_lowest(c), row);
-                            return load_row(c);
-                          }));
-    advance(1);
-  }
-  [[gnu::always_inline]] void advance(QtbInt rows) {
-    columns.advance(rows);
-    x.advance(rows);
-    y.advance(rows);
-  }
-};
-
-// ---- The three sweeps ----
+// ---- The two sweeps ----
 
 // Rows from which on vectors pay.
 template <class T>
@@ -415,18 +375,6 @@ template <int count, bool conjugated, class T>
 [[gnu::noinline]] void dot_columns(QtbInt rows, const T *const (&columns)[count], const T *x, T (&sums)[count]) {
   ColumnSums<T, count> s;
   dot_sweep(rows, AnyColumns<T, count>(columns), x, s);
-  repeat<count>([&](auto j) { sums[j.value] += s.template total<conjugated>(j.value); });
-}
-
-template <int count, bool conjugated, class T>
-[[gnu::noinline]] void add_and_dot(QtbInt rows, const T *const (&columns)[count], const T (&factors)[count], const T *x,
-                                   T *y, T (&sums)[count]) {
-  const ColumnFactors<T, count> f(factors);
-  ColumnSums<T, count> s;
-  AddingDotRows<T, count, AnyColumns<T, count>, Unaligned<const T>, Aligned<T>> walk{
-      AnyColumns<T, count>(columns), {x}, {y}, f, s};
-  if (sweeps_by_vectors(rows, y)) rows = passes<T>(rows_to_boundary(rows, walk, walk.y), walk);
-  single_rows(rows, walk);
   repeat<count>([&](auto j) { sums[j.value] += s.template total<conjugated>(j.value); });
 }
 

@@ -40,7 +40,14 @@ struct Halves {
   void advance(QtbInt elements) { p += elements; }
 };
 
-// Elements inc apart.
+inline void scatter(float *p, QtbInt inc, __m128 v) {
+  store_single(p, _mm_cvtss_f32(v));
+  store_single(p + inc, _mm_cvtss_f32(_mm_shuffle_ps(v, v, 1)));
+  store_single(p + 2 * inc, _mm_cvtss_f32(_mm_shuffle_ps(v, v, 2)));
+  store_single(p + 3 * inc, _mm_cvtss_f32(_mm_shuffle_ps(v, v, 3)));
+}
+
+// Elements inc apart, gathered and scattered.
 template <class T>
 struct Strided {
   static constexpr QtbInt beyond = 0;

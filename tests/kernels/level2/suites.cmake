@@ -7,3 +7,6 @@ qtb_add_test(triangular_test SOURCES kernels/level2/triangular_test.cpp LIBRARIE
   qtb_platform_static SHARDS 2)
 # It counts the calls of the front end.
 target_link_options(triangular_test PRIVATE -Wl,--wrap=qtb_blas_dgemv)
+qtb_add_test(symmetric_sweep_test SOURCES kernels/level2/symmetric_sweep_test.cpp LIBRARIES qtb_static
+  qtb_platform_static SHARDS 6)
+qtb_add_test(symmetric_test SOURCES kernels/level2/symmetric_test.cpp LIBRARIES qtb_static qtb_platform_static)
