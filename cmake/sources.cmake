@@ -18,6 +18,12 @@ set(QTB_KERNEL_SOURCES
   blas/kernels/level1/scal.cpp
   blas/kernels/level1/sparse.cpp
   blas/kernels/level1/swap.cpp
+  # level2
+  blas/kernels/level2/gbmv.cpp
+  blas/kernels/level2/tbmv.cpp
+  blas/kernels/level2/tbsv.cpp
+  blas/kernels/level2/tpmv.cpp
+  blas/kernels/level2/tpsv.cpp
   # level3
   blas/kernels/level3/gemm/scale_c.cpp
   blas/kernels/level3/gemm/small.cpp

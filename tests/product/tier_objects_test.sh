@@ -6,8 +6,8 @@
 #   static initialisers      run at load on every processor
 #   instructions             only those of mnemonics/*.txt up to the tier; the wider encoding (VEX, EVEX) only in the
 #                            avx tier's objects that mnemonics/vex_objects.txt names, each of which has it
-#   defined global symbols   only qtb_blas_<tier>_x<name> and the inner kernels of GEMM, and a higher tier's name for
-#                            the same procedure
+#   defined global symbols   only qtb_blas_<tier>_x<name>, the inner kernels of GEMM and the general forms of the
+#                            complex band triangles, and a higher tier's name for the same procedure
 #   undefined symbols        only the library's own, of no other tier, and the memory routines that a compiler calls
 set -eu
 
@@ -55,7 +55,7 @@ xargs "${OBJDUMP:-objdump}" -h -t -d -w -M intel --no-show-raw-insn < "$objects"
   # The rank of the tier in the name of a procedure, 0 without one.
   function rank_of(name,   word) {
     split(name, word, "_")
-    return name ~ /^qtb_blas_[a-z0-9]+_(x|[sdcz]gemm_([a-z0-9]+_)?kernel)/ ? rank[word[3]] : 0
+    return name ~ /^qtb_blas_[a-z0-9]+_(x|[sdcz]gemm_([a-z0-9]+_)?kernel|[cz]tb[ms]v_general$)/ ? rank[word[3]] : 0
   }
   # At the end of an object: a name of a higher tier stands for a procedure that has a name of this one, and what may be
   # wide is.

@@ -1,4 +1,4 @@
-// gemv, gbmv: y := alpha*op(A)*x + beta*y for a general matrix, full or band.
+// gemv: y := alpha*op(A)*x + beta*y for a general matrix.
 //
 // Column by column: an update of y with N, a dot product with T and C. x and y do not overlap.
 #include "blas/kernels/plain/storage.h"
@@ -43,20 +43,11 @@ QTB_FUNCTION(gemv, T, gemv) {
   general_product(general(a, *lda, *m, *n), read_op<T>(trans), *m, *n, *alpha, x, *incx, *beta, y, *incy);
 }
 
-template <class T>
-QTB_FUNCTION(gbmv, T, gbmv) {
-  general_product(general_band(a, *lda, *m, *kl, *ku), read_op<T>(trans), *m, *n, *alpha, x, *incx, *beta, y, *incy);
-}
-
 }  // namespace
 
 QTB_KERNEL(sgemv, gemv, float, gemv<float>)
 QTB_KERNEL(dgemv, gemv, double, gemv<double>)
 QTB_KERNEL(cgemv, gemv, cfloat, gemv<cfloat>)
 QTB_KERNEL(zgemv, gemv, cdouble, gemv<cdouble>)
-QTB_KERNEL(sgbmv, gbmv, float, gbmv<float>)
-QTB_KERNEL(dgbmv, gbmv, double, gbmv<double>)
-QTB_KERNEL(cgbmv, gbmv, cfloat, gbmv<cfloat>)
-QTB_KERNEL(zgbmv, gbmv, cdouble, gbmv<cdouble>)
 
 }  // namespace qtb::QTB_TIER

@@ -1,4 +1,4 @@
-// trmv, tbmv, tpmv: x := op(T)*x, in place, for a full, band or packed triangle. trmv_block: one piece of it.
+// trmv: x := op(T)*x, in place, for a full triangle. trmv_block: one piece of it.
 #include "blas/kernels/plain/triangular.h"
 
 namespace qtb::QTB_TIER {
@@ -7,17 +7,6 @@ namespace {
 template <class T>
 QTB_FUNCTION(trmv, T, trmv) {
   triangular_product(triangle(uplo, a, *lda, *n), read_op<T>(trans), is_letter(*diag, 'U'), vector(x, *n, *incx));
-}
-
-template <class T>
-QTB_FUNCTION(tbmv, T, tbmv) {
-  triangular_product(triangle_band(uplo, a, *lda, *n, *k), read_op<T>(trans), is_letter(*diag, 'U'),
-                     vector(x, *n, *incx));
-}
-
-template <class T>
-QTB_FUNCTION(tpmv, T, tpmv) {
-  triangular_product(triangle_packed(uplo, ap, *n), read_op<T>(trans), is_letter(*diag, 'U'), vector(x, *n, *incx));
 }
 
 #if QTB_TIER_AT_LEAST(ssse3)
@@ -58,14 +47,6 @@ QTB_KERNEL(strmv, trmv, float, trmv<float>)
 QTB_KERNEL(dtrmv, trmv, double, trmv<double>)
 QTB_KERNEL(ctrmv, trmv, cfloat, trmv<cfloat>)
 QTB_KERNEL(ztrmv, trmv, cdouble, trmv<cdouble>)
-QTB_KERNEL(stbmv, tbmv, float, tbmv<float>)
-QTB_KERNEL(dtbmv, tbmv, double, tbmv<double>)
-QTB_KERNEL(ctbmv, tbmv, cfloat, tbmv<cfloat>)
-QTB_KERNEL(ztbmv, tbmv, cdouble, tbmv<cdouble>)
-QTB_KERNEL(stpmv, tpmv, float, tpmv<float>)
-QTB_KERNEL(dtpmv, tpmv, double, tpmv<double>)
-QTB_KERNEL(ctpmv, tpmv, cfloat, tpmv<cfloat>)
-QTB_KERNEL(ztpmv, tpmv, cdouble, tpmv<cdouble>)
 #if QTB_TIER_AT_LEAST(ssse3)
 QTB_KERNEL(strmv_block, trmv_block, float, trmv_block<float>)
 QTB_KERNEL(dtrmv_block, trmv_block, double, trmv_block<double>)

@@ -1,4 +1,4 @@
-// trsv, tbsv, tpsv: x := op(T)^-1*x, in place, for a full, band or packed triangle.
+// trsv: x := op(T)^-1*x, in place, for a full triangle.
 //
 // By substitution with true divisions; a zero on the diagonal gives infinities or NaNs.
 #include "blas/kernels/plain/triangular.h"
@@ -11,30 +11,11 @@ QTB_FUNCTION(trmv, T, trsv) {
   triangular_solve(triangle(uplo, a, *lda, *n), read_op<T>(trans), is_letter(*diag, 'U'), vector(x, *n, *incx));
 }
 
-template <class T>
-QTB_FUNCTION(tbmv, T, tbsv) {
-  triangular_solve(triangle_band(uplo, a, *lda, *n, *k), read_op<T>(trans), is_letter(*diag, 'U'),
-                   vector(x, *n, *incx));
-}
-
-template <class T>
-QTB_FUNCTION(tpmv, T, tpsv) {
-  triangular_solve(triangle_packed(uplo, ap, *n), read_op<T>(trans), is_letter(*diag, 'U'), vector(x, *n, *incx));
-}
-
 }  // namespace
 
 QTB_KERNEL(strsv, trmv, float, trsv<float>)
 QTB_KERNEL(dtrsv, trmv, double, trsv<double>)
 QTB_KERNEL(ctrsv, trmv, cfloat, trsv<cfloat>)
 QTB_KERNEL(ztrsv, trmv, cdouble, trsv<cdouble>)
-QTB_KERNEL(stbsv, tbmv, float, tbsv<float>)
-QTB_KERNEL(dtbsv, tbmv, double, tbsv<double>)
-QTB_KERNEL(ctbsv, tbmv, cfloat, tbsv<cfloat>)
-QTB_KERNEL(ztbsv, tbmv, cdouble, tbsv<cdouble>)
-QTB_KERNEL(stpsv, tpmv, float, tpsv<float>)
-QTB_KERNEL(dtpsv, tpmv, double, tpsv<double>)
-QTB_KERNEL(ctpsv, tpmv, cfloat, tpsv<cfloat>)
-QTB_KERNEL(ztpsv, tpmv, cdouble, tpsv<cdouble>)
 
 }  // namespace qtb::QTB_TIER
