@@ -22,7 +22,7 @@ void register_general(const char *name, const char *label,
     static std::map<std::string, std::string> labels;  // outlive the tests
     const std::string text = std::string(label) + " " + test::tier_name(tier);
     const char *const kept = (labels[text] = text).c_str();
-    const TierSweeps<"tbmv", T, R> sweeps(R(name, procedures[tier], procedures[tier]), text);
+    const TierSweeps<"tbmv", T, R> sweeps(R(name, calls::kind_of<T>(name), procedures[tier], procedures[tier]), text);
     register_test("sizes_up_to_70_lie_within_the_bound", kept, [=] { sweeps.sizes_up_to_70(); });
     register_test("sizes_around_limits_lie_within_the_bound", kept, [=] { sweeps.sizes_around_limits(); });
     register_test("results_in_whole_numbers_are_exact", kept, [=] { sweeps.whole_numbers_are_exact(); });
