@@ -8,7 +8,8 @@
 //
 // where the columns, of any alignment, overlap the vector nowhere. Elements side by side go by vectors once there are
 // enough rows; those that stand apart are indexed one by one. A dot product of one or two columns has two accumulators
-// for each sum, so that an addition need not wait for the one before; four columns keep the adder busy with one each.
+// for each sum, which rows go to in turn, so that an addition need not wait for the one before; four columns keep the
+// adder busy with one each.
 #pragma once
 
 #include "blas/kernels/level2/sweep.h"
@@ -34,13 +35,14 @@ template <class T>
   }
 }
 
-// ---- Dot products of few real columns ----
+// ---- Dot products of few columns ----
 
 template <class T, int count>
 struct FewDots {
+  static constexpr QtbInt rows_of_pass = 8;
   const T *column[count];
   const T *x;
-  ColumnSums<T, 2 * count> sums;  // of column j: 2*j, which single rows go to, and 2*j + 1
+  ColumnSums<T, 2 * count> sums;  // 2*j and 2*j + 1 of column j
 
   [[gnu::always_inline]] void pass() {
     repeat<rows_of_pass / lanes<T>>([&](auto k) __attribute__((always_inline)) {
@@ -51,10 +53,12 @@ struct FewDots {
     });
     advance(rows_of_pass);
   }
+  // A row to the first or the second sum of each column.
+  template <int which>
   [[gnu::always_inline]] void single() {
     const RowFactor<T> row(load_lowest(x));
     repeat<count>([&](auto j) __attribute__((always_inline)) {
-      sums.template add_lowest_product<2 * j.value>(load_lowest(column[j.value]), row);
+      sums.template add_lowest_product<2 * j.value + which>(load_lowest(column[j.value]), row);
     });
     advance(1);
   }
@@ -62,23 +66,34 @@ struct FewDots {
     repeat<count>([&](auto j) __attribute__((always_inline)) { column[j.value] += rows; });
     x += rows;
   }
-
-  static constexpr QtbInt rows_of_pass = 8;
+  template <bool conjugated, int j>
+  [[gnu::always_inline]] T total() {
+    if constexpr (is_complex<T>) {
+      sums.by_re[2 * j] = add(sums.by_re[2 * j], sums.by_re[2 * j + 1]);
+      sums.by_im[2 * j] = add(sums.by_im[2 * j], sums.by_im[2 * j + 1]);
+    } else {
+      sums.sum[2 * j] = add(sums.sum[2 * j], sums.sum[2 * j + 1]);
+    }
+    return sums.template total<conjugated>(2 * j);
+  }
 };
 
-template <int count, class T>
+template <bool conjugated, int count, class T>
 [[gnu::noinline]] void dot_few_columns(QtbInt rows, const T *const (&columns)[count], const T *x, T (&sums)[count]) {
   FewDots<T, count> walk;
   repeat<count>([&](auto j) __attribute__((always_inline)) { walk.column[j.value] = columns[j.value]; });
   walk.x = x;
   if (sweeps_by_vectors(rows, x)) {
-    for (; phase(walk.x) != 0; --rows) walk.single();
+    for (; phase(walk.x) != 0; --rows) walk.template single<0>();
     for (; rows >= walk.rows_of_pass; rows -= walk.rows_of_pass) walk.pass();
   }
-  for (; rows > 0; --rows) walk.single();
-  repeat<count>([&](auto j) __attribute__((always_inline)) {
-    sums[j.value] += sum_lanes(add(walk.sums.sum[2 * j.value], walk.sums.sum[2 * j.value + 1]));
-  });
+  for (; rows >= 2; rows -= 2) {
+    walk.template single<0>();
+    walk.template single<1>();
+  }
+  if (rows > 0) walk.template single<0>();
+  repeat<count>([&](auto j)
+                    __attribute__((always_inline)) { sums[j.value] += walk.template total<conjugated, j.value>(); });
 }
 
 // ---- Elements apart ----
@@ -131,10 +146,10 @@ struct LineVector {
     const T *const x = start + first * inc;
     if (!swept)
       dot_apart<conjugated>(rows, columns, x, inc, sums);
-    else if constexpr (is_complex<T> || count > 2)
+    else if constexpr (count > 2)
       dot_columns<count, conjugated>(rows, columns, x, sums);
     else
-      dot_few_columns(rows, columns, x, sums);
+      dot_few_columns<conjugated>(rows, columns, x, sums);
   }
 };
 

@@ -59,7 +59,7 @@ struct GroupTask {
 
   // Element (p, q) of the group's triangle, and whether it lies beside the diagonal.
   template <int p, int q>
-  static constexpr bool stored = Triangle::upper ? p<q : p> q;
+  static constexpr bool stored = Triangle::upper ? (p < q) : (p > q);
   template <bool conjugated, int count>
   static T element(const Group<count, T> &group, QtbInt j, int p, int q) {
     return conjugate_if<conjugated>(element_at(group.column[q] + j + p));
