@@ -20,23 +20,25 @@ set(QTB_KERNEL_SOURCES
   blas/kernels/level1/swap.cpp
   # level2
   blas/kernels/level2/diagonal_kernels.cpp
+  blas/kernels/level2/gbmv.cpp
   blas/kernels/level2/gemv.cpp
   blas/kernels/level2/ger.cpp
-  blas/kernels/level2/trmv.cpp
-  blas/kernels/level2/trsv.cpp
   blas/kernels/level2/symv.cpp
   blas/kernels/level2/syr.cpp
   blas/kernels/level2/syr2.cpp
+  blas/kernels/level2/tbmv.cpp
+  blas/kernels/level2/tbsv.cpp
+  blas/kernels/level2/tpmv.cpp
+  blas/kernels/level2/tpsv.cpp
+  blas/kernels/level2/trmv.cpp
+  blas/kernels/level2/trsv.cpp
   # level3
   blas/kernels/level3/gemm/scale_c.cpp
   blas/kernels/level3/gemm/small.cpp
   # plain
-  blas/kernels/plain/gbmv.cpp
   blas/kernels/plain/symm.cpp
   blas/kernels/plain/syr2k.cpp
   blas/kernels/plain/syrk.cpp
-  blas/kernels/plain/tbmv.cpp
-  blas/kernels/plain/tbsv.cpp
   blas/kernels/plain/trmm.cpp
   blas/kernels/plain/trsm.cpp
 )

@@ -7,8 +7,9 @@
 #   instructions             only those of mnemonics/<tier>.txt, which has what a tier adds, up to the tier; the wider
 #                            encoding (VEX, EVEX) only from the first tier on that lists any of it, in the objects that
 #                            mnemonics/vex_objects.txt names, each of which has it
-#   defined global symbols   only qtb_blas_<tier>_x<name>, the inner kernels of GEMM and GEMV and the diagonal kernels
-#                            of TRSV and TRMV, and a higher tier's name for the same procedure
+#   defined global symbols   only qtb_blas_<tier>_x<name>, the inner kernels of GEMM and GEMV, the diagonal kernels of
+#                            TRSV and TRMV and the general forms of the complex band triangles, and a higher tier's name
+#                            for the same procedure
 #   undefined symbols        only the library's own, of no other tier, and the memory routines that a compiler calls
 set -eu
 
@@ -60,7 +61,8 @@ xargs "${OBJDUMP:-objdump}" -h -t -d -w -M intel --no-show-raw-insn < "$objects"
     split(name, word, "_")
     sub(/^qtb_blas_[a-z0-9]+_/, "", name)
     if (name ~ /^(x|[sdcz]gemm_([a-z0-9]+_)?kernel)/) return rank[word[3]]
-    return name ~ /^([dcz]gemv_[ntc](_even|_odd)?|[sdcz]trsv_diag_[ul][ntc][nu]|[sdcz]trmv_diag)$/ ? rank[word[3]] : 0
+    if (name ~ /^([dcz]gemv_[ntc](_even|_odd)?|[sdcz]trsv_diag_[ul][ntc][nu]|[sdcz]trmv_diag)$/) return rank[word[3]]
+    return name ~ /^[cz]tb[ms]v_general$/ ? rank[word[3]] : 0
   }
   # At the end of an object: a name of a higher tier stands for a procedure that has a name of this one, and what may be
   # wide is.

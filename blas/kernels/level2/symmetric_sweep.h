@@ -23,7 +23,6 @@ namespace qtb::QTB_TIER {
 namespace {
 
 constexpr QtbInt shortest_mirrored = 9;  // rows from which on vectors pay
-constexpr QtbInt rows_per_pass = 8;
 
 // Vectors per turn of the loop over passes: where a vector takes many instructions, a pass takes several turns.
 template <class T, bool strided>
@@ -43,7 +42,7 @@ auto *element_at(const Cursor &cursor, QtbInt i) {
 template <class T, int count, class X, class Y>
 struct MirroredRows {
   const T (&factor)[count];
-  Columns<T, count, Unaligned, Unaligned> columns;
+  AnyColumns<T, count> columns;
   X x;
   Y y;
   ColumnFactors<T, count> factors;
@@ -147,12 +146,13 @@ template <bool upper, int count, class X, class Y, class T>
   repeat<count>([&](auto j) __attribute__((always_inline)) {
     factor[j.value] = alpha * load_single(element_at(x, to_triangle + j.value));
   });
-  MirroredRows<T, count, X, Y> walk{factor, {}, x, y, ColumnFactors<T, count>(factor), {}};
+  const T *columns[count];
   repeat<count>([&](auto j) __attribute__((always_inline)) {
-    walk.columns.p[j.value] = column;
+    columns[j.value] = column;
     column += step;
     step += growth;
   });
+  MirroredRows<T, count, X, Y> walk{factor, AnyColumns<T, count>(columns), x, y, ColumnFactors<T, count>(factor), {}};
   if constexpr (upper) {
     if constexpr (count == 2)
       if (edge) walk.template single<0, 1>();

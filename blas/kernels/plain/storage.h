@@ -25,11 +25,6 @@ template <class T>
 General<T> general(T *a, QtbInt lda, QtbInt m, QtbInt n) {
   return {a, lda, m, m, n};
 }
-// Band storage keeps the diagonals as rows: element (i, j) is row ku + i - j of column j.
-template <class T>
-General<T> general_band(T *a, QtbInt lda, QtbInt m, QtbInt kl, QtbInt ku) {
-  return {a + ku, lda - 1, m, kl, ku};
-}
 
 // Columns first to first + columns - 1 of a triangle of order n with k diagonals beside the main one. Only a piece of a
 // triangle has other columns than 0 to n - 1.
