@@ -1,5 +1,5 @@
 // The parallel Level-2 drivers on real teams, more threads than processors included. The dispatch slots are stand-ins
-// that note their calls and hand them on to the tier under test; the memory service is the test's own.
+// that note their calls and hand them on to the tier under test; the services are the test's own.
 //
 // Operands are small integers, so that every sum is exact in every element type and order: a result has to be that of
 // the published definition to the last bit, for every team. What may not be read is NaN.
@@ -10,8 +10,8 @@
 #include "blas/thread/32e/level2/gemv_omp.h"
 #include "blas/thread/32e/level2/l2_omp.h"
 #include "tests/support/tiers.h"
+#include "tests/thread/front_ends.h"
 #include "tests/thread/recorded_memory.h"
-#include "tests/thread/stand_ins.h"
 
 QTB_RECORDED_MEMORY_SERVICE
 

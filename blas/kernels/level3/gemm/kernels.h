@@ -69,7 +69,7 @@ void run_staged(QTB_IN_PLACE_KERNEL_PARAMS(T)) {
   constexpr GemmRules rules = rules_of<T, family>;
   constexpr KernelRecord<InnerProcedure<T>> kernel = inner_kernel<T, family>;
   const QtbInt kp = round_up(depth, rules.ku), ldbp = kp * rules.nr;
-  T *const inner_stage = stage + ldbp;
+  T *const inner_stage = rules.in_place.kernel_has_stage ? stage + ldbp : nullptr;
   const auto multiply = [&](QtbInt j0, QtbInt w) __attribute__((always_inline)) {
     copies_of<T, family>.b[transb ? 1 : 0](&depth, &w, transb ? b + j0 : b + j0 * ldb, &ldb, stage, &ldbp, nullptr);
     (aligned ? kernel.aligned : kernel.any)(m, w, kp, ap, ldap, stage, ldbp, c + j0 * ldc, ldc, inner_stage);
@@ -85,7 +85,8 @@ void run_staged(QTB_IN_PLACE_KERNEL_PARAMS(T)) {
 template <ProcessorTier tier, class T, Family family>
 constexpr KernelRecord<InPlaceProcedure<T>> in_place_kernel_in = {
     run_staged<T, family, false>, run_staged<T, family, true>,
-    rules_of<T, family>.nr *static_cast<QtbInt>(sizeof(T)) + inner_kernel<T, family>.stage_per_k};
+    rules_of<T, family>.nr *static_cast<QtbInt>(sizeof(T)) +
+        (rules_of<T, family>.in_place.kernel_has_stage ? inner_kernel<T, family>.stage_per_k : 0)};
 #define QTB_IN_PLACE_KERNEL(tier, T, family, any, aligned)                                           \
   template <>                                                                                        \
   constexpr KernelRecord<InPlaceProcedure<T>> in_place_kernel_in<tier_##tier, T, Family::family> = { \

@@ -80,10 +80,12 @@ struct BufferRule {
 };
 
 // A serial body reads B in place where a slice of B has at most so many bytes: it then stays in a cache by itself. Its
-// blocks of A have rows of their own where a rule says so.
+// blocks of A have rows of their own where a rule says so. A kernel that can do without a stage gets none beside the
+// micro-panel of B where the staging region has room for that alone.
 struct InPlaceRule {
   QtbInt most_bytes = 0;
   RowRule mb = {Rows::fixed, 0};
+  bool kernel_has_stage = true;
 };
 
 struct GemmRules {
@@ -114,13 +116,14 @@ constexpr BufferRule tight{Request::tight, 4 * 4096 + 1280}, tight_spare{Request
 constexpr QtbInt slice_256k = 262144, slice_2m = 2097152;
 constexpr InPlaceRule never{};
 constexpr InPlaceRule slice_2m_sse41{slice_2m, {Rows::small_l2, 600, 448}};
+constexpr InPlaceRule slice_2m_bare{slice_2m, {Rows::small_l2, 600, 448}, false};
 
 constexpr GemmRules gemm_rules[] = {
   // type, tiers, family                          mr nr ku  mb                              nb             kb            walk                                                           buffers                    B in place
   {'d', tier_set::AVX,    Family::base,            8, 4, 4, {Rows::fixed, 512},             {4, 10000},    depth_halved, {.callers_blocks_stay = false},                                {Request::of_blocks, 768}, never},
   {'d', tier_set::SSE42,  Family::base,            2, 8, 4, {Rows::small_l3, 640, 384},     {8, 5000, 8},  depth_halved, adding,                                                        doubled_stage,             never},
   {'d', tier_set::SSSE3,  Family::base,            4, 4, 4, {Rows::fixed, 512},             {4, 10000},    depth_halved, adding,                                                        doubled_stage,             {slice_2m}},
-  {'d', tier_set::SSSE3,  Family::sse41,           4, 4, 4, {Rows::small_l2, 1000, 448},    {4, 10000, 4}, depth_halved, adding,                                                        plain_stage,               slice_2m_sse41},
+  {'d', tier_set::SSSE3,  Family::sse41,           4, 4, 4, {Rows::small_l2, 1000, 448},    {4, 10000, 4}, depth_halved, adding,                                                        plain_stage,               slice_2m_bare},
   {'d', tier_set::SSE3,   Family::base,            4, 4, 4, {Rows::flat_or_huge, 480, 512}, {0, 2000},     {Depth::halved_down, 112}, {.kernels_apply_beta = true, .kernels_take_edges = true}, tight_spare,      never},
   {'d', tier_set::DEF,    Family::base,            2, 12, 4, {Rows::flat, 512},             {0, 4992},     {Depth::halved_down, 128}, {.columns = 4},                                   tight_spare,               never},
   {'d', tier_set::DEF,    Family::def_a,           4, 4, 4, {Rows::area_of_kb, 61440, 8},   {4, 5000},     depth_halved, adding,                                                        doubled_stage,             {slice_256k}},

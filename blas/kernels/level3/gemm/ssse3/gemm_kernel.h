@@ -398,7 +398,7 @@ void multiply_panels(QTB_INNER_KERNEL_PARAMS(T)) {
       using Many = SchemeOfMany<T, family, w.value>;
       if constexpr (Few::staged)
         multiply_by(Few());
-      else if (m < rows_for_stage)
+      else if (m < rows_for_stage || stage == nullptr)
         multiply_by(Few());
       else
         multiply_by(Many());
