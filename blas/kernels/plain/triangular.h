@@ -1,5 +1,4 @@
-// x := op(T)*x and x := op(T)^-1*x in place for a triangle in any storage: the core of trmv, trsv, their band and
-// packed forms, and of trmm and trsm from the left.
+// x := op(T)*x and x := op(T)^-1*x in place for a triangle: the core of trmm and trsm from the left.
 //
 // V is anything that x[i] reads and writes an element of. A column of T is either scattered, with N (the element of its
 // number updates the others), or gathered, with T and C (the others go into the element of its number); the columns are
