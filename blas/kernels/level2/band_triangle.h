@@ -79,7 +79,7 @@ struct ColumnCalls {
   template <Task task, Op op>
   void take(QtbInt j, const T *column) const {
     constexpr bool conjugated = op == Op::conjugate;
-    const auto diagonal = [&] { return conjugate_if<conjugated>(element_at(column + j)); };
+    const auto diagonal = [&] { return conjugate_if<conjugated>(load_element(column + j)); };
     if constexpr (op == Op::none) {
       T own = x.get(j);
       if (is_zero(own)) return;

@@ -17,24 +17,6 @@
 namespace qtb::QTB_TIER {
 namespace {
 
-// One element in its parts: as a whole, a complex one would pass through integer registers.
-template <class T>
-[[gnu::always_inline]] inline T element_at(const T *p) {
-  if constexpr (is_complex<T>)
-    return {load_single(parts(p)), load_single(parts(p) + 1)};
-  else
-    return load_single(p);
-}
-template <class T>
-[[gnu::always_inline]] inline void set_element_at(T *p, T v) {
-  if constexpr (is_complex<T>) {
-    store_single(parts(p), v.re);
-    store_single(parts(p) + 1, v.im);
-  } else {
-    store_single(p, v);
-  }
-}
-
 // ---- Dot products of few columns ----
 
 template <class T, int count>
@@ -102,10 +84,10 @@ template <int count, class T>
 [[gnu::noinline]] void add_apart(QtbInt rows, const T *const (&columns)[count], const T (&factors)[count], T *y,
                                  QtbInt incy) {
   for (QtbInt i = 0; i < rows; ++i, y += incy) {
-    T sum = element_at(y);
+    T sum = load_element(y);
     repeat<count>([&](auto j)
-                      __attribute__((always_inline)) { sum += factors[j.value] * element_at(columns[j.value] + i); });
-    set_element_at(y, sum);
+                      __attribute__((always_inline)) { sum += factors[j.value] * load_element(columns[j.value] + i); });
+    store_element(y, sum);
   }
 }
 
@@ -114,9 +96,9 @@ template <bool conjugated, int count, class T>
                                  T (&sums)[count]) {
   T sum[count] = {};
   for (QtbInt i = 0; i < rows; ++i, x += incx) {
-    const T element = element_at(x);
+    const T element = load_element(x);
     repeat<count>([&](auto j) __attribute__((always_inline)) {
-      sum[j.value] += conjugate_if<conjugated>(element_at(columns[j.value] + i)) * element;
+      sum[j.value] += conjugate_if<conjugated>(load_element(columns[j.value] + i)) * element;
     });
   }
   repeat<count>([&](auto j) __attribute__((always_inline)) { sums[j.value] += sum[j.value]; });
@@ -131,8 +113,8 @@ struct LineVector {
   QtbInt inc;
   bool swept;
 
-  T get(QtbInt i) const { return element_at(start + i * inc); }
-  void set(QtbInt i, T v) const { set_element_at(start + i * inc, v); }
+  T get(QtbInt i) const { return load_element(start + i * inc); }
+  void set(QtbInt i, T v) const { store_element(start + i * inc, v); }
   template <int count>
   [[gnu::always_inline]] void add(QtbInt first, QtbInt rows, const T *const (&columns)[count],
                                   const T (&factors)[count]) const {
@@ -181,7 +163,7 @@ template <int count, class T, class V>
   constexpr int right = count - 1;
   if constexpr (count == 2)
     if (rows.first < rows.begin)
-      y.set(rows.first, y.get(rows.first) + factors[0] * element_at(group.column[0] + rows.first));
+      y.set(rows.first, y.get(rows.first) + factors[0] * load_element(group.column[0] + rows.first));
   if (rows.begin < rows.end) {
     const T *columns[count];
     group.at(rows.begin, columns);
@@ -189,7 +171,7 @@ template <int count, class T, class V>
   }
   if constexpr (count == 2)
     if (rows.end < rows.last)
-      y.set(rows.end, y.get(rows.end) + factors[right] * element_at(group.column[right] + rows.end));
+      y.set(rows.end, y.get(rows.end) + factors[right] * load_element(group.column[right] + rows.end));
 }
 
 template <bool conjugated, int count, class T, class V>
@@ -203,9 +185,9 @@ template <bool conjugated, int count, class T, class V>
   }
   if constexpr (count == 2) {
     if (rows.first < rows.begin)
-      sums[0] += conjugate_if<conjugated>(element_at(group.column[0] + rows.first)) * x.get(rows.first);
+      sums[0] += conjugate_if<conjugated>(load_element(group.column[0] + rows.first)) * x.get(rows.first);
     if (rows.end < rows.last)
-      sums[right] += conjugate_if<conjugated>(element_at(group.column[right] + rows.end)) * x.get(rows.end);
+      sums[right] += conjugate_if<conjugated>(load_element(group.column[right] + rows.end)) * x.get(rows.end);
   }
 }
 

@@ -56,7 +56,7 @@ struct Columns {
 
 // ---- Single rows ----
 
-// An element at any address, in its parts.
+// An element at any address, in its parts: as a whole, a complex one would pass through integer registers.
 template <class T>
 T load_element(const T *p) {
   if constexpr (is_complex<T>)

@@ -62,7 +62,7 @@ struct GroupTask {
   static constexpr bool stored = Triangle::upper ? (p < q) : (p > q);
   template <bool conjugated, int count>
   static T element(const Group<count, T> &group, QtbInt j, int p, int q) {
-    return conjugate_if<conjugated>(element_at(group.column[q] + j + p));
+    return conjugate_if<conjugated>(load_element(group.column[q] + j + p));
   }
 
   // ---- N: columns scatter ----

@@ -2,9 +2,9 @@
 #pragma once
 
 #include <cmath>
-#include <cstring>
 #include <vector>
 
+#include "tests/kernels/level2/numbers.h"
 #include "tests/reference/level2.h"
 #include "tests/support/tiers.h"
 
@@ -55,13 +55,6 @@ constexpr Banded<cdouble> banded<cdouble> = {
     QTB_ALL_TIERS(ztpsv), QTB_ALL_GENERAL_FORMS(ztbmv), QTB_ALL_GENERAL_FORMS(ztbsv)};
 
 template <class T>
-T element(double re, double im) {
-  if constexpr (is_complex<T>)
-    return {static_cast<Real<T>>(re), static_cast<Real<T>>(im)};
-  else
-    return static_cast<T>(re);
-}
-template <class T>
 T not_a_number() {
   return element<T>(NAN, NAN);
 }
@@ -71,27 +64,6 @@ bool is_not_a_number(T v) {
     return std::isnan(v.re) || std::isnan(v.im);
   else
     return std::isnan(v);
-}
-
-// Numbers in (-1, 1) that need all digits, the same for the same seed.
-template <class T>
-std::vector<T> numbers(QtbInt count, unsigned seed) {
-  std::vector<T> v(static_cast<std::size_t>(count));
-  std::uint64_t state = seed;
-  const auto next = [&] {
-    state = state * 6364136223846793005U + 1442695040888963407U;
-    return static_cast<double>(static_cast<std::int64_t>(state) >> 11) * 0x1p-52;
-  };
-  for (T &e : v) {
-    const double re = next(), im = next();
-    e = element<T>(re, im);
-  }
-  return v;
-}
-
-template <class T>
-bool same(const std::vector<T> &a, const std::vector<T> &b) {
-  return a.size() == b.size() && std::memcmp(a.data(), b.data(), a.size() * sizeof(T)) == 0;
 }
 
 // The worst error / bound of a contiguous result.

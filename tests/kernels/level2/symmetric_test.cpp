@@ -9,6 +9,7 @@
 #include <cstring>
 #include <vector>
 
+#include "tests/kernels/level2/numbers.h"
 #include "tests/reference/level2.h"
 #include "tests/support/tiers.h"
 
@@ -49,32 +50,6 @@ constexpr Procedures<cdouble> procedures<cdouble> = {QTB_ALL_TIERS(zhemv), QTB_A
 
 const QtbInt one = 1;
 
-template <class T>
-T element(double re, double im) {
-  if constexpr (is_complex<T>)
-    return {static_cast<Real<T>>(re), static_cast<Real<T>>(im)};
-  else
-    return static_cast<T>(re);
-}
-// Numbers in (-1, 1) that need all digits, the same for the same seed.
-template <class T>
-std::vector<T> numbers(std::size_t count, unsigned seed) {
-  std::vector<T> v(count);
-  std::uint64_t state = seed;
-  const auto next = [&] {
-    state = state * 6364136223846793005U + 1442695040888963407U;
-    return static_cast<double>(static_cast<std::int64_t>(state) >> 11) * 0x1p-52;
-  };
-  for (T &e : v) {
-    const double re = next(), im = next();
-    e = element<T>(re, im);
-  }
-  return v;
-}
-template <class T>
-bool same(const std::vector<T> &a, const std::vector<T> &b) {
-  return a.size() == b.size() && std::memcmp(a.data(), b.data(), a.size() * sizeof(T)) == 0;
-}
 template <class T>
 std::vector<T> nans(std::size_t count) {
   return std::vector<T>(count, element<T>(NAN, NAN));
@@ -236,8 +211,7 @@ TYPED_TEST(Symmetric, a_skipped_column_takes_no_nan_from_the_vectors) {
               const bool packed = form >= 2;
               const reference::Layout layout =
                   packed ? reference::packed_triangle(*uplo, n) : reference::triangle(*uplo, n, n);
-              std::vector<T> x = nans<T>(static_cast<std::size_t>(n * inc)),
-                             a = numbers<T>(static_cast<std::size_t>(n * n), 7), want = a;
+              std::vector<T> x = nans<T>(static_cast<std::size_t>(n * inc)), a = numbers<T>(n * n, 7), want = a;
               x[static_cast<std::size_t>(skipped * inc)] = T{};
               if (form == 0) p.syr[tier](uplo, &n, &real_alpha, x.data(), &inc, a.data(), &n);
               if (form == 1) p.syr2[tier](uplo, &n, &alpha, x.data(), &inc, x.data(), &inc, a.data(), &n);
@@ -287,7 +261,7 @@ TYPED_TEST(Symmetric, an_update_by_zeros_clears_the_imaginary_diagonal) {
       for (const char *uplo : {"U", "L"})
         for (int form = 0; form < 4; ++form) {
           const std::vector<T> x(static_cast<std::size_t>(n));
-          std::vector<T> a = numbers<T>(static_cast<std::size_t>(n * n), 5), want = a;
+          std::vector<T> a = numbers<T>(n * n, 5), want = a;
           const bool packed = form >= 2;
           const reference::Layout layout =
               packed ? reference::packed_triangle(*uplo, n) : reference::triangle(*uplo, n, n);
@@ -335,9 +309,7 @@ TYPED_TEST(Symmetric, the_bits_of_an_update_do_not_depend_on_addresses) {
     for (const QtbInt n : {3, 19})
       for (const char *uplo : {"U", "L"})
         for (const QtbInt lda : {n, n + 1}) {
-          const std::vector<T> x = numbers<T>(static_cast<std::size_t>(n), 1),
-                               y = numbers<T>(static_cast<std::size_t>(n), 2),
-                               a = numbers<T>(static_cast<std::size_t>(n * lda), 3);
+          const std::vector<T> x = numbers<T>(n, 1), y = numbers<T>(n, 2), a = numbers<T>(n * lda, 3);
           std::vector<T> first[4];
           for (std::size_t offset_a = 0; offset_a < 16; ++offset_a)
             for (const std::size_t offset : {0, 1, 4, 8, 12})
@@ -364,9 +336,7 @@ TYPED_TEST(Symmetric, products_lie_within_the_bound_at_every_phase) {
     for (const QtbInt n : {3, 22})
       for (const char *uplo : {"U", "L"})
         for (const QtbInt lda : {QtbInt{22}, QtbInt{23}}) {
-          const std::vector<T> x = numbers<T>(static_cast<std::size_t>(n), 1),
-                               y = numbers<T>(static_cast<std::size_t>(n), 2),
-                               a = numbers<T>(static_cast<std::size_t>(n * lda), 3);
+          const std::vector<T> x = numbers<T>(n, 1), y = numbers<T>(n, 2), a = numbers<T>(n * lda, 3);
           const reference::Expectation want[] = {
               reference::symv(*uplo, n, alpha, a.data(), lda, x.data(), one, beta, y.data(), one),
               reference::spmv(*uplo, n, alpha, a.data(), x.data(), one, beta, y.data(), one),
