@@ -55,19 +55,19 @@ constexpr bool update_changes_nothing(const Alpha *alpha, const QtbInt *k, const
   return update_adds_nothing(alpha, k) && is_one(*beta);
 }
 
-// What the sums of a Hermitian update are added to: the triangle times beta, with a real diagonal. A beta of 0 reads
-// nothing.
+// What the sums of a Hermitian update are added to: the triangle times beta, with a real diagonal. The imaginary parts
+// that stand on the diagonal are not of the matrix and are not read; a beta of 0 reads nothing.
 template <class T>
 void scale_hermitian(char uplo, QtbInt n, Real<T> beta, T *c, QtbInt ldc) {
   const bool upper = is_letter(uplo, 'U');
   for (QtbInt j = 0; j < n; j++) {
     T *const column = c + j * ldc;
-    const QtbInt first = upper ? 0 : j, end = upper ? j + 1 : n;
+    const QtbInt first = upper ? 0 : j + 1, end = upper ? j : n;
     if (beta == 0)
       for (QtbInt i = first; i < end; i++) column[i] = {0, 0};
     else if (beta != 1)
       for (QtbInt i = first; i < end; i++) column[i] = {column[i].re * beta, column[i].im * beta};
-    column[j].im = 0;
+    column[j] = {beta == 0 ? 0 : column[j].re * beta, 0};
   }
 }
 
