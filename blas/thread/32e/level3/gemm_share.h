@@ -22,8 +22,8 @@ constexpr QtbInt at_most(QtbInt v, QtbInt limit) { return v < limit ? v : limit;
 constexpr QtbInt multiple_below(QtbInt v, QtbInt unit) { return v / unit * unit; }
 constexpr QtbInt multiple_above(QtbInt v, QtbInt unit) { return multiple_below(v + unit - 1, unit); }
 
-// One dimension of extent n in t slabs of share each, the last with the rest. Where the share is 0 all but the last have
-// none, at an address that still lies in the matrix.
+// One dimension of extent n in t slabs of share each, the last with the rest. Where the share is 0 all but the last
+// have none, at an address that still lies in the matrix.
 constexpr GemmRange gemm_slab(QtbInt n, QtbInt share, QtbInt t, QtbInt i) {
   return {at_most(share * i, at_least_0(n - 1)), i < t - 1 ? share : at_least_0(n - share * i)};
 }
