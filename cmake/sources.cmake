@@ -149,6 +149,12 @@ set(QTB_CORE_SOURCES
   blas/entry/version.cpp
   blas/entry/xerbla.cpp
   # thread
+  blas/thread/32/level3/hemm_omp.cpp
+  blas/thread/32/level3/her2k_omp.cpp
+  blas/thread/32/level3/symm.cpp
+  blas/thread/32/level3/symm_omp.cpp
+  blas/thread/32/level3/syr2k.cpp
+  blas/thread/32/level3/syr2k_omp.cpp
   blas/thread/32e/level1/xf_l1.cpp
   blas/thread/32e/level1/xf_l1_omp.cpp
   blas/thread/32e/level2/gemv.cpp
@@ -161,6 +167,11 @@ set(QTB_CORE_SOURCES
   blas/thread/32e/level3/gemm_mscale_omp.cpp
   blas/thread/32e/level3/gemm_omp.cpp
   blas/thread/32e/level3/gemm_select.cpp
+  blas/thread/32e/level3/syrk.cpp
+  blas/thread/32e/level3/syrk_omp.cpp
+  blas/thread/32e/level3/trmm.cpp
+  blas/thread/32e/level3/trmm_omp.cpp
+  blas/thread/32e/level3/trsm_omp.cpp
   blas/thread/forward.cpp
   # service
   service/cache.cpp

@@ -44,4 +44,7 @@ inline VectorThreads vector_threads(ProcessorTier tier) {
 
 inline bool tier_has_parallel_vectors(ProcessorTier tier) { return vector_threads(tier) != VectorThreads::serial; }
 
+// Whether a tier has the building blocks that parallel drivers call.
+constexpr bool tier_has_pieces(ProcessorTier tier) { return (tier_set::PIECES >> tier & 1) != 0; }
+
 }  // namespace qtb

@@ -5,6 +5,7 @@
 // For one source of one program, as stand_ins.h is, which this includes.
 #pragma once
 
+#include <cstring>
 #include <map>
 #include <string>
 #include <utility>
@@ -19,6 +20,12 @@ inline Answers process_answers;
 inline std::string process_asked;
 inline AskedProcess asked_process{process_answers, process_asked};
 
+// alpha and beta of the calls, as far as their type has such parts.
+struct Factors {
+  double alpha[2] = {}, beta[2] = {};
+};
+inline Factors factors;
+
 // Begins a test: a process that answers by default, nothing asked, nothing called.
 class FrontEnds : public testing::Test {
  protected:
@@ -26,18 +33,19 @@ class FrontEnds : public testing::Test {
     process_answers = Answers{};
     process_asked.clear();
     stand_ins = StandIns{};
+    factors = Factors{};
   }
 };
 
 // Calls a front end with the numbers and letters given by the names of its arguments, 1 and N where none is given, and
 // with addresses elsewhere that nothing may touch. Returns the routines that were reached, in order. If it is only one,
-// it has to have got the caller's own arguments, and the caller its result.
+// of the same shape, it has to have got the caller's own arguments, and the caller its result.
 template <class R, class... A>
 std::string reached_by(R (*front_end)(A...), const char *names, const std::map<std::string, QtbInt> &given) {
   constexpr std::size_t count = sizeof...(A);
-  static const double scalars[2] = {};
   std::array<QtbInt, count> numbers;
   std::array<char, count> letters;
+  std::array<cdouble, count> scalars = {};  // room for one of any type
   std::array<const void *, count> sent;
   std::size_t i = 0;
   const char *name = names;
@@ -47,10 +55,15 @@ std::string reached_by(R (*front_end)(A...), const char *names, const std::map<s
     const auto found = given.find(text);
     numbers[i] = found == given.end() ? 1 : found->second;
     letters[i] = found == given.end() ? 'N' : static_cast<char>(found->second);
-    sent[i] = std::is_same_v<P, const QtbInt>     ? static_cast<const void *>(&numbers[i])
-              : std::is_same_v<P, const char>     ? static_cast<const void *>(&letters[i])
-              : text == "alpha" || text == "beta" ? static_cast<const void *>(scalars)
-                                                  : reinterpret_cast<const void *>(16 * (i + 1));
+    sent[i] = std::is_same_v<P, const QtbInt> ? static_cast<const void *>(&numbers[i])
+              : std::is_same_v<P, const char> ? static_cast<const void *>(&letters[i])
+                                              : reinterpret_cast<const void *>(16 * (i + 1));
+    if (text == "alpha" || text == "beta") {
+      const double *const parts = text == "alpha" ? factors.alpha : factors.beta;
+      using Part = Real<std::remove_const_t<P>>;
+      const Part narrow[2] = {static_cast<Part>(parts[0]), static_cast<Part>(parts[1])};
+      sent[i] = std::memcpy(&scalars[i], narrow, sizeof(P));
+    }
     ++i;
   };
   (choose(A{}), ...);
@@ -67,7 +80,7 @@ std::string reached_by(R (*front_end)(A...), const char *names, const std::map<s
   }
   std::string reached;
   for (const Call &call : stand_ins.calls) reached += (reached.empty() ? "" : " ") + call.routine;
-  if (stand_ins.calls.size() == 1) {
+  if (stand_ins.calls.size() == 1 && stand_ins.calls[0].names == std::string(names)) {
     EXPECT_EQ(stand_ins.calls[0].pointers(), std::vector<const void *>(sent.begin(), sent.end())) << reached;
   }
   return reached;

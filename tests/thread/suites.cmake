@@ -30,4 +30,13 @@ qtb_add_test(level2_front_ends_test SOURCES thread/level2/front_ends_test.cpp LI
 qtb_add_test(level2_share_test SOURCES thread/level2/share_test.cpp TIMEOUT 60)
 qtb_add_test(level2_small_team_test SOURCES thread/level2/drivers_test.cpp LIBRARIES qtb_static
   ENVIRONMENT OMP_WAIT_POLICY=passive OMP_THREAD_LIMIT=5)
+qtb_add_test(level3_decision_test SOURCES thread/level3/level3_decision_test.cpp TIMEOUT 60)
+qtb_add_test(level3_drivers_test SOURCES thread/level3/level3_drivers_test.cpp LIBRARIES qtb_static
+  ENVIRONMENT OMP_WAIT_POLICY=passive)
+qtb_add_test(level3_front_ends_test SOURCES thread/level3/level3_front_ends_test.cpp LIBRARIES qtb_static TIMEOUT 60)
+qtb_add_test(level3_share_test SOURCES thread/level3/level3_share_test.cpp TIMEOUT 60)
+qtb_add_test(level3_small_team_test SOURCES thread/level3/level3_drivers_test.cpp LIBRARIES qtb_static
+  ENVIRONMENT OMP_WAIT_POLICY=passive OMP_THREAD_LIMIT=5)
+qtb_add_test(level3_teams_test SOURCES thread/level3/level3_teams_test.cpp LIBRARIES qtb_static qtb_platform_fake
+  RUNS ${gemm_machine_runs} ENVIRONMENT OMP_WAIT_POLICY=passive OMP_THREAD_LIMIT=11)
 qtb_add_test(team_test SOURCES thread/team_test.cpp ENVIRONMENT OMP_WAIT_POLICY=passive TIMEOUT 60)

@@ -22,12 +22,13 @@ constexpr QtbInt at_most(QtbInt v, QtbInt limit) { return v < limit ? v : limit;
 constexpr QtbInt multiple_below(QtbInt v, QtbInt unit) { return v / unit * unit; }
 constexpr QtbInt multiple_above(QtbInt v, QtbInt unit) { return multiple_below(v + unit - 1, unit); }
 
-// One dimension of extent n, at least 1, cut anywhere. Where there are fewer than t, all but the last thread get none,
-// at an address that still lies in the matrix.
-constexpr GemmRange gemm_range(QtbInt n, QtbInt t, QtbInt i) {
-  const QtbInt share = n / t;
-  return {at_most(share * i, n - 1), i < t - 1 ? share : at_least_0(n - share * i)};
+// One dimension of extent n in t slabs of share each, the last with the rest. Where the share is 0 all but the last
+// have none, at an address that still lies in the matrix.
+constexpr GemmRange gemm_slab(QtbInt n, QtbInt share, QtbInt t, QtbInt i) {
+  return {at_most(share * i, at_least_0(n - 1)), i < t - 1 ? share : at_least_0(n - share * i)};
 }
+// The same, cut anywhere.
+constexpr GemmRange gemm_range(QtbInt n, QtbInt t, QtbInt i) { return gemm_slab(n, n / t, t, i); }
 
 // The column share of a grid is a multiple of this, whatever the kernel's tile.
 constexpr QtbInt gemm_grid_columns = 4;

@@ -1,0 +1,13 @@
+// The parallel symmetric rank-2k updates. See syr2k_omp.h.
+
+#include "blas/thread/32/level3/syr2k_omp.h"
+
+#include "blas/thread/32/level3/syr2k_strips.h"
+
+extern "C" {
+#define QTB_DEFINE_SYR2K_OMP(name, T)                                   \
+  void qtb_blas_##name##_omp(QtbInt nthreads, QTB_PARAMS_syr2k(T)) {    \
+    qtb::syr2k_by_strips<&qtb_blas_x##name>(nthreads, QTB_ARGS(syr2k)); \
+  }
+QTB_FOR_EACH_SYR2K(QTB_DEFINE_SYR2K_OMP)
+}
