@@ -13,3 +13,13 @@ qtb_add_test(gemm_memory_test SOURCES kernels/level3/gemm_memory_test.cpp LIBRAR
 qtb_add_test(gemm_pack_test SOURCES kernels/level3/gemm_pack_test.cpp LIBRARIES qtb_static qtb_platform_fake)
 qtb_add_test(gemm_pieces_test SOURCES kernels/level3/gemm_pieces_test.cpp LIBRARIES qtb_static qtb_platform_fake)
 qtb_add_test(triangle_pieces_test SOURCES kernels/level3/triangle_pieces_test.cpp LIBRARIES qtb_static SHARDS 2)
+qtb_add_test(symm_test SOURCES kernels/level3/symm_test.cpp LIBRARIES qtb_static qtb_platform_fake
+  RUNS ${gemm_processors} SHARDS 5)
+qtb_add_test(syr2k_test SOURCES kernels/level3/syr2k_test.cpp LIBRARIES qtb_static qtb_platform_fake
+  RUNS ${gemm_processors} SHARDS 5)
+# They note the products that the kernels call, and refuse requests for memory.
+foreach(suite symm_test syr2k_test)
+  foreach(name qtb_blas_sse42_xdgemm qtb_blas_sse42_xzgemm qtb_serv_malloc)
+    target_link_options(${suite} PRIVATE -Wl,--wrap=${name})
+  endforeach()
+endforeach()
