@@ -6,7 +6,8 @@
 // small path of the products; what is left of B goes to the unblocked kernels, at the end. So does all where nothing is
 // to be packed, or where there are no buffers.
 //
-// a_buffer, on a vector boundary, has room for a packed triangle of the block, b_buffer for a strip of 32 bytes a row.
+// a_buffer, on a vector boundary, has room for a packed triangle of the block, b_buffer for four strips of 32 bytes a
+// row.
 #pragma once
 
 #include "blas/kernels/level3/gemm/parts.h"
@@ -38,7 +39,7 @@ void run_packed(const TriForm &form, QtbInt n, QtbInt others, T alpha, const T *
     pack_triangle<routine, lower, true>(packed, n, a, lda, parts(a_buffer));
   else
     pack_triangle<routine, lower, false>(packed, n, a, lda, parts(a_buffer));
-  run_strips<routine, lower, left>(n, others, parts(a_buffer), form.unit, b, ldb, parts(b_buffer));
+  run_all_strips<routine, lower, left>(n, others, parts(a_buffer), form.unit, b, ldb, parts(b_buffer));
 }
 
 // The rectangle of T beside its first t rows and columns, rest of them: what the one part of B gives to the other.

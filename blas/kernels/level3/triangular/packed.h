@@ -85,7 +85,7 @@ void pack_triangle(const PackedForm<T> &form, QtbInt n, const T *a, QtbInt lda, 
     for (QtbInt q = 0; q < p; q += tile_rows, out += packed_tile<T>) {
       auto tile = load_tile<!straight, packed_width>(element_at<straight>(a, lda, i, place(q)), lda);
       if constexpr (is_complex<T>)
-        repeat<static_cast<int>(tile_rows)>([&](auto row) {
+        repeat<static_cast<int>(tile_rows)>([&](auto row) __attribute__((always_inline)) {
           for (auto &im : tile.v[decltype(row)::value][1]) im = bit_xor(im, sign);
         });
       if (scaled) scale_tile(tile, form.alpha);

@@ -34,8 +34,20 @@ struct Tile {
 // f(row, plane, vector) for each vector of a tile, by constants.
 template <class T, int width, class F>
 [[gnu::always_inline]] inline void each_vector(F f) {
-  repeat<tile_rows>(
-      [&](auto r) { repeat<planes<T>>([&](auto p) { repeat<row_vectors<T, width>>([&](auto i) { f(r, p, i); }); }); });
+  repeat<tile_rows>([&](auto r) __attribute__((always_inline)) {
+    repeat<planes<T>>([&](auto p) __attribute__((always_inline)) {
+      repeat<row_vectors<T, width>>([&](auto i) { f(r, p, i); });
+    });
+  });
+}
+
+template <class T, int width>
+[[gnu::always_inline]] inline Tile<T, width> zero_tile() {
+  Tile<T, width> t;
+  each_vector<T, width>([&](auto row, auto plane, auto vector) __attribute__((always_inline)) {
+    t.v[decltype(row)::value][decltype(plane)::value][decltype(vector)::value] = zero<T>();
+  });
+  return t;
 }
 
 // Rows become columns: as many vectors as one has lanes.
@@ -74,7 +86,7 @@ inline void unite(V &x, V &y) {
 template <class T, int width>
 [[gnu::always_inline]] inline void split_rows(Tile<T, width> &t) {
   if constexpr (is_complex<T>)
-    repeat<tile_rows>([&](auto row) {
+    repeat<tile_rows>([&](auto row) __attribute__((always_inline)) {
       constexpr int r = decltype(row)::value;
       auto &v = t.v[r];
       if constexpr (row_vectors<T, width> == 1) {
@@ -92,7 +104,7 @@ template <class T, int width>
 [[gnu::always_inline]] inline void unite_rows(Tile<T, width> &t) {
   static_assert(!is_complex<T> || row_vectors<T, width> == 1);
   if constexpr (is_complex<T>)
-    repeat<tile_rows>([&](auto row) {
+    repeat<tile_rows>([&](auto row) __attribute__((always_inline)) {
       constexpr int r = decltype(row)::value;
       unite(t.v[r][0][0], t.v[r][1][0]);
     });
@@ -101,9 +113,9 @@ template <class T, int width>
 // Every element times alpha.
 template <class T, int width>
 [[gnu::always_inline]] inline void scale_tile(Tile<T, width> &t, T alpha) {
-  repeat<static_cast<int>(tile_rows)>([&](auto row) {
+  repeat<static_cast<int>(tile_rows)>([&](auto row) __attribute__((always_inline)) {
     auto &v = t.v[decltype(row)::value];
-    repeat<row_vectors<T, width>>([&](auto vector) {
+    repeat<row_vectors<T, width>>([&](auto vector) __attribute__((always_inline)) {
       constexpr int i = decltype(vector)::value;
       const Vec<T> x = v[0][i], re = broadcast(real_part(alpha));
       v[0][i] = mul(re, x);
@@ -123,23 +135,23 @@ template <bool transposed, int width, class T>
   Tile<T, width> t;
   constexpr int vectors = row_vectors<T, width>, across = static_cast<int>(lanes<T>);
   if constexpr (transposed) {
-    repeat<static_cast<int>(tile_rows) / across>([&](auto group) {
-      repeat<width / across>([&](auto vector) {
+    repeat<static_cast<int>(tile_rows) / across>([&](auto group) __attribute__((always_inline)) {
+      repeat<width / across>([&](auto vector) __attribute__((always_inline)) {
         constexpr int q = decltype(group)::value, i = decltype(vector)::value;
         Vec<T> columns[across];
-        repeat<across>([&](auto c) {
+        repeat<across>([&](auto c) __attribute__((always_inline)) {
           constexpr int j = decltype(c)::value;
           columns[j] = load_unaligned(x + q * across + (i * across + j) * ld);
         });
         transpose(columns);
-        repeat<across>([&](auto row) {
+        repeat<across>([&](auto row) __attribute__((always_inline)) {
           constexpr int r = decltype(row)::value;
           t.v[q * across + r][i / vectors][i % vectors] = columns[r];
         });
       });
     });
   } else {
-    each_vector<T, width>([&](auto row, auto plane, auto vector) {
+    each_vector<T, width>([&](auto row, auto plane, auto vector) __attribute__((always_inline)) {
       constexpr int r = decltype(row)::value, p = decltype(plane)::value, i = decltype(vector)::value;
       t.v[r][p][i] = load_unaligned(x + r * ld + (p * vectors + i) * across);
     });
@@ -153,23 +165,23 @@ template <bool transposed, int width, class T>
   unite_rows(t);
   constexpr int vectors = row_vectors<T, width>, across = static_cast<int>(lanes<T>);
   if constexpr (transposed) {
-    repeat<static_cast<int>(tile_rows) / across>([&](auto group) {
-      repeat<width / across>([&](auto vector) {
+    repeat<static_cast<int>(tile_rows) / across>([&](auto group) __attribute__((always_inline)) {
+      repeat<width / across>([&](auto vector) __attribute__((always_inline)) {
         constexpr int q = decltype(group)::value, i = decltype(vector)::value;
         Vec<T> columns[across];
-        repeat<across>([&](auto row) {
+        repeat<across>([&](auto row) __attribute__((always_inline)) {
           constexpr int r = decltype(row)::value;
           columns[r] = t.v[q * across + r][i / vectors][i % vectors];
         });
         transpose(columns);
-        repeat<across>([&](auto c) {
+        repeat<across>([&](auto c) __attribute__((always_inline)) {
           constexpr int j = decltype(c)::value;
           store_unaligned(x + q * across + (i * across + j) * ld, columns[j]);
         });
       });
     });
   } else {
-    each_vector<T, width>([&](auto row, auto plane, auto vector) {
+    each_vector<T, width>([&](auto row, auto plane, auto vector) __attribute__((always_inline)) {
       constexpr int r = decltype(row)::value, p = decltype(plane)::value, i = decltype(vector)::value;
       store_unaligned(x + r * ld + (p * vectors + i) * across, t.v[r][p][i]);
     });
@@ -179,7 +191,7 @@ template <bool transposed, int width, class T>
 // A tile in the rows of a strip or of a packed triangle, which lie on vector boundaries.
 template <int width, class T>
 [[gnu::always_inline]] inline void store_rows(Real<T> *rows, const Tile<T, width> &t) {
-  each_vector<T, width>([&](auto row, auto plane, auto vector) {
+  each_vector<T, width>([&](auto row, auto plane, auto vector) __attribute__((always_inline)) {
     constexpr int r = decltype(row)::value, p = decltype(plane)::value, i = decltype(vector)::value;
     store_aligned(rows + r * row_length<T, width> + (p * row_vectors<T, width> + i) * lanes<Real<T>>, t.v[r][p][i]);
   });
