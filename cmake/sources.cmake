@@ -38,8 +38,6 @@ set(QTB_KERNEL_SOURCES
   blas/kernels/level3/rank_k/syr2k.cpp
   blas/kernels/level3/symmetric/symm.cpp
   # plain
-  blas/kernels/plain/trmm.cpp
-  blas/kernels/plain/trsm.cpp
 )
 
 # Compiled for some tiers only: these lists alone decide where.
@@ -73,6 +71,8 @@ set(QTB_KERNEL_SOURCES_ssse3
   blas/kernels/level3/rank_k/dsyrk_n4.cpp
   blas/kernels/level3/rank_k/syrk.cpp
   blas/kernels/level3/rank_k/syrk_body.cpp
+  blas/kernels/level3/triangular/level_trmm.cpp
+  blas/kernels/level3/triangular/level_trsm.cpp
 )
 set(QTB_KERNEL_SOURCES_sse42
   blas/kernels/level2/gemv_kernels.cpp
@@ -86,6 +86,8 @@ set(QTB_KERNEL_SOURCES_sse42
   blas/kernels/level3/rank_k/dsyrk_n4.cpp
   blas/kernels/level3/rank_k/syrk.cpp
   blas/kernels/level3/rank_k/syrk_body.cpp
+  blas/kernels/level3/triangular/level_trmm.cpp
+  blas/kernels/level3/triangular/level_trsm.cpp
 )
 set(QTB_KERNEL_SOURCES_avx
   blas/kernels/level2/gemv_kernels.cpp
@@ -98,6 +100,8 @@ set(QTB_KERNEL_SOURCES_avx
   blas/kernels/level3/rank_k/dsyrk_n4.cpp
   blas/kernels/level3/rank_k/syrk.cpp
   blas/kernels/level3/rank_k/syrk_body.cpp
+  blas/kernels/level3/triangular/level_trmm.cpp
+  blas/kernels/level3/triangular/level_trsm.cpp
 )
 set(qtb_tier_sources "")
 foreach(tier IN LISTS QTB_TIERS)
