@@ -35,12 +35,11 @@ set(QTB_KERNEL_SOURCES
   # level3
   blas/kernels/level3/gemm/scale_c.cpp
   blas/kernels/level3/gemm/small.cpp
+  blas/kernels/level3/triangular/unblocked.cpp
   # plain
   blas/kernels/plain/symm.cpp
   blas/kernels/plain/syr2k.cpp
   blas/kernels/plain/syrk.cpp
-  blas/kernels/plain/trmm.cpp
-  blas/kernels/plain/trsm.cpp
 )
 
 # Compiled for some tiers only: these lists alone decide where.
@@ -52,6 +51,8 @@ set(QTB_KERNEL_SOURCES_def
   blas/kernels/level3/gemm/def/folding_kernels.cpp
   blas/kernels/level3/gemm/def/pack.cpp
   blas/kernels/level3/gemm/pack.cpp
+  blas/kernels/level3/triangular/def/trmm.cpp
+  blas/kernels/level3/triangular/def/trsm.cpp
 )
 set(QTB_KERNEL_SOURCES_sse3
   blas/kernels/level2/gemv_kernels.cpp
@@ -60,6 +61,8 @@ set(QTB_KERNEL_SOURCES_sse3
   blas/kernels/level3/gemm/pack.cpp
   blas/kernels/level3/gemm/sse3/dgemm.cpp
   blas/kernels/level3/gemm/sse3/dgemm_kernel.cpp
+  blas/kernels/level3/triangular/def/trmm.cpp
+  blas/kernels/level3/triangular/def/trsm.cpp
 )
 set(QTB_KERNEL_SOURCES_ssse3
   blas/kernels/level2/gemv_kernels.cpp
@@ -69,6 +72,9 @@ set(QTB_KERNEL_SOURCES_ssse3
   blas/kernels/level3/gemm/ssse3/gemm.cpp
   blas/kernels/level3/gemm/ssse3/gemm_kernel.cpp
   blas/kernels/level3/gemm/ssse3/pack.cpp
+  blas/kernels/level3/triangular/small_right.cpp
+  blas/kernels/plain/trmm.cpp
+  blas/kernels/plain/trsm.cpp
 )
 set(QTB_KERNEL_SOURCES_sse42
   blas/kernels/level2/gemv_kernels.cpp
@@ -79,6 +85,9 @@ set(QTB_KERNEL_SOURCES_sse42
   blas/kernels/level3/gemm/sse42/dgemm_kernel.cpp
   blas/kernels/level3/gemm/sse42/gemm_kernel.cpp
   blas/kernels/level3/gemm/sse42/pieces.cpp
+  blas/kernels/level3/triangular/small_right.cpp
+  blas/kernels/plain/trmm.cpp
+  blas/kernels/plain/trsm.cpp
 )
 set(QTB_KERNEL_SOURCES_avx
   blas/kernels/level2/gemv_kernels.cpp
@@ -88,6 +97,9 @@ set(QTB_KERNEL_SOURCES_avx
   blas/kernels/level3/gemm/pack.cpp
   blas/kernels/level3/gemm/pieces.cpp
   blas/kernels/level3/gemm/sse42/gemm_kernel.cpp
+  blas/kernels/level3/triangular/small_right.cpp
+  blas/kernels/plain/trmm.cpp
+  blas/kernels/plain/trsm.cpp
 )
 set(qtb_tier_sources "")
 foreach(tier IN LISTS QTB_TIERS)
