@@ -37,7 +37,7 @@ set(QTB_KERNEL_SOURCES
   blas/kernels/level3/gemm/small.cpp
   blas/kernels/level3/rank_k/syr2k.cpp
   blas/kernels/level3/symmetric/symm.cpp
-  # plain
+  blas/kernels/level3/triangular/unblocked.cpp
 )
 
 # Compiled for some tiers only: these lists alone decide where.
@@ -50,6 +50,8 @@ set(QTB_KERNEL_SOURCES_def
   blas/kernels/level3/gemm/def/pack.cpp
   blas/kernels/level3/gemm/pack.cpp
   blas/kernels/level3/rank_k/syrk_tiles.cpp
+  blas/kernels/level3/triangular/def/trmm.cpp
+  blas/kernels/level3/triangular/def/trsm.cpp
 )
 set(QTB_KERNEL_SOURCES_sse3
   blas/kernels/level2/gemv_kernels.cpp
@@ -59,6 +61,8 @@ set(QTB_KERNEL_SOURCES_sse3
   blas/kernels/level3/gemm/sse3/dgemm.cpp
   blas/kernels/level3/gemm/sse3/dgemm_kernel.cpp
   blas/kernels/level3/rank_k/syrk_tiles.cpp
+  blas/kernels/level3/triangular/def/trmm.cpp
+  blas/kernels/level3/triangular/def/trsm.cpp
 )
 set(QTB_KERNEL_SOURCES_ssse3
   blas/kernels/level2/gemv_kernels.cpp
@@ -73,6 +77,7 @@ set(QTB_KERNEL_SOURCES_ssse3
   blas/kernels/level3/rank_k/syrk_body.cpp
   blas/kernels/level3/triangular/level_trmm.cpp
   blas/kernels/level3/triangular/level_trsm.cpp
+  blas/kernels/level3/triangular/small_right.cpp
 )
 set(QTB_KERNEL_SOURCES_sse42
   blas/kernels/level2/gemv_kernels.cpp
@@ -88,6 +93,7 @@ set(QTB_KERNEL_SOURCES_sse42
   blas/kernels/level3/rank_k/syrk_body.cpp
   blas/kernels/level3/triangular/level_trmm.cpp
   blas/kernels/level3/triangular/level_trsm.cpp
+  blas/kernels/level3/triangular/small_right.cpp
 )
 set(QTB_KERNEL_SOURCES_avx
   blas/kernels/level2/gemv_kernels.cpp
@@ -102,6 +108,7 @@ set(QTB_KERNEL_SOURCES_avx
   blas/kernels/level3/rank_k/syrk_body.cpp
   blas/kernels/level3/triangular/level_trmm.cpp
   blas/kernels/level3/triangular/level_trsm.cpp
+  blas/kernels/level3/triangular/small_right.cpp
 )
 set(qtb_tier_sources "")
 foreach(tier IN LISTS QTB_TIERS)
