@@ -41,7 +41,6 @@ QTB_KERNEL(csyrk, syrk, cfloat, syrk<cfloat>)
 QTB_KERNEL(zsyrk, syrk, cdouble, syrk<cdouble>)
 QTB_KERNEL(cherk, herk, cfloat, herk<cfloat>)
 QTB_KERNEL(zherk, herk, cdouble, herk<cdouble>)
-#if QTB_TIER_AT_LEAST(ssse3)
 QTB_KERNEL(ssyrk_body, syrk, float, syrk<float>)
 QTB_KERNEL(dsyrk_body, syrk, double, syrk<double>)
 QTB_KERNEL(csyrk_body, syrk, cfloat, syrk<cfloat>)
@@ -49,6 +48,5 @@ QTB_KERNEL(zsyrk_body, syrk, cdouble, syrk<cdouble>)
 QTB_KERNEL(cherk_body, herk, cfloat, herk<cfloat>)
 QTB_KERNEL(zherk_body, herk, cdouble, herk<cdouble>)
 QTB_KERNEL(dsyrk_n4, syrk, double, syrk<double>)
-#endif
 
 }  // namespace qtb::QTB_TIER
