@@ -32,6 +32,7 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <iterator>
 #include <string>
 #include <vector>
 
@@ -41,7 +42,7 @@
 #include "bench/sides.h"
 #include "bench/timing.h"
 #include "bench/traffic.h"
-#include "blas/tiers.h"
+#include "blas/kernels/level3/gemm/tiles.h"
 
 namespace qtb::bench {
 namespace {
@@ -57,7 +58,7 @@ struct Options {
   long threads = 1;
   int turns = 21;
   double seconds = 0.5;
-  bool avx = false;  // the tier of this library's side
+  int tier = -1;  // of this library's side, where it is asked for
 };
 
 struct Case {
@@ -179,11 +180,28 @@ bool compare(const Options &options, const CoreLimits &limits, const Case &item,
   return all_well;
 }
 
-// The avx tier's only kernel with 32-byte vectors is that of dgemm, which the other real products in double precision
-// are made of.
+// Whether a tier's products of this type are made by a kernel with vectors of 32 bytes.
+bool has_wide_kernel(int tier, char kind) {
+  struct Listed {
+    int tier;
+    char kind;
+    int vector_bytes;
+  };
+  constexpr auto first = [](int vector_bytes, auto...) { return vector_bytes; };
+#define QTB_INNER_KERNEL(tier, T, family, any, aligned, stage, step) {tier_##tier, tiles::kind_of<T>, first step},
+  const Listed kernels[] = {
+#include "blas/kernels/level3/gemm/kernels.def"
+  };
+  return std::any_of(std::begin(kernels), std::end(kernels), [&](const Listed &kernel) {
+    return kernel.tier == tier && kernel.kind == kind && kernel.vector_bytes == 32;
+  });
+}
+
 Limit product_limit(const Options &options, const Routine &routine) {
-  if (options.avx && !routine.is_single && !routine.kind.complex) return &CoreLimits::wide_double_flops;
-  return routine.is_single ? &CoreLimits::single_flops : &CoreLimits::double_flops;
+  const char kind = routine.kind.complex ? (routine.is_single ? 'c' : 'z') : (routine.is_single ? 's' : 'd');
+  const bool wide = has_wide_kernel(options.tier, kind);
+  if (routine.is_single) return wide ? &CoreLimits::wide_single_flops : &CoreLimits::single_flops;
+  return wide ? &CoreLimits::wide_double_flops : &CoreLimits::double_flops;
 }
 
 // What bounds a call: the arithmetic of Level 3, and the moves as well of the others.
@@ -223,8 +241,10 @@ Case make_case(const Options &options, const CoreLimits &limits, const Selected 
     if (std::strchr("mnk", *axis) != nullptr) item.label += (item.label.empty() ? "" : "x") + std::to_string(value);
     return std::to_string(value);
   };
-  item.numbers = number("m", problem.m) + ',' + number("n", problem.n) + ',' + number("k", problem.k) + ',' +
-                 number("lb", problem.kl) + ',' + number("xy", problem.incx);
+  // In this order, in which the label grows: the operands of a sum of texts are evaluated in any.
+  const std::string numbers[] = {number("m", problem.m), number("n", problem.n), number("k", problem.k),
+                                 number("lb", problem.kl), number("xy", problem.incx)};
+  for (const std::string &text : numbers) item.numbers += (&text == numbers ? "" : ",") + text;
   if (routine.has_axis("lb")) item.label += " b" + std::to_string(problem.kl);
   if (routine.has_axis("xy") && problem.incx != 1) item.label += " inc " + std::to_string(problem.incx);
   const double flops = d.work.flops(routine.kind.complex);
@@ -324,7 +344,7 @@ Options parse(int argc, char **argv) {
     if (peer.path == "self") peer.path = options.ours.path;
   // What both sides have in common comes first, so that the settings of a side go before it.
   if (!tier.empty()) set_environment("QTB_DEBUG_CPU_TYPE=" + tier);
-  options.avx = tier == std::to_string(tier_avx);
+  if (!tier.empty()) options.tier = std::stoi(tier);
   for (const char *variable : {"QTB_NUM_THREADS", "OMP_NUM_THREADS", "OPENBLAS_NUM_THREADS", "BLIS_NUM_THREADS"})
     set_environment(variable + ("=" + std::to_string(options.threads)));
   return options;

@@ -3,8 +3,8 @@
 // Each kernel of the process's tier multiplies panels with the depth of a block of its family. A row has its rate where
 // the panel of A is a whole block, and the shares of the arithmetic rate of a core with the same vectors (CoreLimits)
 // that it reaches with such a block, that it reaches with few rows, whose panel lies in the second cache level, and
-// that the instructions of its step leave at most (MixShares). What a whole product has less goes to packing, to the
-// small path and to the far caches. QTB_DEBUG_CPU_TYPE chooses the tier.
+// that its step leaves at most (the column of kernels.def, beside what the core does in the same time). What a whole
+// product has less goes to packing, to the small path and to the far caches. QTB_DEBUG_CPU_TYPE chooses the tier.
 
 #include <algorithm>
 #include <cstdio>
@@ -24,60 +24,45 @@ namespace {
 template <class T>
 using Kernel = void(QtbInt m, QtbInt n, QtbInt kp, const T *ap, QtbInt ldap, const T *bp, QtbInt ldbp, T *c, QtbInt ldc,
                     T *stage);
-using EdgeKernel = void(QtbInt m, QtbInt n, QtbInt k, const double *a, QtbInt lda, const double *b, QtbInt ldb,
-                        double *c, QtbInt ldc, const double *alpha, const double *beta_lanes);
-
-// What stands in a step beside so many products and sums, and the share of the arithmetic rate that it leaves.
-struct Step {
-  const char *text;
-  double MixShares::*share;  // null: all of it
-  bool wide = false;         // vectors of 32 bytes
-};
-constexpr Step arithmetic{"arithmetic alone", nullptr}, one_shuffle{"a shuffle beside 16", &MixShares::one_shuffle},
-    two_shuffles{"two shuffles beside 16", &MixShares::two_shuffles},
-    two_wide_inserts{"two inserts beside 16", &MixShares::two_wide_inserts, true},
-    thirteen_loads{"13 loads beside 24", &MixShares::thirteen_loads};
-
-// X(tier, T, family, kernel, step)
-// clang-format off
-#define QTB_LISTED_KERNELS(X) \
-  X(def,   float,   base,  sgemm_kernel_112,      arithmetic) \
-  X(def,   double,  base,  dgemm_kernel_128,      thirteen_loads) \
-  X(def,   double,  def_a, dgemm_def_kernel,      arithmetic) \
-  X(def,   cfloat,  base,  cgemm_kernel_64,       arithmetic) \
-  X(def,   cdouble, base,  zgemm_kernel_64,       arithmetic) \
-  X(sse3,  float,   base,  sgemm_kernel_112,      arithmetic) \
-  X(sse3,  cfloat,  base,  cgemm_kernel_64,       arithmetic) \
-  X(sse3,  cdouble, base,  zgemm_kernel_64,       arithmetic) \
-  X(ssse3, float,   base,  sgemm_kernel,          arithmetic) \
-  X(ssse3, double,  base,  dgemm_kernel,          arithmetic) \
-  X(ssse3, cfloat,  base,  cgemm_kernel,          arithmetic) \
-  X(ssse3, cdouble, base,  zgemm_kernel,          arithmetic) \
-  X(ssse3, float,   sse41, sgemm_kernel_sse41_ca, arithmetic) \
-  X(ssse3, double,  sse41, dgemm_kernel_sse41_ca, two_shuffles) \
-  X(ssse3, cfloat,  sse41, cgemm_kernel_sse41_ca, arithmetic) \
-  X(ssse3, cdouble, sse41, zgemm_kernel_sse41_ca, arithmetic) \
-  X(sse42, float,   base,  sgemm_kernel_ca,       one_shuffle) \
-  X(sse42, double,  base,  dgemm_kernel_ca,       one_shuffle) \
-  X(sse42, cfloat,  base,  cgemm_kernel_ca,       one_shuffle) \
-  X(sse42, cdouble, base,  zgemm_kernel_ca,       one_shuffle) \
-  X(avx,   float,   base,  sgemm_kernel_ca,       one_shuffle) \
-  X(avx,   double,  base,  dgemm_kernel,          two_wide_inserts) \
-  X(avx,   cfloat,  base,  cgemm_kernel_ca,       one_shuffle) \
-  X(avx,   cdouble, base,  zgemm_kernel_ca,       one_shuffle)
-// clang-format on
+template <class T>
+using EdgeKernel = void(QtbInt m, QtbInt n, QtbInt k, const T *a, QtbInt lda, const T *b, QtbInt ldb, T *c, QtbInt ldc,
+                        const T *alpha, const T *beta_lanes);
 
 extern "C" {
-#define QTB_DECLARE(tier, T, family, name, step) Kernel<T> qtb_blas_##tier##_##name;
-QTB_LISTED_KERNELS(QTB_DECLARE)
-#undef QTB_DECLARE
-EdgeKernel qtb_blas_sse3_dgemm_kernel_a112;
+#define QTB_PARAMS_OF_inner Kernel
+#define QTB_PARAMS_OF_edge EdgeKernel
+#define QTB_INNER_KERNEL(tier, T, family, any, aligned, stage, step) Kernel<T> qtb_blas_##tier##_##aligned;
+#define QTB_BLOCK_KERNEL(tier, T, family, params, name, step) QTB_PARAMS_OF_##params<T> qtb_blas_##tier##_##name;
+#include "blas/kernels/level3/gemm/kernels.def"
 }
 
-// The one that takes other arguments. It reads neither alpha nor beta.
-void sse3_dgemm_kernel_a112(QtbInt m, QtbInt n, QtbInt kp, const double *ap, QtbInt ldap, const double *bp, QtbInt ldbp,
-                            double *c, QtbInt ldc, double *) {
-  qtb_blas_sse3_dgemm_kernel_a112(m, n, kp, ap, ldap, bp, ldbp, c, ldc, nullptr, nullptr);
+// A kernel as it is called here. Those for edges read neither alpha nor beta where both are 1.
+template <auto kernel, class T>
+void call(QtbInt m, QtbInt n, QtbInt kp, const T *ap, QtbInt ldap, const T *bp, QtbInt ldbp, T *c, QtbInt ldc,
+          T *stage) {
+  if constexpr (std::is_same_v<decltype(kernel), EdgeKernel<T> *>)
+    kernel(m, n, kp, ap, ldap, bp, ldbp, c, ldc, nullptr, nullptr);
+  else
+    kernel(m, n, kp, ap, ldap, bp, ldbp, c, ldc, stage);
+}
+
+// The column of kernels.def.
+struct Step {
+  int vector_bytes, arithmetic, loads, shuffles, instructions;
+};
+
+// The share of the arithmetic rate that a step leaves at most: shuffles take the place of products and sums where a
+// processor has no other units for them; loads, and instructions in all, take their time beside those.
+double most_share(const Step &step, const CoreLimits &limits) {
+  const bool wide = step.vector_bytes == 32;
+  constexpr double narrow_doubles = 2, wide_doubles = 4, between_shuffles = 16;
+  const double arithmetic_rate = wide ? limits.wide_double_flops / wide_doubles : limits.double_flops / narrow_doubles;
+  const double shuffle_seconds =
+      between_shuffles * narrow_doubles * std::max(0.0, 1 / limits.shuffled_flops - 1 / limits.double_flops);
+  const double arithmetic_seconds = step.arithmetic / arithmetic_rate;
+  return arithmetic_seconds / std::max({arithmetic_seconds + step.shuffles * shuffle_seconds,
+                                        step.loads / (wide ? limits.wide_load_rate : limits.load_rate),
+                                        step.instructions / limits.instruction_rate});
 }
 
 template <class T>
@@ -85,7 +70,7 @@ struct Listed {
   const char *name;
   Kernel<T> *kernel;
   tiles::GemmBlocks blocks;
-  const Step &step;
+  Step step;
 };
 
 // The blocks of a large problem on this processor.
@@ -131,15 +116,29 @@ double best_rate(const Listed<T> &listed, QtbInt rows) {
 }
 
 template <class T>
-void measure(const Listed<T> &listed, const CoreLimits &limits, const MixShares &mixes) {
-  const double peak = std::is_same_v<Real<T>, float> ? limits.single_flops
-                      : listed.step.wide             ? limits.wide_double_flops
-                                                     : limits.double_flops;
-  const double most = listed.step.share == nullptr ? 1 : mixes.*listed.step.share;
+void measure(const Listed<T> &listed, const CoreLimits &limits) {
+  const bool wide = listed.step.vector_bytes == 32;
+  const double peak = std::is_same_v<Real<T>, float> ? (wide ? limits.wide_single_flops : limits.single_flops)
+                                                     : (wide ? limits.wide_double_flops : limits.double_flops);
   const double rate = best_rate(listed, listed.blocks.mb);
-  std::printf("%-22s %5lld %5lld %9.1f %7.3f %7.3f %7.3f  %s\n", listed.name, static_cast<long long>(listed.blocks.kb),
-              static_cast<long long>(listed.blocks.mb), rate * 1e-9, rate / peak, best_rate(listed, few_rows) / peak,
-              most, listed.step.text);
+  const Step &step = listed.step;
+  std::printf("%-22s %5lld %5lld %9.1f %7.3f %7.3f %7.3f  %d %d %d %d\n", listed.name,
+              static_cast<long long>(listed.blocks.kb), static_cast<long long>(listed.blocks.mb), rate * 1e-9,
+              rate / peak, best_rate(listed, few_rows) / peak, most_share(step, limits), step.arithmetic, step.loads,
+              step.shuffles, step.instructions);
+}
+
+void measure_kernels(ProcessorTier tier, const CoreLimits &limits) {
+#define QTB_MEASURE(listed_tier, T, family, name, step)                                                             \
+  if (tier == tier_##listed_tier)                                                                                   \
+    measure<T>(                                                                                                     \
+        {#name, call<qtb_blas_##listed_tier##_##name, T>,                                                           \
+         large_blocks(tiles::find_rules(tiles::kind_of<T>, tier_##listed_tier, tiles::Family::family)), Step step}, \
+        limits);
+#define QTB_INNER_KERNEL(tier, T, family, any, aligned, stage, step) QTB_MEASURE(tier, T, family, aligned, step)
+#define QTB_BLOCK_KERNEL(tier, T, family, params, name, step) QTB_MEASURE(tier, T, family, name, step)
+#include "blas/kernels/level3/gemm/kernels.def"
+#undef QTB_MEASURE
 }
 
 }  // namespace
@@ -147,18 +146,11 @@ void measure(const Listed<T> &listed, const CoreLimits &limits, const MixShares 
 
 int main() {
   using namespace qtb::bench;
-  const ProcessorTier tier = qtb_serv_cpu_detect();
   const CoreLimits limits = measure_core_limits();
-  const MixShares mixes = measure_mix_shares();
+  const double product = limits.double_flops / 2;
+  std::printf("in the time of a product or sum of 16 bytes: %.2f loads, %.2f stores, %.2f instructions\n",
+              limits.load_rate / product, limits.store_rate / product, limits.instruction_rate / product);
   std::printf("%-22s %5s %5s %9s %7s %7s %7s  %s\n", "kernel", "depth", "rows", "GFLOP/s", "share", "few", "at most",
-              "by its step");
-#define QTB_BLOCKS(tier, T, family) \
-  large_blocks(tiles::find_rules(tiles::kind_of<T>, tier_##tier, tiles::Family::family))
-#define QTB_MEASURE(listed_tier, T, family, name, step) \
-  if (tier == tier_##listed_tier)                       \
-    measure<T>({#name, qtb_blas_##listed_tier##_##name, QTB_BLOCKS(listed_tier, T, family), step}, limits, mixes);
-  QTB_LISTED_KERNELS(QTB_MEASURE)
-  if (tier == tier_sse3)
-    measure<double>({"dgemm_kernel_a112", sse3_dgemm_kernel_a112, QTB_BLOCKS(sse3, double, base), arithmetic}, limits,
-                    mixes);
+              "by arithmetic, loads, shuffles, instructions");
+  measure_kernels(qtb_serv_cpu_detect(), limits);
 }

@@ -49,6 +49,7 @@ constexpr double instructions = 16;  // per pass of each loop
   QTB_CLEAR(8) QTB_CLEAR(9) QTB_CLEAR(10) QTB_CLEAR(11) QTB_CLEAR(12) QTB_CLEAR(13) QTB_CLEAR(14) QTB_CLEAR(15)
 // clang-format on
 
+#define QTB_FOUR(body) body body body body
 #define QTB_LOOP(body) ".p2align 6\n1:\n\t" body "dec %0\n\tjnz 1b"
 
 void double_loop(long count) {
@@ -71,9 +72,10 @@ void single_loop(long count) {
                : QTB_CLOBBERED);
 }
 
-alignas(64) char block[256];
+alignas(64) char block[256 + 16];  // zeros; the last load of 32 bytes begins at 240
 
 #define QTB_LOAD(at, r) "movaps " #at "(%1), %%xmm" #r "\n\t"
+#define QTB_WIDE_LOAD(at, r) "vmovaps " #at "(%1), %%ymm" #r "\n\t"
 #define QTB_STORE(at, r) "movaps %%xmm" #r ", " #at "(%1)\n\t"
 #define QTB_BLOCK(move)                                                                                        \
   move(0, 0) move(16, 1) move(32, 2) move(48, 3) move(64, 4) move(80, 5) move(96, 6) move(112, 7) move(128, 8) \
@@ -81,6 +83,25 @@ alignas(64) char block[256];
 
 void load_loop(long count) { asm volatile(QTB_LOOP(QTB_BLOCK(QTB_LOAD)) : "+r"(count) : "r"(block) : QTB_CLOBBERED); }
 void store_loop(long count) { asm volatile(QTB_LOOP(QTB_BLOCK(QTB_STORE)) : "+r"(count) : "r"(block) : "memory"); }
+
+[[gnu::target("avx")]] void wide_load_loop(long count) {
+  asm volatile(QTB_LOOP(QTB_BLOCK(QTB_WIDE_LOAD)) "\n\tvzeroupper" : "+r"(count) : "r"(block) : QTB_CLOBBERED);
+}
+
+// Of four bytes each, so that nothing but their number counts to those that decode and keep them.
+#define QTB_NOTHING "nopl 0(%%rax)\n\t"
+#define QTB_NOTHINGS QTB_NOTHING QTB_NOTHING QTB_NOTHING QTB_NOTHING
+constexpr double nothings = 64;
+void instruction_loop(long count) { asm volatile(QTB_LOOP(QTB_FOUR(QTB_FOUR(QTB_NOTHINGS))) : "+r"(count)); }
+
+// The shuffle writes the register of a product, so that nothing waits for a chain longer than those of arithmetic.
+constexpr double shuffled_instructions = 4 * instructions;
+void shuffled_loop(long count) {
+  asm volatile(QTB_CLEAR_ALL QTB_LOOP(QTB_FOUR("pshufd $0x4e, (%1), %%xmm0\n\t" QTB_ARITHMETIC(QTB_PAIR, "pd")))
+               : "+r"(count)
+               : "r"(block)
+               : QTB_CLOBBERED);
+}
 
 struct LimitLoop {
   Limit limit;
@@ -95,6 +116,9 @@ constexpr LimitLoop limit_loops[] = {
     {&CoreLimits::wide_single_flops, wide_single_loop, instructions * 8, true},
     {&CoreLimits::load_rate, load_loop, instructions},
     {&CoreLimits::store_rate, store_loop, instructions},
+    {&CoreLimits::wide_load_rate, wide_load_loop, instructions, true},
+    {&CoreLimits::instruction_rate, instruction_loop, nothings},
+    {&CoreLimits::shuffled_flops, shuffled_loop, shuffled_instructions * 2},
 };
 
 void copy_vectors(const __m128i *from, __m128i *to, std::size_t count) {
@@ -107,41 +131,6 @@ void copy_vectors(const __m128i *from, __m128i *to, std::size_t count) {
     _mm_store_si128(to + i + 3, d);
   }
 }
-
-// The arithmetic of the loops above with a few other instructions among it, each ahead of a product whose register it
-// writes, so that nothing waits for a chain longer than those above. The block holds zeros.
-// clang-format off
-#define QTB_DOUBLE(a, b) QTB_PAIR("pd", a, b)
-#define QTB_WIDE_DOUBLE(a, b) QTB_WIDE_PAIR("pd", a, b)
-#define QTB_MIX(pair, other_0, other_4) \
-  other_0 pair(0, 8) pair(1, 9) pair(2, 10) pair(3, 11) other_4 pair(4, 12) pair(5, 13) pair(6, 14) pair(7, 15)
-#define QTB_SHUFFLE(r) "pshufd $0x4e, (%1), %%xmm" #r "\n\t"
-#define QTB_INSERT(r, from) "vinsertf128 $1, 16(%1), %%ymm" #from ", %%ymm" #r "\n\t"
-#define QTB_PAIR_FROM_MEMORY(at, sum, x) \
-  "movaps %%xmm15, %%xmm" #x "\n\tmulpd " #at "(%1), %%xmm" #x "\n\taddpd %%xmm" #x ", %%xmm" #sum "\n\t"
-#define QTB_THIRTEEN_LOADS \
-  QTB_LOAD(0, 15) \
-  QTB_PAIR_FROM_MEMORY(16, 0, 12) QTB_PAIR_FROM_MEMORY(32, 1, 13) QTB_PAIR_FROM_MEMORY(48, 2, 14) \
-  QTB_PAIR_FROM_MEMORY(64, 3, 12) QTB_PAIR_FROM_MEMORY(80, 4, 13) QTB_PAIR_FROM_MEMORY(96, 5, 14) \
-  QTB_PAIR_FROM_MEMORY(112, 6, 12) QTB_PAIR_FROM_MEMORY(128, 7, 13) QTB_PAIR_FROM_MEMORY(144, 8, 14) \
-  QTB_PAIR_FROM_MEMORY(160, 9, 12) QTB_PAIR_FROM_MEMORY(176, 10, 13) QTB_PAIR_FROM_MEMORY(192, 11, 14)
-// clang-format on
-// Several steps to a turn of the loop, as the kernels have them.
-constexpr double mix_steps = 4;
-#define QTB_STEPS(step) QTB_LOOP(step step step step)
-#define QTB_ON_BLOCK(count) : "+r"(count) : "r"(block) : QTB_CLOBBERED
-
-void one_shuffle_loop(long count) {
-  asm volatile(QTB_CLEAR_ALL QTB_STEPS(QTB_MIX(QTB_DOUBLE, QTB_SHUFFLE(0), "")) QTB_ON_BLOCK(count));
-}
-void two_shuffles_loop(long count) {
-  asm volatile(QTB_CLEAR_ALL QTB_STEPS(QTB_MIX(QTB_DOUBLE, QTB_SHUFFLE(0), QTB_SHUFFLE(4))) QTB_ON_BLOCK(count));
-}
-[[gnu::target("avx")]] void two_wide_inserts_loop(long count) {
-  asm volatile("vzeroall\n\t" QTB_STEPS(
-      QTB_MIX(QTB_WIDE_DOUBLE, QTB_INSERT(0, 8), QTB_INSERT(4, 12))) "\n\tvzeroupper" QTB_ON_BLOCK(count));
-}
-void thirteen_loads_loop(long count) { asm volatile(QTB_CLEAR_ALL QTB_STEPS(QTB_THIRTEEN_LOADS) QTB_ON_BLOCK(count)); }
 
 }  // namespace
 
@@ -156,18 +145,6 @@ CoreLimits measure_core_limits() {
 void work_at_limit(Limit limit, double amount) {
   for (const LimitLoop &loop : limit_loops)
     if (loop.limit == limit) loop.run(std::max(1L, std::lround(amount / loop.amount)));
-}
-
-MixShares measure_mix_shares() {
-  MixShares shares{};
-  const double rate = best_rate(double_loop, instructions);
-  shares.one_shuffle = best_rate(one_shuffle_loop, mix_steps * instructions) / rate;
-  shares.two_shuffles = best_rate(two_shuffles_loop, mix_steps * instructions) / rate;
-  shares.thirteen_loads = best_rate(thirteen_loads_loop, mix_steps * 24) / rate;
-  if (__builtin_cpu_supports("avx") != 0)
-    shares.two_wide_inserts =
-        best_rate(two_wide_inserts_loop, mix_steps * instructions) / best_rate(wide_double_loop, instructions);
-  return shares;
 }
 
 double measure_copy_bandwidth(std::size_t bytes, int threads) {

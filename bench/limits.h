@@ -11,8 +11,11 @@ struct CoreLimits {
   double single_flops;
   double wide_double_flops;  // with vectors of 32 bytes; 0 where the processor has none
   double wide_single_flops;
-  double load_rate;   // 16-byte loads per second from the first-level cache
-  double store_rate;  // 16-byte stores per second to the first-level cache
+  double load_rate;         // 16-byte loads per second from the first-level cache
+  double store_rate;        // 16-byte stores per second to the first-level cache
+  double wide_load_rate;    // 32-byte loads; 0 where the processor has none
+  double instruction_rate;  // instructions per second that need no unit to compute them
+  double shuffled_flops;    // double_flops with one shuffle beside every 16 products and sums
 };
 
 CoreLimits measure_core_limits();
@@ -20,21 +23,9 @@ CoreLimits measure_core_limits();
 // One of them.
 using Limit = double CoreLimits::*;
 
-// So many flops, loads or stores, as fast as the core does them, on the calling thread. 32-byte vectors need a
-// processor that has them.
+// So many flops, loads, stores or instructions, as fast as the core does them, on the calling thread. 32-byte vectors
+// need a processor that has them.
 void work_at_limit(Limit limit, double amount);
-
-// The shares of the arithmetic rate that are left where other instructions stand between the products and sums, still
-// without dependences to wait for and with all data in the first-level cache. What the design of an inner kernel puts
-// into a step of depth cannot be faster.
-struct MixShares {
-  double one_shuffle;       // beside 16 products and sums
-  double two_shuffles;      // beside 16
-  double two_wide_inserts;  // of the upper half from memory, beside 16 of 32 bytes; 0 where the processor has none
-  double thirteen_loads;    // beside 24
-};
-
-MixShares measure_mix_shares();
 
 // Bytes read and written per second by a plain copy loop (16-byte loads and ordinary stores, as the kernels have them)
 // over arrays of so many bytes, which should be far larger than the caches, on one thread or on several.

@@ -22,7 +22,6 @@ set(QTB_KERNEL_SOURCES
   blas/kernels/level2/diagonal_kernels.cpp
   blas/kernels/level2/gbmv.cpp
   blas/kernels/level2/gemv.cpp
-  blas/kernels/level2/ger.cpp
   blas/kernels/level2/symv.cpp
   blas/kernels/level2/syr.cpp
   blas/kernels/level2/syr2.cpp
@@ -42,6 +41,8 @@ set(QTB_KERNEL_SOURCES
 
 # Compiled for some tiers only: these lists alone decide where.
 set(QTB_KERNEL_SOURCES_def
+  blas/kernels/level1/sscal.cpp
+  blas/kernels/level2/def/ger.cpp
   blas/kernels/level3/gemm/def/blocks.cpp
   blas/kernels/level3/gemm/def/dgemm.cpp
   blas/kernels/level3/gemm/def/dgemm_kernel.cpp
@@ -54,7 +55,9 @@ set(QTB_KERNEL_SOURCES_def
   blas/kernels/level3/triangular/def/trsm.cpp
 )
 set(QTB_KERNEL_SOURCES_sse3
+  blas/kernels/level1/sscal.cpp
   blas/kernels/level2/gemv_kernels.cpp
+  blas/kernels/level2/ger.cpp
   blas/kernels/level3/gemm/def/folding_gemm.cpp
   blas/kernels/level3/gemm/def/folding_kernels.cpp
   blas/kernels/level3/gemm/pack.cpp
@@ -65,7 +68,12 @@ set(QTB_KERNEL_SOURCES_sse3
   blas/kernels/level3/triangular/def/trsm.cpp
 )
 set(QTB_KERNEL_SOURCES_ssse3
+  blas/kernels/level1/sscal.cpp
   blas/kernels/level2/gemv_kernels.cpp
+  blas/kernels/level2/ger.cpp
+  blas/kernels/level2/syr2_block.cpp
+  blas/kernels/level2/syr_block.cpp
+  blas/kernels/level2/trmv_block.cpp
   blas/kernels/level3/gemm/blocks.cpp
   blas/kernels/level3/gemm/pieces.cpp
   blas/kernels/level3/gemm/ssse3/blocks.cpp
@@ -80,7 +88,12 @@ set(QTB_KERNEL_SOURCES_ssse3
   blas/kernels/level3/triangular/small_right.cpp
 )
 set(QTB_KERNEL_SOURCES_sse42
+  blas/kernels/level1/sse42/sscal.cpp
   blas/kernels/level2/gemv_kernels.cpp
+  blas/kernels/level2/ger.cpp
+  blas/kernels/level2/syr2_block.cpp
+  blas/kernels/level2/syr_block.cpp
+  blas/kernels/level2/trmv_block.cpp
   blas/kernels/level3/gemm/blocks.cpp
   blas/kernels/level3/gemm/gemm.cpp
   blas/kernels/level3/gemm/pack.cpp
@@ -97,6 +110,10 @@ set(QTB_KERNEL_SOURCES_sse42
 )
 set(QTB_KERNEL_SOURCES_avx
   blas/kernels/level2/gemv_kernels.cpp
+  blas/kernels/level2/ger.cpp
+  blas/kernels/level2/syr2_block.cpp
+  blas/kernels/level2/syr_block.cpp
+  blas/kernels/level2/trmv_block.cpp
   blas/kernels/level3/gemm/avx/dgemm_kernel.cpp
   blas/kernels/level3/gemm/blocks.cpp
   blas/kernels/level3/gemm/gemm.cpp
@@ -134,7 +151,7 @@ set_property(SOURCE ${qtb_hand_vectorised} APPEND PROPERTY COMPILE_OPTIONS -fno-
 # slower, while copy and swap gain by it. Where a pass has many accumulators, registers that are not reused at once do
 # the same good.
 if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
-  foreach(routine asum axpy complex_dot scal)
+  foreach(routine asum axpy complex_dot scal sscal sse42/sscal)
     set_property(SOURCE blas/kernels/level1/${routine}.cpp APPEND PROPERTY COMPILE_OPTIONS -fno-schedule-insns2)
   endforeach()
   foreach(routine asum complex_dot)

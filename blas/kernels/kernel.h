@@ -17,25 +17,6 @@
 // qtb_blas_<tier>_<name>.
 #define QTB_TIER_NAME(name) QTB_TIER_EXPAND(qtb_blas_, QTB_TIER, _##name)
 
-// The numbers of the tiers once more, for #if: where a tier alone has a named procedure, or lacks one.
-#define QTB_RANK_def 0
-#define QTB_RANK_sse3 1
-#define QTB_RANK_ssse3 2
-#define QTB_RANK_sse42 3
-#define QTB_RANK_avx 4
-#define QTB_RANK(tier) QTB_TIER_EXPAND(QTB_RANK_, tier, )
-#define QTB_TIER_AT_LEAST(tier) (QTB_RANK(QTB_TIER) >= QTB_RANK(tier))
-#define QTB_TIER_IS(tier) (QTB_RANK(QTB_TIER) == QTB_RANK(tier))
-#define QTB_RANK_TEXT_OF(rank) #rank
-#define QTB_RANK_TEXT(rank) QTB_RANK_TEXT_OF(rank)
-#define QTB_CHECK_RANK(tier, TIER)                                      \
-  static_assert(QTB_RANK_TEXT(QTB_RANK_##tier)[0] - '0' == tier_##tier, \
-                "blas/kernels/kernel.h: write #define QTB_RANK_" #tier " with the number of the tier " #tier);
-QTB_FOR_EACH_TIER(QTB_CHECK_RANK)
-#undef QTB_CHECK_RANK
-#undef QTB_RANK_TEXT
-#undef QTB_RANK_TEXT_OF
-
 namespace qtb::QTB_TIER {
 
 // What the dispatch slots call of this tier. Kernels call each other by these declarations. They stand in the namespace

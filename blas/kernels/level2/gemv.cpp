@@ -4,9 +4,7 @@
 // nothing of y for a beta of zero. sgemv, and all of the tier def, work straight on the operands; the other types have
 // inner kernels from sse3 on.
 #include "blas/kernels/level2/gemv_direct.h"
-#if QTB_TIER_AT_LEAST(sse3)
 #include "blas/kernels/level2/gemv_tiles.h"
-#endif
 #include "blas/kernels/level2/scale_y.h"
 
 namespace qtb::QTB_TIER {
@@ -21,10 +19,10 @@ QTB_FUNCTION(gemv, T, gemv) {
   if (is_zero(*alpha)) return;
   x = walk_start(x, lenx, *incx);
   y = walk_start(y, leny, *incy);
-#if QTB_TIER_AT_LEAST(sse3)
-  if constexpr (sizeof(T) != sizeof(float)) return tiled_product<T>({op, *m, *n, *alpha, a, *lda, x, *incx, y, *incy});
-#endif
-  direct_product<T>(op, {*m, *n, *alpha, a, *lda, x, *incx, y, *incy});
+  if constexpr (this_tier >= tier_sse3 && sizeof(T) != sizeof(float))
+    tiled_product<T>({op, *m, *n, *alpha, a, *lda, x, *incx, y, *incy});
+  else
+    direct_product<T>(op, {*m, *n, *alpha, a, *lda, x, *incx, y, *incy});
 }
 
 }  // namespace

@@ -1,109 +1,13 @@
-// ger, geru, gerc: A := alpha*x*y^T + A, or alpha*x*y^H + A, for a full m x n matrix.
-//
-// Any address, increments of either sign; x and y do not overlap A. A column whose element of y is zero, in both parts
-// if complex, is skipped: it is not read, and a NaN in x does not reach it. A NaN in y is not zero. The other columns
-// are updates by AXPY; the complex ones of the tier def are made here, four columns at once where all is contiguous.
-#include "blas/kernels/level2/sweep.h"
-#if QTB_TIER_IS(def)
-#include "blas/thread/drivers.h"
-#endif
+// ger, geru, gerc by the tier's own AXPY (ger.h): of all tiers but def.
+#include "blas/kernels/level2/ger.h"
 
 namespace qtb::QTB_TIER {
-namespace {
 
-// ---- By AXPY ----
-
-// The tier's own; in the tier def the front end, which runs serially there.
-#if QTB_TIER_IS(def)
-inline void update(QTB_PARAMS_axpy(float)) { qtb_blas_saxpy(QTB_ARGS_axpy); }
-inline void update(QTB_PARAMS_axpy(double)) { qtb_blas_daxpy(QTB_ARGS_axpy); }
-#else
-inline void update(QTB_PARAMS_axpy(float)) { QTB_TIER_NAME(xsaxpy)(QTB_ARGS_axpy); }
-inline void update(QTB_PARAMS_axpy(double)) { QTB_TIER_NAME(xdaxpy)(QTB_ARGS_axpy); }
-inline void update(QTB_PARAMS_axpy(cfloat)) { QTB_TIER_NAME(xcaxpy)(QTB_ARGS_axpy); }
-inline void update(QTB_PARAMS_axpy(cdouble)) { QTB_TIER_NAME(xzaxpy)(QTB_ARGS_axpy); }
-#endif
-
-template <class T, bool conjugated = false>
-QTB_FUNCTION(ger, T, ger_by_axpy) {
-  if (*m <= 0 || *n <= 0 || is_zero(*alpha)) return;
-  const QtbInt unit = 1;
-  y = walk_start(y, *n, *incy);
-  const auto column = [&](QtbInt j) {
-    const T element = load_element(y + j * *incy);
-    if (is_zero(element)) return;
-    const T factor = *alpha * conjugate_if<conjugated>(element);
-    update(m, &factor, x, incx, a + j * *lda, &unit);
-  };
-  QtbInt j = 0;
-  for (; j + 2 <= *n; j += 2) {
-    column(j);
-    column(j + 1);
-  }
-  if (j < *n) column(j);
-}
-
-// ---- Inline, in the tier def ----
-
-#if QTB_TIER_IS(def)
-template <class T>
-void add_multiple(QtbInt m, T factor, const T *x, QtbInt incx, T *column) {
-  const ColumnFactors<T, 1> f({factor});
-  for (QtbInt i = 0; i < m; i++)
-    store_lowest(column + i, f.add_to(load_repeated(column + i), [&](auto) { return load_repeated(x + i * incx); }));
-}
-
-// Four columns at once, each element of x loaded for all of them.
-template <class T>
-void add_multiples(QtbInt m, const T (&factors)[4], const T *x, T *a, QtbInt lda) {
-  const Factor<T> f0(factors[0]), f1(factors[1]), f2(factors[2]), f3(factors[3]);
-  for (QtbInt i = 0; i < m; i++) {
-    const Vec<T> element = load_repeated(x + i);
-    const auto add_to = [&](const Factor<T> &f, T *p) { store_lowest(p, add(load_repeated(p), f.times(element))); };
-    add_to(f0, a + i);
-    add_to(f1, a + i + lda);
-    add_to(f2, a + i + 2 * lda);
-    add_to(f3, a + i + 3 * lda);
-  }
-}
-
-template <class T, bool conjugated>
-QTB_FUNCTION(ger, T, ger_inline) {
-  if (*m <= 0 || *n <= 0 || is_zero(*alpha)) return;
-  x = walk_start(x, *m, *incx);
-  y = walk_start(y, *n, *incy);
-  const auto factor = [&](QtbInt j) { return *alpha * conjugate_if<conjugated>(load_element(y + j * *incy)); };
-  const auto skipped = [&](QtbInt j) { return is_zero(load_element(y + j * *incy)); };
-  const auto columns = [&](QtbInt j, QtbInt end) {
-    for (; j < end; j++)
-      if (!skipped(j)) add_multiple(*m, factor(j), x, *incx, a + j * *lda);
-  };
-  QtbInt j = 0;
-  if (*incx == 1 && *incy == 1)
-    for (; j + 4 <= *n; j += 4) {
-      if (skipped(j) || skipped(j + 1) || skipped(j + 2) || skipped(j + 3))
-        columns(j, j + 4);
-      else
-        add_multiples(*m, {factor(j), factor(j + 1), factor(j + 2), factor(j + 3)}, x, a + j * *lda, *lda);
-    }
-  columns(j, *n);
-}
-#endif
-
-}  // namespace
-
-QTB_KERNEL(sger, ger, float, ger_by_axpy<float>)
-QTB_KERNEL(dger, ger, double, ger_by_axpy<double>)
-#if QTB_TIER_IS(def)
-QTB_KERNEL(cgeru, ger, cfloat, (ger_inline<cfloat, false>))
-QTB_KERNEL(zgeru, ger, cdouble, (ger_inline<cdouble, false>))
-QTB_KERNEL(cgerc, ger, cfloat, (ger_inline<cfloat, true>))
-QTB_KERNEL(zgerc, ger, cdouble, (ger_inline<cdouble, true>))
-#else
-QTB_KERNEL(cgeru, ger, cfloat, (ger_by_axpy<cfloat>))
-QTB_KERNEL(zgeru, ger, cdouble, (ger_by_axpy<cdouble>))
-QTB_KERNEL(cgerc, ger, cfloat, (ger_by_axpy<cfloat, true>))
-QTB_KERNEL(zgerc, ger, cdouble, (ger_by_axpy<cdouble, true>))
-#endif
+QTB_KERNEL(sger, ger, float, (ger_by_axpy<float, QTB_TIER_NAME(xsaxpy)>))
+QTB_KERNEL(dger, ger, double, (ger_by_axpy<double, QTB_TIER_NAME(xdaxpy)>))
+QTB_KERNEL(cgeru, ger, cfloat, (ger_by_axpy<cfloat, QTB_TIER_NAME(xcaxpy)>))
+QTB_KERNEL(zgeru, ger, cdouble, (ger_by_axpy<cdouble, QTB_TIER_NAME(xzaxpy)>))
+QTB_KERNEL(cgerc, ger, cfloat, (ger_by_axpy<cfloat, QTB_TIER_NAME(xcaxpy), true>))
+QTB_KERNEL(zgerc, ger, cdouble, (ger_by_axpy<cdouble, QTB_TIER_NAME(xzaxpy), true>))
 
 }  // namespace qtb::QTB_TIER

@@ -1,6 +1,5 @@
 // ssyr, dsyr, sspr, dspr: A := alpha*x*x^T + A on one triangle of A, full or packed; cher, zher, chpr, zhpr:
-// A := alpha*x*x^H + A with a real alpha. ssyr_block, dsyr_block: the same on some columns of a triangle together with
-// the rectangle of rows above or below them, for parallel drivers.
+// A := alpha*x*x^H + A with a real alpha.
 //
 // A column whose element of x is zero is skipped (a NaN is not zero), but for the imaginary part of its diagonal, which
 // an update of a Hermitian matrix always sets to zero. Any increment and addresses; x does not overlap A.
@@ -8,50 +7,29 @@
 // The columns of a Hermitian matrix are updated by an axpy: of this tier, or, zher and zhpr of the lower tiers, by the
 // one that may use threads.
 
-#include "blas/kernels/level2/rank_update.h"
+#include "blas/kernels/level2/syr.h"
 #include "blas/thread/drivers.h"
 
 namespace qtb::QTB_TIER {
 namespace {
 
-// Contiguous and strided vectors have a loop each, so that neither saves the registers that the other needs.
-template <bool contiguous, class T>
-[[gnu::noinline]] void update_columns(QtbInt columns, StoredColumns<T> a, T alpha, From<T> x) {
-  if constexpr (contiguous) x.inc = 1;
-  for (; columns > 0; --columns, a.advance()) {
-    const T of_column = x[a.first + a.diagonal()];
-    if (is_zero(of_column)) continue;
-    update_column(a.rows, a.column, OneVector<T>(alpha * of_column), x.template cursor<contiguous>(a.first));
-  }
-}
-template <class T>
-void update(QtbInt columns, const StoredColumns<T> &a, T alpha, const From<T> &x) {
-  if (x.inc == 1)
-    update_columns<true>(columns, a, alpha, x);
-  else
-    update_columns<false>(columns, a, alpha, x);
-}
-
 // column[i] += factor*x[first + i].
 inline void add_multiple(QtbInt rows, cfloat factor, const From<cfloat> &x, QtbInt first, cfloat *column) {
-#if QTB_TIER_AT_LEAST(ssse3)
-  const QtbInt one = 1;
-  QTB_TIER_NAME(xcaxpy)(&rows, &factor, x.argument(first, rows), &x.inc, column, &one);
-#else
-  const OneVector<cfloat> work(factor);
-  if (x.inc == 1)
-    update_column(rows, column, work, x.cursor<true>(first));
-  else
-    update_column(rows, column, work, x.cursor<false>(first));
-#endif
+  if constexpr (this_tier >= tier_ssse3) {
+    const QtbInt one = 1;
+    QTB_TIER_NAME(xcaxpy)(&rows, &factor, x.argument(first, rows), &x.inc, column, &one);
+  } else {
+    const OneVector<cfloat> work(factor);
+    if (x.inc == 1)
+      update_column(rows, column, work, x.cursor<true>(first));
+    else
+      update_column(rows, column, work, x.cursor<false>(first));
+  }
 }
 inline void add_multiple(QtbInt rows, cdouble factor, const From<cdouble> &x, QtbInt first, cdouble *column) {
+  constexpr auto axpy = this_tier >= tier_ssse3 ? QTB_TIER_NAME(xzaxpy) : qtb_blas_zaxpy;
   const QtbInt one = 1;
-#if QTB_TIER_AT_LEAST(ssse3)
-  QTB_TIER_NAME(xzaxpy)(&rows, &factor, x.argument(first, rows), &x.inc, column, &one);
-#else
-  qtb_blas_zaxpy(&rows, &factor, x.argument(first, rows), &x.inc, column, &one);
-#endif
+  axpy(&rows, &factor, x.argument(first, rows), &x.inc, column, &one);
 }
 
 template <class R>
@@ -92,14 +70,6 @@ QTB_FUNCTION(hpr, T, hpr) {
   update_hermitian(*n, packed_triangle(uplo, ap, *n), *alpha, From<T>(x, *n, *incx));
 }
 
-#if QTB_TIER_AT_LEAST(ssse3)
-template <class T>
-QTB_FUNCTION(syr_block, T, syr_block) {
-  if (*len <= 0 || is_zero(*alpha)) return;
-  update(*len, full_triangle(uplo, a, *lda, *len, *other), *alpha, From<T>(x, *len + *other, *incx));
-}
-#endif
-
 }  // namespace
 
 QTB_KERNEL(ssyr, syr, float, syr<float>)
@@ -110,9 +80,5 @@ QTB_KERNEL(sspr, spr, float, spr<float>)
 QTB_KERNEL(dspr, spr, double, spr<double>)
 QTB_KERNEL(chpr, hpr, cfloat, hpr<cfloat>)
 QTB_KERNEL(zhpr, hpr, cdouble, hpr<cdouble>)
-#if QTB_TIER_AT_LEAST(ssse3)
-QTB_KERNEL(ssyr_block, syr_block, float, syr_block<float>)
-QTB_KERNEL(dsyr_block, syr_block, double, syr_block<double>)
-#endif
 
 }  // namespace qtb::QTB_TIER

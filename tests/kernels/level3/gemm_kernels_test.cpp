@@ -14,7 +14,7 @@ using Kernel = void(QtbInt m, QtbInt n, QtbInt kp, const T *ap, QtbInt ldap, con
                     T *stage);
 
 extern "C" {
-#define QTB_INNER_KERNEL(tier, T, family, any, aligned, stage) \
+#define QTB_INNER_KERNEL(tier, T, family, any, aligned, stage, step) \
   QTB_HIDDEN Kernel<T> qtb_blas_##tier##_##any;                \
   QTB_HIDDEN Kernel<T> qtb_blas_##tier##_##aligned;
 #include "blas/kernels/level3/gemm/kernels.def"
@@ -38,7 +38,7 @@ std::vector<Listed<T>> listed() {
     if constexpr (std::is_same_v<T, U>)
       if (processor_runs(tier)) kernels.push_back({tier, family, name, any, aligned, stage});
   };
-#define QTB_INNER_KERNEL(tier, U, family, any, aligned, stage) \
+#define QTB_INNER_KERNEL(tier, U, family, any, aligned, stage, step) \
   add.template operator()<U>(tier_##tier, #family, #any, qtb_blas_##tier##_##any, qtb_blas_##tier##_##aligned, stage);
 #include "blas/kernels/level3/gemm/kernels.def"
   return kernels;

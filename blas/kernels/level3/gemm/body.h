@@ -31,6 +31,7 @@ constexpr BodyForm form_of(Source a, Source b) {
 template <class T, Family family, BodyForm form = BodyForm::full>
 bool begin_product(const Product<T> &p, const T *beta) {
   constexpr SmallLimits limits = limits_of<T, family, form>;
+  static_assert(limits.k > 0, "blas/kernels/level3/gemm/limits.h: write a k of 1 or more, the least that is walked");
   if (p.m < 1 || p.n < 1) return false;
   const bool multiplies = !is_zero(p.alpha);
   if (multiplies && (p.m < limits.m || p.n < limits.n || p.k < limits.k)) {
@@ -69,12 +70,11 @@ bool columns_aligned(const T *c, QtbInt ldc) {
 // Bytes of a panel of A that stay in the second cache level beside what else passes through it, B and C.
 constexpr QtbInt resident_bytes = 384 * 1024;
 
-// Rows of a panel that a kernel takes at a time: all of them, or about equal slices that stay in the cache while the
-// columns pass.
+// Rows of a larger panel that a kernel takes at a time: about equal slices that stay in the cache while the columns
+// pass.
 template <class T>
 QtbInt rows_at_a_time(QtbInt m, QtbInt kp, QtbInt mr) {
   const QtbInt bytes = m * kp * static_cast<QtbInt>(sizeof(T));
-  if (bytes <= resident_bytes) return m;
   const QtbInt slices = (bytes + resident_bytes - 1) / resident_bytes;
   return round_up((m + slices - 1) / slices, mr);
 }
@@ -93,6 +93,8 @@ struct AddingKernels {
   void run_inner(QTB_INNER_KERNEL_PARAMS(T)) const {
     constexpr QtbInt mr = rules_of<T, family>.mr;
     const auto kernel = aligned ? inner.aligned : inner.any;
+    if (m * kp * static_cast<QtbInt>(sizeof(T)) <= resident_bytes)
+      return kernel(m, n, kp, ap, ldap, bp, ldbp, c, ldc, stage);
     const QtbInt step = rows_at_a_time<T>(m, kp, mr);
     for (QtbInt i0 = 0; i0 < m; i0 += step)
       kernel(smaller(step, m - i0), n, kp, ap + i0 / mr * ldap, ldap, bp, ldbp, c + i0, ldc, stage);

@@ -24,7 +24,7 @@ inline std::uintptr_t up_to(std::uintptr_t address, QtbInt boundary) {
 
 // A zero mb or nb: the region of A or of B is not wanted, and the pointer to it is of no use.
 template <class T, Family family>
-GemmBuffers<T> get_buffers(QtbInt mb, QtbInt nb, QtbInt kb, QtbInt stage_per_k) {
+[[gnu::always_inline]] inline GemmBuffers<T> get_buffers(QtbInt mb, QtbInt nb, QtbInt kb, QtbInt stage_per_k) {
   constexpr GemmRules rules = rules_of<T, family>;
   const Regions regions = regions_of(rules, sizeof(T), mb, nb, kb, stage_per_k);
   void *allocation = qtb_serv_malloc(static_cast<std::uint64_t>(regions.total()), region_boundary);

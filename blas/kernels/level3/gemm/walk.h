@@ -66,13 +66,8 @@ void run_small(const Product<T> &p, bool a_is_n, bool b_is_n, QtbInt i0, QtbInt 
                 p.b + (b_is_n ? l0 + j0 * p.ldb : j0 + l0 * p.ldb), &p.ldb, beta, p.c + i0 + j0 * p.ldc, &p.ldc);
 }
 
-// Where the block after that at first begins. One block that holds all has none after it: compilers see that there is
-// no loop, and small problems, which have one block, are spared what goes ahead of loops.
-template <bool one_block>
-QtbInt next_block(QtbInt first, QtbInt step, QtbInt total) {
-  return one_block ? total : first + step;
-}
-
+// one_block: one block of each operand holds all of a product with a depth, and small products are spared what goes
+// ahead of loops.
 template <class T, Family family, Source source_a, Source source_b, class Kernels, bool one_block>
 void walk_blocks(const Product<T> &p, const GemmBlocks &blocks, const T *beta, CallersPanel<T> given_a,
                  CallersPanel<T> given_b) {
@@ -94,30 +89,35 @@ void walk_blocks(const Product<T> &p, const GemmBlocks &blocks, const T *beta, C
   PanelCopy<T> *const copy_a = copies_of<T, family>.a[static_cast<int>(op_a)];
   PanelCopy<T> *const copy_b = copies_of<T, family>.b[static_cast<int>(op_b)];
   const Kernels kernels(p, *beta);
-  for (QtbInt j0 = 0; j0 < full_n; j0 = next_block<one_block>(j0, column_step, full_n)) {
-    const QtbInt n = smaller(column_step, full_n - j0);
-    QtbInt next = 0;
-    for (QtbInt l0 = 0; l0 < p.k; l0 = next) {
-      const QtbInt depth = l0 == 0 ? first_depth(rules.kb, blocks.kb, p.k) : smaller(blocks.kb, p.k - l0);
-      next = next_block<one_block>(l0, depth, p.k);
-      const QtbInt kp = round_up(depth, rules.ku), step_a = kp * rules.mr, step_b = kp * rules.nr;
-      const T *const block_beta = rules.walk.kernels_apply_beta && l0 == 0 ? beta : &one<T>;
-      const T *const b = p.b + (b_is_n ? l0 + j0 * p.ldb : j0 + l0 * p.ldb);
-      if constexpr (packs_b) copy_b(&depth, &n, b, &p.ldb, buffers.b, &step_b, nullptr);
-      for (QtbInt i0 = 0; i0 < full_m; i0 = next_block<one_block>(i0, row_step, full_m)) {
-        const QtbInt m = smaller(row_step, full_m - i0);
-        const T *const a = p.a + (a_is_n ? i0 + l0 * p.lda : l0 + i0 * p.lda);
-        if constexpr (packs_a) copy_a(&m, &depth, a, &p.lda, buffers.a, &step_a, &p.alpha);
-        Block<T> block{m, n, depth, kp, a, p.lda, b, p.ldb, 0, p.c + i0 + j0 * p.ldc, p.ldc, buffers.stage};
-        if constexpr (packs_a) block.a = buffers.a, block.lda = step_a;
-        if constexpr (packs_b) block.b = buffers.b, block.ldb = step_b;
-        if constexpr (source_a == Source::given) block.a = given_a.panels + l0 * rules.mr, block.lda = given_a.ldp;
-        if constexpr (source_b == Source::given) block.b = given_b.panels, block.ldb = given_b.ldp, block.l0_of_b = l0;
-        kernels.run(block, l0 == 0);
+  const auto run_block = [&](QtbInt j0, QtbInt n, QtbInt l0, QtbInt depth) __attribute__((always_inline)) {
+    const QtbInt kp = round_up(depth, rules.ku), step_a = kp * rules.mr, step_b = kp * rules.nr;
+    const T *const b = p.b + (b_is_n ? l0 + j0 * p.ldb : j0 + l0 * p.ldb);
+    if constexpr (packs_b) copy_b(&depth, &n, b, &p.ldb, buffers.b, &step_b, nullptr);
+    const auto run_rows = [&](QtbInt i0, QtbInt m) __attribute__((always_inline)) {
+      const T *const a = p.a + (a_is_n ? i0 + l0 * p.lda : l0 + i0 * p.lda);
+      if constexpr (packs_a) copy_a(&m, &depth, a, &p.lda, buffers.a, &step_a, &p.alpha);
+      Block<T> block{m, n, depth, kp, a, p.lda, b, p.ldb, 0, p.c + i0 + j0 * p.ldc, p.ldc, buffers.stage};
+      if constexpr (packs_a) block.a = buffers.a, block.lda = step_a;
+      if constexpr (packs_b) block.b = buffers.b, block.ldb = step_b;
+      if constexpr (source_a == Source::given) block.a = given_a.panels + l0 * rules.mr, block.lda = given_a.ldp;
+      if constexpr (source_b == Source::given) block.b = given_b.panels, block.ldb = given_b.ldp, block.l0_of_b = l0;
+      kernels.run(block, l0 == 0);
+    };
+    if constexpr (one_block)
+      run_rows(0, full_m);
+    else
+      for (QtbInt i0 = 0; i0 < full_m; i0 += row_step) run_rows(i0, smaller(row_step, full_m - i0));
+    const T *const block_beta = rules.walk.kernels_apply_beta && l0 == 0 ? beta : &one<T>;
+    if (full_m < p.m) run_small(p, a_is_n, b_is_n, full_m, j0, n, l0, depth, block_beta);
+  };
+  if constexpr (one_block)
+    run_block(0, full_n, 0, p.k);
+  else
+    for (QtbInt j0 = 0; j0 < full_n; j0 += column_step)
+      for (QtbInt l0 = 0, depth; l0 < p.k; l0 += depth) {
+        depth = l0 == 0 ? first_depth(rules.kb, blocks.kb, p.k) : smaller(blocks.kb, p.k - l0);
+        run_block(j0, smaller(column_step, full_n - j0), l0, depth);
       }
-      if (full_m < p.m) run_small(p, a_is_n, b_is_n, full_m, j0, n, l0, depth, block_beta);
-    }
-  }
   if constexpr (has_buffers) free_buffers(buffers);
   if (full_n < p.n) run_small(p, a_is_n, b_is_n, 0, full_n, p.n - full_n, 0, p.k, beta);
 }

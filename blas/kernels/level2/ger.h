@@ -1,0 +1,34 @@
+// ger, geru, gerc: A := alpha*x*y^T + A, or alpha*x*y^H + A, for a full m x n matrix, column by column.
+//
+// Any address, increments of either sign; x and y do not overlap A. A column whose element of y is zero, in both parts
+// if complex, is skipped: it is not read, and a NaN in x does not reach it. A NaN in y is not zero. The other columns
+// are updates by AXPY.
+#pragma once
+
+#include "blas/kernels/level2/sweep.h"
+
+namespace qtb::QTB_TIER {
+namespace {
+
+// axpy is the one that updates a column.
+template <class T, auto axpy, bool conjugated = false>
+QTB_FUNCTION(ger, T, ger_by_axpy) {
+  if (*m <= 0 || *n <= 0 || is_zero(*alpha)) return;
+  const QtbInt unit = 1;
+  y = walk_start(y, *n, *incy);
+  const auto column = [&](QtbInt j) {
+    const T element = load_element(y + j * *incy);
+    if (is_zero(element)) return;
+    const T factor = *alpha * conjugate_if<conjugated>(element);
+    axpy(m, &factor, x, incx, a + j * *lda, &unit);
+  };
+  QtbInt j = 0;
+  for (; j + 2 <= *n; j += 2) {
+    column(j);
+    column(j + 1);
+  }
+  if (j < *n) column(j);
+}
+
+}  // namespace
+}  // namespace qtb::QTB_TIER
