@@ -27,32 +27,72 @@ namespace {
 constexpr QtbInt turn_depth = 8, unit_depth = 4;
 
 // direct += rows*b, crossed += exchanged*b, b a vector of B: two columns of real elements, or one staged element of a
-// complex column. The last pair of a step may overwrite the rows, and loads b once.
+// complex column.
 //
-// In assembly, because compilers make one load and a copy of the two loads, and copies of registers are what slows this
-// loop down, not loads; and because they let sums wander from register to register, to meet the loop's end in memory.
-#define QTB_PAIR_OF_PRODUCTS(T, Loaded, load, mul, add)                                                            \
-  [[gnu::always_inline]] inline void add_pair(Vec<T> &direct, Vec<T> &crossed, Vec<T> rows, Vec<T> exchanged_rows, \
-                                              const T *b) {                                                        \
+// In assembly, because compilers make one load and a copy of what is loaded twice, and because they let sums wander
+// from register to register, to meet the loop's end in memory. Where b is a vector on its boundary the rows are copied
+// and multiplied by memory; where it is not it is loaded for each product. Either way a step of 16 products and sums
+// has 25 instructions, 8 of them loads, which 2 loads and 6 instructions a cycle just carry; the first form gains 1 to
+// 6 parts in a hundred. Tried, and slower by 1 to 20: the exchanged rows by two loads, or by a shuffle from memory. The
+// shuffle at another place of the step, or at changing ones, made no difference.
+#define QTB_ALIGNED_PAIR(T, mul, add)                                                                             \
+  [[gnu::always_inline]] inline void add_aligned_pair(Vec<T> &direct, Vec<T> &crossed, Vec<T> rows,               \
+                                                      Vec<T> exchanged_rows, const T *b) {                        \
+    Vec<T> product;                                                                                               \
+    __asm__ volatile("movaps %[r], %[p]\n\t" mul " %[b], %[p]\n\t" add " %[p], %[d]\n\tmovaps %[e], %[p]\n\t" mul \
+                     " %[b], %[p]\n\t" add " %[p], %[c]"                                                          \
+                     : [d] "+&x"(direct), [c] "+&x"(crossed), [p] "=&x"(product)                                  \
+                     : [r] "x"(rows), [e] "x"(exchanged_rows), [b] "m"(*reinterpret_cast<const Vec<T> *>(b)));    \
+  }
+QTB_ALIGNED_PAIR(double, "mulpd", "addpd")
+QTB_ALIGNED_PAIR(cfloat, "mulps", "addps")
+QTB_ALIGNED_PAIR(cdouble, "mulpd", "addpd")
+#undef QTB_ALIGNED_PAIR
+
+#define QTB_LOADED_PAIR(T, Loaded, load, mul, add)                                                                 \
+  [[gnu::always_inline]] inline void add_loaded_pair(Vec<T> &direct, Vec<T> &crossed, Vec<T> rows,                 \
+                                                     Vec<T> exchanged_rows, const T *b) {                          \
     Vec<T> product;                                                                                                \
     __asm__ volatile(load " %[b], %[p]\n\t" mul " %[r], %[p]\n\t" add " %[p], %[d]\n\t" load " %[b], %[p]\n\t" mul \
                           " %[e], %[p]\n\t" add " %[p], %[c]"                                                      \
                      : [d] "+&x"(direct), [c] "+&x"(crossed), [p] "=&x"(product)                                   \
                      : [r] "x"(rows), [e] "x"(exchanged_rows), [b] "m"(*reinterpret_cast<const Loaded *>(b)));     \
-  }                                                                                                                \
-  [[gnu::always_inline]] inline void add_last_pair(Vec<T> &direct, Vec<T> &crossed, Vec<T> rows,                   \
-                                                   Vec<T> exchanged_rows, const T *b) {                            \
-    Vec<T> product;                                                                                                \
-    __asm__ volatile(load " %[b], %[p]\n\t" mul " %[p], %[r]\n\t" add " %[r], %[d]\n\t" mul " %[e], %[p]\n\t" add  \
-                          " %[p], %[c]"                                                                            \
-                     : [d] "+&x"(direct), [c] "+&x"(crossed), [r] "+&x"(rows), [p] "=&x"(product)                  \
-                     : [e] "x"(exchanged_rows), [b] "m"(*reinterpret_cast<const Loaded *>(b)));                    \
   }
-QTB_PAIR_OF_PRODUCTS(float, AnyAddress<double>, "movddup", "mulps", "addps")
-QTB_PAIR_OF_PRODUCTS(double, __m128d_u, "movupd", "mulpd", "addpd")
-QTB_PAIR_OF_PRODUCTS(cfloat, __m128_u, "movups", "mulps", "addps")
-QTB_PAIR_OF_PRODUCTS(cdouble, __m128d_u, "movupd", "mulpd", "addpd")
-#undef QTB_PAIR_OF_PRODUCTS
+QTB_LOADED_PAIR(float, AnyAddress<double>, "movddup", "mulps", "addps")
+QTB_LOADED_PAIR(double, __m128d_u, "movupd", "mulpd", "addpd")
+#undef QTB_LOADED_PAIR
+
+// The last pair of a step, which overwrites the rows, and loads b once.
+#define QTB_LAST_PAIR(T, Loaded, load, mul, add)                                                                  \
+  [[gnu::always_inline]] inline void add_last_pair(Vec<T> &direct, Vec<T> &crossed, Vec<T> rows,                  \
+                                                   Vec<T> exchanged_rows, const T *b) {                           \
+    Vec<T> product;                                                                                               \
+    __asm__ volatile(load " %[b], %[p]\n\t" mul " %[p], %[r]\n\t" add " %[r], %[d]\n\t" mul " %[e], %[p]\n\t" add \
+                          " %[p], %[c]"                                                                           \
+                     : [d] "+&x"(direct), [c] "+&x"(crossed), [r] "+&x"(rows), [p] "=&x"(product)                 \
+                     : [e] "x"(exchanged_rows), [b] "m"(*reinterpret_cast<const Loaded *>(b)));                   \
+  }
+QTB_LAST_PAIR(float, AnyAddress<double>, "movddup", "mulps", "addps")
+QTB_LAST_PAIR(double, __m128d_u, "movupd", "mulpd", "addpd")
+QTB_LAST_PAIR(cfloat, __m128_u, "movups", "mulps", "addps")
+QTB_LAST_PAIR(cdouble, __m128d_u, "movupd", "mulpd", "addpd")
+#undef QTB_LAST_PAIR
+
+// Whether the vectors of B lie on their boundaries: those of real micro-panels of an even width do, where they fill a
+// vector, and those of the stage.
+template <class T, int width>
+constexpr bool b_is_aligned = is_complex<T> || (lanes<T> == 2 && width % 2 == 0);
+
+template <class T, int width, bool last>
+[[gnu::always_inline]] inline void add_pair(Vec<T> &direct, Vec<T> &crossed, Vec<T> rows, Vec<T> exchanged_rows,
+                                            const T *b) {
+  if constexpr (last)
+    add_last_pair(direct, crossed, rows, exchanged_rows, b);
+  else if constexpr (b_is_aligned<T, width>)
+    add_aligned_pair(direct, crossed, rows, exchanged_rows, b);
+  else
+    add_loaded_pair(direct, crossed, rows, exchanged_rows, b);
+}
 
 // A tile of C, mr rows and width columns, as sums: of each two real columns or each complex column one of either kind;
 // of a real column without a neighbour the direct one alone, which is the column as it stands. All of it is inlined,
@@ -88,10 +128,8 @@ struct Tile {
         next_exchanged = exchanged(next_rows);
       }
       repeat<pairs>([&](auto q) __attribute__((always_inline)) {
-        if constexpr (q.value + 1 < pairs + singles)
-          add_pair(direct[q.value], crossed[q.value], rows, exchanged_rows, b + q.value * pair_step);
-        else
-          add_last_pair(direct[q.value], crossed[q.value], rows, exchanged_rows, b + q.value * pair_step);
+        add_pair<T, width, q.value + 1 == pairs + singles>(direct[q.value], crossed[q.value], rows, exchanged_rows,
+                                                           b + q.value * pair_step);
       });
       if constexpr (singles != 0) {
         direct[pairs] = add(direct[pairs], mul(broadcast(b[width - 1]), rows));
