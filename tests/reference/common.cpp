@@ -1,3 +1,4 @@
+// What the oracle of Levels 2 and 3 consists of, as far as it depends on no element type: see common.h.
 #include "tests/reference/common.h"
 
 #include "tests/reference/sums.h"

@@ -1,3 +1,4 @@
+// Sums of products, two lanes at a time or in 113 bits: see sums.h.
 #include "tests/reference/sums.h"
 
 #include <cmath>
