@@ -48,6 +48,7 @@ demo:
 	cmake --build --preset release -j $(JOBS) --target examples
 	build/release/examples/least_squares examples/data/longley.csv examples/data/longley-certified.csv
 	build/release/examples/matrix_product
+	build/release/examples/linear_systems
 
 test:
 	@tools/packages.sh build test

@@ -3,7 +3,7 @@
 # charts and the summary (summary.md) are kept in BUILD_FOLDER/bench-results.
 #
 # Environment:
-#   BENCH_PARTS            what to run (default: slot level1 level2 kernels gemm flat families threads balance)
+#   BENCH_PARTS            what to run (default: slot level1 level2 kernels gemm flat families threads level3 balance)
 #                            slot     what a dispatch slot costs
 #                            level1   Level 1 on one thread and on all, and beside the peer
 #                            level2   Level 2: every option and increment in cache, some beyond it, and on all threads
@@ -12,6 +12,7 @@
 #                            flat     matrix products with one short side, on one thread, beside the peer
 #                            families the same by the kernels that this processor does not take
 #                            threads  matrix products on all threads, beside one thread and beside the peer
+#                            level3   the rest of Level 3 on one thread, beside gemm and the peer, and on all threads
 #                            balance  how evenly matrix products are cut over up to 64 threads (nothing is timed)
 #   BENCH_TIERS            on which tiers (default: all)
 #   BENCH_LONG             with any value, square products of sizes 2000 and 4000 too, and Level 2 with every option at
@@ -24,7 +25,7 @@
 set -eu
 build=$1
 results=$build/bench-results
-parts=${BENCH_PARTS:-slot level1 level2 kernels gemm flat families threads balance}
+parts=${BENCH_PARTS:-slot level1 level2 kernels gemm flat families threads level3 balance}
 threads=$(nproc)
 products=sgemm,dgemm,cgemm,zgemm
 mkdir -p "$results"
@@ -156,6 +157,25 @@ part_threads() {
   [ -n "${PEER:-}" ] || return 0
   heading "products, $threads threads, beside $PEER"
   beside_peer threads-peer --threads "$threads" --routines $products --sizes $sizes
+}
+
+# The routines of Level 3 that cut their work into products.
+beside_gemm=trsm,trmm,symm,hemm,syrk,herk,syr2k
+
+part_level3() {
+  set -- --turns 7 --seconds 0.1
+  heading "Level 3 beside gemm, one thread${PEER:+, beside $PEER}"
+  beside_peer level3 --threads 1 --routines "gemm,$beside_gemm" --options NN,LUNN,LLTN,RUTN,RLNU,LU,RL,UN,LT,LC \
+    --sizes 4,8,16,32,100,300,1000 "$@"
+  beside_peer level3-flat --threads 1 --routines "$beside_gemm" --options LUNN,RLTN,LL,RU,LN \
+    --shapes 1000x1,1000x4,1000x8,1000x16,1x1000,4x1000,8x1000,16x1000 "$@"
+  heading "Level 3 beside gemm, $threads threads, beside one"
+  compared level3-threads-serial --threads "$threads" --routines "$beside_gemm" --options LUNN,RLTN,LL,RU,LN \
+    --sizes 17,32,64,100,200,300,600,1000 --peer self --peer-setting QTB_NUM_THREADS=1 "$@"
+  [ -n "${PEER:-}" ] || return 0
+  heading "Level 3 beside gemm, $threads threads, beside $PEER"
+  beside_peer level3-threads-peer --threads "$threads" --routines "$beside_gemm" --options LUNN,RLTN,LL,RU,LN \
+    --sizes 100,300,1000 "$@"
 }
 
 part_balance() {

@@ -6,8 +6,9 @@ cd "$1"
 order=$(cut -d ' ' -f 2 tiers.txt | tr '\n' ' ')
 
 # table CELL FILE...: the rows of files named <kind>-<tier>.csv. A cell is "rate" (the rate, its share of the limit, the
-# ratio to each peer), "ratio" (that of each kind of file, in the order given, to each peer) or "gemv" (of the rows of
-# trmv and trsv, the rate over that of gemv with the same transposition, type and order).
+# ratio to each peer), "ratio" (that of each kind of file, in the order given, to each peer), "gemv" (of the rows of
+# trmv and trsv, the rate over that of gemv with the same transposition, type and order) or "gemm" (of all rows, the
+# rate over that of gemm of the same type and sizes).
 table() {
   cell=$1
   shift
@@ -16,6 +17,7 @@ table() {
       if (key in cells) text = cells[key] " / " text
       cells[key] = text
     }
+    BEGIN { is_share = cell == "gemv" || cell == "gemm" }
     FNR == 1 {
       split("", column)
       for (i = 1; i <= NF; i++) column[$i] = i
@@ -41,27 +43,28 @@ table() {
       row = $column["routine"] " | " $column["options"] " | " shape
       ratio = $column["ratio"] > 0 ? sprintf("%.2f", $column["ratio"]) : "-"
       outcome = $column["outcome"]
-      if (cell == "gemv") {
+      if (is_share) {
         if ($column["peer"] > 1) next
         type = substr($column["routine"], 1, 1)
-        trans = $column["options"]
-        if ($column["routine"] ~ /^.gemv$/) { gemv[tier, type, trans, shape] = $column["rate"]; next }
-        if ($column["routine"] !~ /^.tr[ms]v$/) next
-        as_gemv[++triangles] = tier SUBSEP type SUBSEP substr(trans, 2, 1) SUBSEP shape
-        rate[triangles] = $column["rate"]
-        row_of[triangles] = row
+        trans = cell == "gemv" ? $column["options"] : "any"
+        if ($column["routine"] ~ "^." cell "$") { whole[tier, type, trans, shape] = $column["rate"]; next }
+        if (cell == "gemv" && $column["routine"] !~ /^.tr[ms]v$/) next
+        if (cell == "gemv") trans = substr(trans, 2, 1)
+        as_whole[++shares] = tier SUBSEP type SUBSEP trans SUBSEP shape
+        rate[shares] = $column["rate"]
+        row_of[shares] = row
         text = ""
       }
       else if (outcome != "measured") text = outcome
       else if (cell == "ratio" || $column["peer"] > 1) text = ratio
       else text = sprintf("%.1f / %.0f%% / %s", $column["rate"], 100 * $column["share"], ratio)
       if (!(row in known)) { known[row] = 1; rows[++count] = row }
-      if (cell != "gemv") join_cell(row SUBSEP tier, text)
+      if (!is_share) join_cell(row SUBSEP tier, text)
     }
     END {
-      for (i = 1; i <= triangles; i++) {
-        split(as_gemv[i], part, SUBSEP)
-        if (gemv[as_gemv[i]] > 0) cells[row_of[i], part[1]] = sprintf("%.2f", rate[i] / gemv[as_gemv[i]])
+      for (i = 1; i <= shares; i++) {
+        split(as_whole[i], part, SUBSEP)
+        if (whole[as_whole[i]] > 0) cells[row_of[i], part[1]] = sprintf("%.2f", rate[i] / whole[as_whole[i]])
       }
       tiers = split(order_of_tiers, order, " ")
       head = "| Routine | Options | Case |"
@@ -107,6 +110,15 @@ section 'Matrix products, one thread, by the kernels that this processor does no
 section 'Matrix products, all threads' \
   'Ratio to this library on one thread / ratio to the peer on all threads' \
   ratio threads-serial threads-peer
+section 'Level 3 beside gemm, one thread' \
+  'GFLOP/s / share of the arithmetic peak / ratio to the peer' \
+  rate level3 level3-flat
+section 'Level 3 beside gemm, one thread, over matrix products' \
+  'Rate over that of gemm of the same type and sizes, in the same run' \
+  gemm level3
+section 'Level 3 beside gemm, all threads' \
+  'Ratio to this library on one thread / ratio to the peer on all threads' \
+  ratio level3-threads-serial level3-threads-peer
 section 'Level 2, one thread' \
   'GFLOP/s / share of what caches, memory and arithmetic allow / ratio to the peer' \
   rate level2 level2-large level2-increments level2-options

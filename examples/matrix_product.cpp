@@ -2,36 +2,25 @@
 //
 //   matrix_product [order]
 //
-// C = A B for square matrices of that order, 1500 by default. The library takes its tier once per process, from
-// QTB_DEBUG_CPU_TYPE where that is set, so the program starts itself anew for each tier. Returns 0 if all products are
-// right, 1 if one is wrong, 2 on a bad argument.
+// C = A B for square matrices of that order, 1500 by default. Returns 0 if all products are right, 1 if one is wrong, 2
+// on a bad argument.
 //
 // A product is checked by a random projection: for a vector v of signs, C v and A (B v) differ by rounding alone, and a
 // wrong element of C shows in C v whatever the signs. Four sums of n terms stand behind an element of the difference
 // (C, C v, B v, A (B v)), each with at most n roundings, so that it is at most 4 n roundings of |A| |B| |v|.
-#include <sys/wait.h>
-#include <unistd.h>
-
 #include <algorithm>
 #include <chrono>
 #include <cmath>
 #include <cstdio>
-#include <cstdlib>
 #include <limits>
 #include <random>
 #include <string>
 #include <vector>
 
 #include "qtb.h"
+#include "tiers.h"
 
 namespace {
-
-enum { right = 0, wrong = 1, bad_argument = 2 };
-
-struct Tier {
-  const char *number, *name;
-  bool runs_here;
-};
 
 // y = A x, or |A| x, with a plain loop.
 std::vector<double> times(QtbInt n, const std::vector<double> &a, const std::vector<double> &x,
@@ -90,52 +79,15 @@ int multiply(const char *tier, QtbInt n) {
   return good ? right : wrong;
 }
 
-// Runs this program in a process of its own with the tier forced, and returns its result.
-int multiply_in_process(const Tier &tier, const char *program, const char *order) {
-  std::fflush(stdout);
-  const pid_t child = fork();
-  if (child == 0) {
-    setenv("QTB_DEBUG_CPU_TYPE", tier.number, 1);
-    execl("/proc/self/exe", program, order, tier.name, static_cast<char *>(nullptr));
-    std::perror(program);
-    _exit(bad_argument);
-  }
-  int status = 0;
-  if (child < 0 || waitpid(child, &status, 0) < 0 || !WIFEXITED(status)) {
-    std::fprintf(stderr, "%s: the process of tier %s did not finish\n", program, tier.name);
-    return wrong;
-  }
-  return WEXITSTATUS(status);
-}
-
 }  // namespace
 
 int main(int count, char **arguments) {
-  const std::string order = count > 1 ? arguments[1] : "1500";
-  char *end = nullptr;
-  const QtbInt n = std::strtoll(order.c_str(), &end, 10);
-  constexpr QtbInt largest = 20000;  // three matrices of 3.2 GB
-  if (*end != '\0' || n < 1 || n > largest || count > 3) {
-    std::fprintf(stderr, "usage: %s [order from 1 to %lld]\n", arguments[0], static_cast<long long>(largest));
-    return bad_argument;
-  }
-  if (count == 3) return multiply(arguments[2], n);  // a process of multiply_in_process
+  constexpr QtbInt usual = 1500, largest = 20000;  // three matrices of 3.2 GB
+  const QtbInt n = order_argument(count, arguments, usual, largest);
+  if (n == 0) return bad_argument;
+  if (count == 3) return multiply(arguments[2], n);  // a process of on_every_tier
 
-  const Tier tiers[] = {
-      {"0", "def", true},
-      {"1", "sse3", __builtin_cpu_supports("sse3") != 0},
-      {"2", "ssse3", __builtin_cpu_supports("ssse3") != 0},
-      {"3", "sse42", __builtin_cpu_supports("sse4.2") != 0},
-      {"4", "avx", __builtin_cpu_supports("avx") != 0},
-  };
   std::printf("dgemm, order %lld\n%-6s %10s %10s %14s\n", static_cast<long long>(n), "tier", "GFLOP/s", "ms",
               "error / bound");
-  int result = right;
-  for (const Tier &tier : tiers) {
-    if (tier.runs_here)
-      result = std::max(result, multiply_in_process(tier, arguments[0], order.c_str()));
-    else
-      std::printf("%-6s this processor lacks its instructions\n", tier.name);
-  }
-  return result;
+  return on_every_tier(arguments[0], std::to_string(n));
 }

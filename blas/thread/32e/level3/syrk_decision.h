@@ -2,7 +2,7 @@
 // answers to two questions. process.h has the answers of this process.
 //
 // The tiers with building blocks cut the triangle into tiles (syrk_tiles.h), the others into a diagonal and strips
-// (strips.h). Asked in this order: tier, max_threads.
+// (strips.h). Asked in this order: tier, max_threads, which orders too small for a second thread do not ask.
 #pragma once
 
 #include "blas/thread/process.h"
@@ -37,6 +37,7 @@ inline constexpr QtbInt syrk_rows_per_thread = 8;  // needed by each thread: two
 template <class Process>
 SyrkDecision syrk_decision(QtbInt n, Process &&process) {
   if (n == syrk_kernel_order) return {syrk_of_order_4, 1};
+  if (n < syrk_rows_per_thread) return {syrk_small, 1};
   const QtbInt threads = process.max_threads();
   if (syrk_rows_per_thread * threads > n) return {syrk_small, 1};
   if (threads < 2) return {syrk_serial, 1};

@@ -1,7 +1,8 @@
 // Whether a triangular product or solve takes threads, and how the matrix is cut then: a pure function of the shape and
 // of what the process answers to two questions. process.h has the answers of this process.
 //
-// Asked in this order, and only when the answer counts: max_threads, tier.
+// Asked in this order, and only when the answer counts: max_threads, tier. Of a matrix so small that no tier and no
+// number of threads would split it nothing is asked.
 #pragma once
 
 #include <type_traits>
@@ -113,6 +114,9 @@ constexpr bool trmm_is_serial(const TrmmCall &call, ProcessorTier tier, QtbInt t
          rule.alone_triangle.holds(triangle) || rule.alone_slab.holds(slab) || whole < rule.least_share;
 }
 
+// Up to so many rows and columns every tier is serial on any number of threads.
+inline constexpr QtbInt trmm_serial_size = 10;
+
 struct TrmmDecision {
   QtbInt threads;  // 1: the dispatch slot on the whole problem. The driver is never asked for it
   QtbInt unit;     // of the shares, whatever team comes
@@ -121,6 +125,7 @@ struct TrmmDecision {
 template <class T, class Process>
 TrmmDecision trmm_decision(const TrmmCall &call, Process &&process) {
   constexpr TrmmDecision serial = {1, 1};
+  if (call.m <= trmm_serial_size && call.n <= trmm_serial_size) return serial;
   const QtbInt threads = process.max_threads();
   if (threads < 2) return serial;
   const ProcessorTier tier = process.tier();
