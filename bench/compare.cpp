@@ -344,7 +344,7 @@ Options parse(int argc, char **argv) {
     if (peer.path == "self") peer.path = options.ours.path;
   // What both sides have in common comes first, so that the settings of a side go before it.
   if (!tier.empty()) set_environment("QTB_DEBUG_CPU_TYPE=" + tier);
-  if (!tier.empty()) options.tier = std::stoi(tier);
+  if (!tier.empty()) options.tier = std::atoi(tier.c_str());
   for (const char *variable : {"QTB_NUM_THREADS", "OMP_NUM_THREADS", "OPENBLAS_NUM_THREADS", "BLIS_NUM_THREADS"})
     set_environment(variable + ("=" + std::to_string(options.threads)));
   return options;
