@@ -7,6 +7,7 @@
 
 #include "tests/reference/level2.h"
 #include "tests/reference/level3.h"
+#include "tests/reference/sums.h"
 
 namespace {
 
@@ -77,8 +78,10 @@ double worst_disagreement(int spread) {
     }
     const Strip x{v[0].data(), v[1].data()}, y{v[2].data(), v[3].data()};
     constexpr bool exact = sizeof(Real<T>) == sizeof(float);
-    const Sum got = compensated_sum<exact>(0, k, x, y, is_complex<T>), want = wide_sum(0, k, x, y, is_complex<T>);
-    const Quad error = magnitude(QuadComplex{got.value.re - want.value.re, got.value.im - want.value.im});
+    const CompensatedSum got = compensated_sum(0, k, x, y, is_complex<T>, exact);
+    const WideSum want = wide_sum(0, k, x, y, is_complex<T>);
+    const QuadComplex value = got.value();
+    const Quad error = magnitude(QuadComplex{value.re - want.value.re, value.im - want.value.im});
     worst = std::fmax(worst, static_cast<double>(error / Quad(want.gauge)));
     EXPECT_NEAR(got.gauge / want.gauge, 1, 1e-12);
   }
@@ -98,6 +101,71 @@ TEST(wide_sums, are_taken_where_products_leave_the_range_of_double) {
   const double a[] = {huge, tiny}, x[] = {huge, tiny}, y[] = {0};
   const Expectation e = gemv('N', 1, 2, tiny, a, 1, x, 1, 0.0, y, 1);
   EXPECT_TRUE(e.at(0, 0).value.re == Quad(0x1p1000));
+}
+
+// alpha*A*B + beta*C beside the same in 113 bits, in units of the gauge.
+template <class T>
+double worst_error_of_a_product() {
+  std::mt19937_64 bits(11);
+  std::uniform_real_distribution<double> part(-1, 1);
+  const auto draw = [&] {
+    if constexpr (is_complex<T>)
+      return T{static_cast<Real<T>>(part(bits)), static_cast<Real<T>>(part(bits))};
+    else
+      return static_cast<T>(part(bits));
+  };
+  double worst = 0;
+  for (QtbInt k = 1; k <= 40; k += 3) {
+    const T alpha = draw(), beta = draw(), c = draw();
+    std::vector<T> a, b;
+    QuadComplex sum;
+    for (QtbInt l = 0; l < k; ++l) {
+      a.push_back(draw()), b.push_back(draw());
+      const QuadComplex p = product(qtb::test::widen(a.back()), qtb::test::widen(b.back()), is_complex<T>);
+      sum.re += p.re, sum.im += p.im;
+    }
+    const Expectation e = gemm('N', 'N', 1, 1, k, alpha, a.data(), 1, b.data(), k, beta, &c, 1);
+    const QuadComplex x = product(qtb::test::widen(alpha), sum, is_complex<T>),
+                      y = product(qtb::test::widen(beta), qtb::test::widen(c), is_complex<T>), got = e.at(0, 0).value;
+    const Quad error = magnitude(QuadComplex{got.re - x.re - y.re, got.im - x.im - y.im});
+    worst = std::fmax(worst, static_cast<double>(error / Quad(e.at(0, 0).gauge)));
+  }
+  return worst;
+}
+
+TEST(products, with_factors_lie_far_below_any_bound) {
+  EXPECT_LT(worst_error_of_a_product<float>(), 0x1p-85);
+  EXPECT_LT(worst_error_of_a_product<double>(), 0x1p-85);
+  EXPECT_LT(worst_error_of_a_product<cfloat>(), 0x1p-85);
+  EXPECT_LT(worst_error_of_a_product<cdouble>(), 0x1p-85);
+}
+
+// Results around the bound, of all magnitudes, judged in doubles and in 113 bits.
+template <class R>
+void expect_same_judgement(int least, int most) {
+  std::mt19937_64 bits(13);
+  std::uniform_real_distribution<double> part(-1, 1);
+  std::uniform_int_distribution<int> exponent(least, most), error(-3, 3);
+  for (int i = 0; i < 20000; ++i) {
+    const double scale = std::ldexp(1, exponent(bits));
+    const Quad want = Quad(part(bits)) * scale + Quad(part(bits)) * scale * Quad(0x1p-54);
+    const Quad gauge = (want < 0 ? -want : want) * Quad(1 + std::fabs(part(bits)));
+    const double c = 1 + i % 50;
+    const R got = static_cast<R>(static_cast<double>(want) +
+                                 part(bits) * c * qtb::test::unit_roundoff<R> * scale * std::ldexp(1, error(bits)));
+    const double ratio = qtb::test::error_ratio(got, want, gauge, c),
+                 wide = qtb::test::wide_error_ratio(got, want, gauge, c, 1);
+    EXPECT_EQ(ratio <= 1, wide <= 1);
+    if (std::isfinite(wide))
+      EXPECT_LE(std::fabs(ratio - wide), 0x1p-40 * wide);
+    else
+      EXPECT_EQ(ratio, wide);
+  }
+}
+
+TEST(error_ratios, in_doubles_decide_as_wide_ones_do) {
+  expect_same_judgement<float>(-160, 128);
+  expect_same_judgement<double>(-1074, 1023);
 }
 
 TEST(products, come_out_as_on_paper) {

@@ -36,7 +36,7 @@ QuadComplex widen(T v) {
 
 // error / bound of one real result: at most 1 passes. Infinite where the class differs.
 template <class R>
-double error_ratio(R got, Quad want, Quad gauge, double c, double alpha_magnitude = 1) {
+double wide_error_ratio(R got, Quad want, Quad gauge, double c, double alpha_magnitude) {
   const double overflow = static_cast<double>(std::numeric_limits<R>::max());
   if (is_nan(gauge) || gauge >= Quad(overflow) / 4 || is_nan(want)) {
     const bool want_nan = is_nan(want), got_nan = std::isnan(got);
@@ -53,6 +53,23 @@ double error_ratio(R got, Quad want, Quad gauge, double c, double alpha_magnitud
   const Quad bound =
       Quad(c) * Quad(unit_roundoff<R>) * gauge + Quad(c) * eta * Quad(alpha_magnitude > 1 ? alpha_magnitude : 1);
   return static_cast<double>(error / bound);
+}
+
+// The same, in doubles where these decide: neither near the ends of their range nor with a ratio near 1. The difference
+// of two doubles, less the part of the expected value beyond a double, is rounded by less than 2^-50 of itself.
+template <class R>
+double error_ratio(R got, Quad want, Quad gauge, double c, double alpha_magnitude = 1) {
+  constexpr double least = 0x1p-900, doubtful = 0x1p-40;
+  constexpr double most = static_cast<double>(std::numeric_limits<R>::max()) / 8;
+  const double scale = static_cast<double>(gauge), high = static_cast<double>(want);
+  if (scale >= least && scale <= most && std::fabs(high) <= most && std::isfinite(got)) {
+    const double low = static_cast<double>(want - Quad(high));
+    const double error = std::fabs((static_cast<double>(got) - high) - low);
+    constexpr double eta = std::numeric_limits<R>::denorm_min();
+    const double ratio = error / (c * unit_roundoff<R> * scale + c * eta * (alpha_magnitude > 1 ? alpha_magnitude : 1));
+    if (std::fabs(ratio - 1) > doubtful) return ratio;
+  }
+  return wide_error_ratio(got, want, gauge, c, alpha_magnitude);
 }
 
 // The same for a result of any type: the larger ratio of its parts.

@@ -131,6 +131,7 @@ TYPED_TEST(GemmPieces, ScalingOfCMultipliesAndStoresZerosWithoutReading) {
           if (m > 0 && n > 0) c.take(before);
           if (magnitude(widen(beta)) == 0) c.poison();
           scale_c<T>.tiers[tier](&m, &n, &beta, c.array.data(), &c.ld);
+          if (m < 0 || n < 0) continue;  // there is no matrix to look at
           expect_product(scale_c<T>.name, tier, none_deep, zero, a, b, beta, before, c);
           if (this->HasFatalFailure()) return;
         }

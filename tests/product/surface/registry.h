@@ -6,6 +6,7 @@
 
 #include <csignal>
 #include <cstdlib>
+#include <functional>
 
 #include "tests/product/surface/session.h"
 
@@ -34,18 +35,17 @@ inline std::uint64_t seed_of(const char *routine, int number) {
 
 // ---- tests ----
 
-template <class Body>
-void register_test(const char *suite, const char *name, Body body) {
-  class Test : public testing::Test {
-   public:
-    explicit Test(Body b) : body_(b) {}
-    void TestBody() override { body_(); }
+class BodyTest : public testing::Test {
+ public:
+  explicit BodyTest(const std::function<void()> &body) : body_(body) {}
+  void TestBody() override { body_(); }
 
-   private:
-    Body body_;
-  };
+ private:
+  std::function<void()> body_;
+};
+inline void register_test(const char *suite, const char *name, const std::function<void()> &body) {
   testing::RegisterTest(suite, name, nullptr, nullptr, __FILE__, __LINE__,
-                        [body]() -> testing::Test * { return new Test(body); });
+                        [body]() -> testing::Test * { return new BodyTest(body); });
 }
 
 // ---- the program ----
