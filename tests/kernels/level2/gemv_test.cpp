@@ -1,8 +1,6 @@
 // gemv in every tier, on whole numbers whose results are exact: every size, address and parity of the leading
 // dimension, tiles, far increments, and what must not be read.
 
-#include <sys/mman.h>
-
 #include <cmath>
 #include <limits>
 
@@ -39,11 +37,6 @@ struct Operands {
   Buffer<T> a, x, y;
   explicit Operands(std::size_t matrix, std::size_t vectors = 8000) : a(matrix), x(vectors), y(vectors) {}
 };
-
-std::size_t extent(QtbInt n, QtbInt inc) { return n > 0 ? static_cast<std::size_t>((n - 1) * std::abs(inc) + 1) : 0; }
-std::size_t position(QtbInt i, QtbInt n, QtbInt inc) {
-  return static_cast<std::size_t>(inc >= 0 ? i * inc : (i - n + 1) * inc);
-}
 
 // One call on fresh whole numbers; the result to the bit, and nothing written but y.
 template <class T>
@@ -218,49 +211,24 @@ TYPED_TEST(GemvTest, a_nan_in_y_stays_unless_beta_is_zero) {
   });
 }
 
-// Memory that holds only what is touched.
-class Reserved {
- public:
-  explicit Reserved(std::size_t bytes)
-      : bytes_(bytes),
-        memory_(mmap(nullptr, bytes, PROT_READ | PROT_WRITE, MAP_PRIVATE | MAP_ANONYMOUS | MAP_NORESERVE, -1, 0)) {}
-  ~Reserved() { munmap(memory_, bytes_); }
-  Reserved(const Reserved &) = delete;
-  Reserved &operator=(const Reserved &) = delete;
-  bool is_there() const { return memory_ != MAP_FAILED; }
-  template <class T>
-  T *data() const {
-    return static_cast<T *>(memory_);
-  }
-
- private:
-  std::size_t bytes_;
-  void *memory_;
-};
-
 TYPED_TEST(GemvTest, increments_beyond_32_bits_reach_their_elements) {
-  constexpr QtbInt far = (QtbInt{1} << 31) + 3;
-  const std::size_t bytes = static_cast<std::size_t>(2 * far + 1) * sizeof(TypeParam);
-  const Reserved for_x(bytes), for_y(bytes);
-  if (!for_x.is_there() || !for_y.is_there()) GTEST_SKIP() << "no address space";
+  FarVector<TypeParam> x, y;
+  if (!x.is_there() || !y.is_there()) GTEST_SKIP() << "no address space";
   in_every_tier([&](int tier) {
     for (const char trans : operations)
-      for (const QtbInt sign : {1, -1}) {
-        const QtbInt n = 3, lda = 3, inc = sign * far;
+      for (const QtbInt inc : {x.increment, -x.increment}) {
+        const QtbInt n = 3, lda = 3;
         const TypeParam one = whole<TypeParam>(1);
-        TypeParam *const x = for_x.data<TypeParam>(), *const y = for_y.data<TypeParam>();
-        std::vector<TypeParam> a(9, whole<TypeParam>(1));
+        std::vector<TypeParam> a(9, whole<TypeParam>(1)), from, to, want;
         for (QtbInt i = 0; i < n; ++i) {
-          const std::size_t at = position(i, n, inc);
-          x[at] = whole<TypeParam>(i + 1);
-          y[at] = whole<TypeParam>(10 * i);
+          from.push_back(whole<TypeParam>(i + 1));
+          to.push_back(whole<TypeParam>(10 * i));
+          want.push_back(whole<TypeParam>(10 * i + 6 + i + 1));
           a[static_cast<std::size_t>(4 * i)] = whole<TypeParam>(2);
         }
-        Tiers<TypeParam>::gemv[tier](&trans, &n, &n, &one, a.data(), &lda, x, &inc, &one, y, &inc);
-        for (QtbInt i = 0; i < n; ++i) {
-          const TypeParam want = whole<TypeParam>(10 * i + 6 + i + 1);
-          EXPECT_EQ(0, std::memcmp(static_cast<const void *>(&want), &y[position(i, n, inc)], sizeof want));
-        }
+        x.set(from, inc), y.set(to, inc);
+        Tiers<TypeParam>::gemv[tier](&trans, &n, &n, &one, a.data(), &lda, x.data(), &inc, &one, y.data(), &inc);
+        EXPECT_TRUE(equal(y.values(inc), want)) << tier_name(tier) << " " << trans << " inc " << inc;
       }
   });
 }

@@ -46,11 +46,6 @@ struct Case {
   std::size_t phase_a, phase_x, phase_y;
 };
 
-std::size_t position(QtbInt i, QtbInt n, QtbInt inc) {
-  return static_cast<std::size_t>(inc >= 0 ? i * inc : (i - n + 1) * inc);
-}
-std::size_t extent(QtbInt n, QtbInt inc) { return n > 0 ? static_cast<std::size_t>((n - 1) * std::abs(inc) + 1) : 0; }
-
 template <class T>
 struct Operands {
   Buffer<T> a{8000}, x{400}, y{400};
@@ -104,6 +99,28 @@ TYPED_TEST(GerTest, every_size_address_and_increment_gives_the_result_and_skips_
           }
     for (std::size_t phases = 0; phases < 16 * 16; ++phases)
       check<TypeParam>(tier, {19, 6, 1, 1, 1, phases % 16, phases / 16, phases % 8}, o);
+  });
+}
+
+TYPED_TEST(GerTest, increments_beyond_32_bits_reach_their_elements) {
+  using T = typename TypeParam::Element;
+  FarVector<T> far_x, far_y;
+  if (!far_x.is_there() || !far_y.is_there()) GTEST_SKIP() << "no address space";
+  in_every_tier([&](int tier) {
+    for (const QtbInt incx : {far_x.increment, -far_x.increment})
+      for (const QtbInt incy : {far_y.increment, -far_y.increment}) {
+        const QtbInt n = 3, near = 1;
+        WholeNumbers draw(5);
+        const T alpha = whole<T>(2);
+        std::vector<T> x, y, want;
+        for (int i = 0; i < 3; ++i) x.push_back(draw.element<T>()), y.push_back(draw.element<T>());
+        for (int i = 0; i < 9; ++i) want.push_back(draw.element<T>());
+        std::vector<T> got = want;
+        far_x.set(x, incx), far_y.set(y, incy);
+        TypeParam::ger[tier](&n, &n, &alpha, x.data(), &near, y.data(), &near, want.data(), &n);
+        TypeParam::ger[tier](&n, &n, &alpha, far_x.data(), &incx, far_y.data(), &incy, got.data(), &n);
+        EXPECT_TRUE(equal(got, want)) << tier_name(tier) << " incx " << incx << " incy " << incy;
+      }
   });
 }
 

@@ -59,10 +59,6 @@ std::ostream &operator<<(std::ostream &out, const Case &c) {
              << c.phase_a << " " << c.phase_x;
 }
 
-std::size_t extent(QtbInt n, QtbInt inc) { return n > 0 ? static_cast<std::size_t>((n - 1) * std::abs(inc) + 1) : 0; }
-std::size_t position(QtbInt i, QtbInt n, QtbInt inc) {
-  return static_cast<std::size_t>(inc >= 0 ? i * inc : (i - n + 1) * inc);
-}
 std::size_t at(QtbInt i) { return static_cast<std::size_t>(i); }
 
 // A triangle with few elements beside the diagonal, so that whole numbers stay small in a solve; its diagonal is 1 or
@@ -180,6 +176,27 @@ TYPED_TEST(TriangularTest, every_increment_and_address_gives_the_result) {
             c.n = n, c.inc = inc, c.phase_x = phase, c.phase_a = (phase * 5 + 4) % 16;
             check(tier, c, a, x);
           }
+    });
+  });
+}
+
+TYPED_TEST(TriangularTest, increments_beyond_32_bits_reach_their_elements) {
+  using T = TypeParam;
+  Buffer<T> a(9);
+  FarVector<T> x;
+  if (!x.is_there()) GTEST_SKIP() << "no address space";
+  in_every_tier([&](int tier) {
+    in_every_case([&](Case c) {
+      c.n = 3;
+      const Triangle<T> triangle(c, a);
+      const std::vector<T> values = {whole<T>(1), whole<T>(-2), whole<T>(3)}, product = triangle.times_vector(values);
+      for (const QtbInt inc : {x.increment, -x.increment}) {
+        x.set(values, inc);
+        Tiers<T>::trmv[tier](&c.uplo, &c.trans, &c.diag, &c.n, triangle.array(), &c.n, x.data(), &inc);
+        EXPECT_TRUE(equal(x.values(inc), product)) << tier_name(tier) << " trmv " << c << " inc " << inc;
+        Tiers<T>::trsv[tier](&c.uplo, &c.trans, &c.diag, &c.n, triangle.array(), &c.n, x.data(), &inc);
+        EXPECT_TRUE(equal(x.values(inc), values)) << tier_name(tier) << " trsv " << c << " inc " << inc;
+      }
     });
   });
 }

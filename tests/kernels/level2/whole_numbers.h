@@ -1,12 +1,15 @@
 // Operands of small whole numbers at chosen addresses: their sums are exact in any order, so that a plain loop tells
 // the result to the bit, at a cost that lets a test go through all addresses.
 //
-// An operand lies in a buffer of signalling NaNs, some bytes above a boundary. A Pool has three of them, which a test
-// uses over and over.
+// An operand lies in a buffer of signalling NaNs, some bytes above a boundary, or in reserved memory, with its elements
+// further apart than a 32-bit number counts.
 #pragma once
 
 #include <gtest/gtest.h>
+#include <sys/mman.h>
 
+#include <algorithm>
+#include <cstdlib>
 #include <cstring>
 #include <vector>
 
@@ -79,6 +82,45 @@ class Buffer {
   std::size_t start_ = 0, count_ = 0;
 };
 
+// ---- vectors ----
+
+// Elements from the first to the last of a vector of n, and where element i lies.
+inline std::size_t extent(QtbInt n, QtbInt inc) {
+  return n > 0 ? static_cast<std::size_t>((n - 1) * std::abs(inc) + 1) : 0;
+}
+inline std::size_t position(QtbInt i, QtbInt n, QtbInt inc) {
+  return static_cast<std::size_t>(inc >= 0 ? i * inc : (i - n + 1) * inc);
+}
+
+// A vector of up to three elements further apart than a 32-bit number counts, in memory of which the system keeps only
+// the pages that are touched.
+template <class T>
+class FarVector {
+ public:
+  static constexpr QtbInt increment = (QtbInt{1} << 31) + 3;
+
+  FarVector()
+      : memory_(mmap(nullptr, bytes, PROT_READ | PROT_WRITE, MAP_PRIVATE | MAP_ANONYMOUS | MAP_NORESERVE, -1, 0)) {}
+  ~FarVector() { munmap(memory_, bytes); }
+  FarVector(const FarVector &) = delete;
+  FarVector &operator=(const FarVector &) = delete;
+  // Whether there is so much address space.
+  bool is_there() const { return memory_ != MAP_FAILED; }
+  T *data() const { return static_cast<T *>(memory_); }
+  void set(const std::vector<T> &values, QtbInt inc) {
+    for (QtbInt i = 0; i < 3; ++i) data()[position(i, 3, inc)] = values[static_cast<std::size_t>(i)];
+  }
+  std::vector<T> values(QtbInt inc) const {
+    std::vector<T> result;
+    for (QtbInt i = 0; i < 3; ++i) result.push_back(data()[position(i, 3, inc)]);
+    return result;
+  }
+
+ private:
+  static constexpr std::size_t bytes = static_cast<std::size_t>(2 * increment + 1) * sizeof(T);
+  void *memory_;
+};
+
 // ---- arithmetic of the plain loops ----
 
 template <class T>
@@ -108,6 +150,16 @@ T conjugate_if(bool conjugated, T v) {
   if constexpr (is_complex<T>)
     if (conjugated) v.im = -v.im;
   return v;
+}
+
+template <class T>
+bool equal(const std::vector<T> &a, const std::vector<T> &b) {
+  return std::equal(a.begin(), a.end(), b.begin(), b.end(), [](T v, T w) {
+    if constexpr (is_complex<T>)
+      return v.re == w.re && v.im == w.im;
+    else
+      return v == w;
+  });
 }
 
 }  // namespace qtb::test
