@@ -158,7 +158,7 @@ INSTANTIATE_TEST_SUITE_P(Types, GemmWorthSweep, testing::ValuesIn(types),
 // measure grows with every extent, so that one search finds the place.
 TEST_P(GemmWorthSweep, AllTeamsMatchTheTranscription) {
   const std::vector<Int> ms = extents(6), ns = extents(1), ks = extents(5);
-  for (const Int threads : {2, 3, 4, 5, 7, 8, 12, 24, 25, 48, 64})
+  for (const Int threads : {2, 3, 4, 5, 6, 7, 8, 9, 10, 12, 15, 16, 17, 24, 25, 31, 32, 33, 48, 63, 64})
     for (const Int m : ms)
       for (const Int n : ns)
         for (const Int k : ks) ASSERT_NO_FATAL_FAILURE(compare(threads, m, n, k));
