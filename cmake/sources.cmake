@@ -38,7 +38,6 @@ set(QTB_KERNEL_SOURCES
   # plain
   blas/kernels/plain/symm.cpp
   blas/kernels/plain/syr2k.cpp
-  blas/kernels/plain/syrk.cpp
   blas/kernels/plain/trmm.cpp
   blas/kernels/plain/trsm.cpp
 )
@@ -52,6 +51,7 @@ set(QTB_KERNEL_SOURCES_def
   blas/kernels/level3/gemm/def/folding_kernels.cpp
   blas/kernels/level3/gemm/def/pack.cpp
   blas/kernels/level3/gemm/pack.cpp
+  blas/kernels/level3/rank_k/syrk_tiles.cpp
 )
 set(QTB_KERNEL_SOURCES_sse3
   blas/kernels/level2/gemv_kernels.cpp
@@ -60,6 +60,7 @@ set(QTB_KERNEL_SOURCES_sse3
   blas/kernels/level3/gemm/pack.cpp
   blas/kernels/level3/gemm/sse3/dgemm.cpp
   blas/kernels/level3/gemm/sse3/dgemm_kernel.cpp
+  blas/kernels/level3/rank_k/syrk_tiles.cpp
 )
 set(QTB_KERNEL_SOURCES_ssse3
   blas/kernels/level2/gemv_kernels.cpp
@@ -69,6 +70,7 @@ set(QTB_KERNEL_SOURCES_ssse3
   blas/kernels/level3/gemm/ssse3/gemm.cpp
   blas/kernels/level3/gemm/ssse3/gemm_kernel.cpp
   blas/kernels/level3/gemm/ssse3/pack.cpp
+  blas/kernels/plain/syrk.cpp
 )
 set(QTB_KERNEL_SOURCES_sse42
   blas/kernels/level2/gemv_kernels.cpp
@@ -79,6 +81,7 @@ set(QTB_KERNEL_SOURCES_sse42
   blas/kernels/level3/gemm/sse42/dgemm_kernel.cpp
   blas/kernels/level3/gemm/sse42/gemm_kernel.cpp
   blas/kernels/level3/gemm/sse42/pieces.cpp
+  blas/kernels/plain/syrk.cpp
 )
 set(QTB_KERNEL_SOURCES_avx
   blas/kernels/level2/gemv_kernels.cpp
@@ -88,6 +91,7 @@ set(QTB_KERNEL_SOURCES_avx
   blas/kernels/level3/gemm/pack.cpp
   blas/kernels/level3/gemm/pieces.cpp
   blas/kernels/level3/gemm/sse42/gemm_kernel.cpp
+  blas/kernels/plain/syrk.cpp
 )
 set(qtb_tier_sources "")
 foreach(tier IN LISTS QTB_TIERS)
