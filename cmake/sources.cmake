@@ -70,7 +70,9 @@ set(QTB_KERNEL_SOURCES_ssse3
   blas/kernels/level3/gemm/ssse3/gemm.cpp
   blas/kernels/level3/gemm/ssse3/gemm_kernel.cpp
   blas/kernels/level3/gemm/ssse3/pack.cpp
-  blas/kernels/plain/syrk.cpp
+  blas/kernels/level3/rank_k/dsyrk_n4.cpp
+  blas/kernels/level3/rank_k/syrk.cpp
+  blas/kernels/level3/rank_k/syrk_body.cpp
 )
 set(QTB_KERNEL_SOURCES_sse42
   blas/kernels/level2/gemv_kernels.cpp
@@ -81,7 +83,9 @@ set(QTB_KERNEL_SOURCES_sse42
   blas/kernels/level3/gemm/sse42/dgemm_kernel.cpp
   blas/kernels/level3/gemm/sse42/gemm_kernel.cpp
   blas/kernels/level3/gemm/sse42/pieces.cpp
-  blas/kernels/plain/syrk.cpp
+  blas/kernels/level3/rank_k/dsyrk_n4.cpp
+  blas/kernels/level3/rank_k/syrk.cpp
+  blas/kernels/level3/rank_k/syrk_body.cpp
 )
 set(QTB_KERNEL_SOURCES_avx
   blas/kernels/level2/gemv_kernels.cpp
@@ -91,7 +95,9 @@ set(QTB_KERNEL_SOURCES_avx
   blas/kernels/level3/gemm/pack.cpp
   blas/kernels/level3/gemm/pieces.cpp
   blas/kernels/level3/gemm/sse42/gemm_kernel.cpp
-  blas/kernels/plain/syrk.cpp
+  blas/kernels/level3/rank_k/dsyrk_n4.cpp
+  blas/kernels/level3/rank_k/syrk.cpp
+  blas/kernels/level3/rank_k/syrk_body.cpp
 )
 set(qtb_tier_sources "")
 foreach(tier IN LISTS QTB_TIERS)

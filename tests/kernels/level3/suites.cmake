@@ -12,4 +12,13 @@ qtb_add_test(gemm_memory_test SOURCES kernels/level3/gemm_memory_test.cpp LIBRAR
   RUNS ${gemm_processors} "family16_of_sse3=QTB_TEST_PROCESSOR=family16_of_sse3" SHARDS 2)
 qtb_add_test(gemm_pack_test SOURCES kernels/level3/gemm_pack_test.cpp LIBRARIES qtb_static qtb_platform_fake)
 qtb_add_test(gemm_pieces_test SOURCES kernels/level3/gemm_pieces_test.cpp LIBRARIES qtb_static qtb_platform_fake)
-qtb_add_test(triangle_pieces_test SOURCES kernels/level3/triangle_pieces_test.cpp LIBRARIES qtb_static SHARDS 2)
+qtb_add_test(rank_k_splits_test SOURCES kernels/level3/rank_k_splits_test.cpp LIBRARIES qtb_static
+  qtb_platform_static)
+# It notes the calls among the kernels.
+foreach(name sse42_xdsyrk_body sse42_xdsyrk_n4 sse42_xssyrk_body sse42_xcsyrk_body sse42_xzherk_body sse42_xdgemm
+    sse42_xcgemm sse42_xzgemm def_xdgemm def_xzgemm)
+  target_link_options(rank_k_splits_test PRIVATE -Wl,--wrap=qtb_blas_${name})
+endforeach()
+qtb_add_test(rank_k_test SOURCES kernels/level3/rank_k_test.cpp LIBRARIES qtb_static qtb_platform_static SHARDS 3)
+qtb_add_test(triangle_pieces_test SOURCES kernels/level3/triangle_pieces_test.cpp LIBRARIES qtb_static qtb_platform_static
+  SHARDS 2)

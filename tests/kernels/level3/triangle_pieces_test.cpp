@@ -1,7 +1,6 @@
-// The pieces of a triangle that parallel drivers call, cut and put together again: trmv_block, syr_block, syr2_block;
-// and the bodies of the rank-k updates.
+// The pieces of a triangle that parallel drivers call, cut and put together again: trmv_block, syr_block, syr2_block.
 //
-// The other triangle, a unit diagonal and the imaginary parts of a Hermitian diagonal hold NaN.
+// The other triangle and a unit diagonal hold NaN. The oracle works once for all increments, cuts and tiers.
 #include <vector>
 
 #include "tests/kernels/level3/pieces.h"
@@ -46,20 +45,29 @@ struct HalfMatrix : Stored<T> {
   }
 };
 
-// A vector of the interface: element i of n at increment inc, NaN between.
+// A vector of the interface: its elements at increment inc, NaN between.
 template <class T>
 struct Spread {
   QtbInt n, inc;
   Guarded<T> array;
-  Spread(QtbInt count, QtbInt increment)
-      : n(count), inc(increment), array(count > 0 ? static_cast<std::size_t>((count - 1) * std::abs(inc) + 1) : 0) {
+  Spread(const std::vector<T> &elements, QtbInt increment)
+      : n(static_cast<QtbInt>(elements.size())),
+        inc(increment),
+        array(n > 0 ? static_cast<std::size_t>((n - 1) * std::abs(inc) + 1) : 0) {
     for (std::size_t i = 0; i < array.size(); i++) array[i] = value<T>(NAN, NAN);
-    for (QtbInt i = 0; i < n; i++) *at(i) = draw<T>();
+    for (QtbInt i = 0; i < n; i++) *at(i) = elements[static_cast<std::size_t>(i)];
   }
   T *at(QtbInt i) { return array.data() + (inc < 0 ? (i + 1 - n) * inc : i * inc); }
   // What a piece of len elements from start is called with.
   T *piece(QtbInt start, QtbInt len) { return len == 0 ? array.data() : inc < 0 ? at(start + len - 1) : at(start); }
 };
+
+template <class T>
+std::vector<T> draw_elements(QtbInt n) {
+  std::vector<T> elements(static_cast<std::size_t>(n));
+  for (T &e : elements) e = draw<T>();
+  return elements;
+}
 
 // Cuts of n columns into pieces.
 std::vector<std::vector<QtbInt>> cuts(QtbInt n) {
@@ -71,26 +79,52 @@ class TrianglePieces : public Seeded {};
 using Types = testing::Types<float, double, cfloat, cdouble>;
 TYPED_TEST_SUITE(TrianglePieces, Types);
 
+// op(A)*x, and the magnitudes that go into it.
+struct Wanted {
+  std::vector<QuadComplex> value;
+  std::vector<Quad> gauge;
+};
+template <class T>
+Wanted product_with_triangle(HalfMatrix<T> &a, char trans, bool unit, const std::vector<T> &x) {
+  const QtbInt n = a.rows;
+  const bool by_columns = trans == 'n';
+  Wanted want{std::vector<QuadComplex>(x.size()), std::vector<Quad>(x.size())};
+  for (QtbInt i = 0; i < n; i++)
+    for (QtbInt j = 0; j < n; j++) {
+      const QtbInt r = by_columns ? i : j, q = by_columns ? j : i;
+      if (!is_stored(a.upper, r, q)) continue;
+      QuadComplex t = unit && r == q ? QuadComplex{1, 0} : widen(*a.at(r, q));
+      if (trans == 'C') t.im = -t.im;
+      const std::size_t row = static_cast<std::size_t>(i);
+      const QuadComplex old = widen(x[static_cast<std::size_t>(j)]);
+      want.value[row] = plus(want.value[row], times(t, old));
+      want.gauge[row] += magnitude(t) * magnitude(old);
+    }
+  return want;
+}
+
 TYPED_TEST(TrianglePieces, OfATriangularProductTakeWhatLiesOutsideFromTheCopy) {
   using T = TypeParam;
-  for (int which = 0; which < 3; which++) {
-    if (!processor_runs(block_tiers[which])) continue;
-    Tally &tally = TallyReport::of(procedures<T>.name);
-    for (const char *uplo : {"U", "l"})
-      for (const char *trans : {"n", "T", "C"})
-        for (const char *diag : {"N", "u"})
-          for (QtbInt n : {1, 4, 9, 41, 150})
+  Tally &tally = TallyReport::of(procedures<T>.name);
+  for (const char *uplo : {"U", "l"})
+    for (const char *trans : {"n", "T", "C"})
+      for (const char *diag : {"N", "u"})
+        for (QtbInt n : {1, 4, 9, 41, 150}) {
+          const bool upper = *uplo == 'U', unit = *diag == 'u', by_columns = *trans == 'n';
+          HalfMatrix<T> a(n, upper);
+          if (unit)
+            for (QtbInt i = 0; i < n; i++) *a.at(i, i) = value<T>(NAN, NAN);
+          a.array.read_only();
+          const std::vector<T> elements = draw_elements<T>(n);
+          Spread<T> work(elements, 1);
+          work.array.read_only();
+          const Wanted want = product_with_triangle(a, *trans, unit, elements);
+          const double c = static_cast<double>(is_complex<T> ? 2 * n + 4 : n + 2);
+          for (int which = 0; which < 3; which++) {
+            if (!processor_runs(block_tiers[which])) continue;
             for (QtbInt incx : {1, -1, 3, -2})
               for (const std::vector<QtbInt> &cut : cuts(n)) {
-                const bool upper = *uplo == 'U', unit = *diag == 'u', by_columns = *trans == 'n';
-                HalfMatrix<T> a(n, upper);
-                Spread<T> x(n, incx);
-                if (unit)
-                  for (QtbInt i = 0; i < n; i++) *a.at(i, i) = value<T>(NAN, NAN);
-                Guarded<T> work(static_cast<std::size_t>(n));
-                for (QtbInt i = 0; i < n; i++) work[static_cast<std::size_t>(i)] = *x.at(i);
-                work.read_only();
-                a.array.read_only();
+                Spread<T> x(elements, incx);
                 QtbInt s = 0;
                 for (const QtbInt w : cut) {
                   const bool leads = upper == by_columns;
@@ -98,30 +132,20 @@ TYPED_TEST(TrianglePieces, OfATriangularProductTakeWhatLiesOutsideFromTheCopy) {
                   const QtbInt row = by_columns || leads ? s : 0, column = !by_columns || leads ? s : 0;
                   if (w > 0)
                     procedures<T>.trmv_block[which](uplo, trans, diag, &extent, a.at(row, column), &a.ld, x.piece(s, w),
-                                                    &incx, &w, work.data() + from);
+                                                    &incx, &w, work.at(from));
                   s += w;
                 }
-                const double c = static_cast<double>(is_complex<T> ? 2 * n + 4 : n + 2);
                 double worst = 0;
                 for (QtbInt i = 0; i < n; i++) {
-                  QuadComplex want;
-                  Quad gauge = 0;
-                  for (QtbInt j = 0; j < n; j++) {
-                    const QtbInt r = by_columns ? i : j, q = by_columns ? j : i;
-                    if (!is_stored(upper, r, q)) continue;
-                    QuadComplex t = unit && r == q ? QuadComplex{1, 0} : widen(*a.at(r, q));
-                    if (*trans == 'C') t.im = -t.im;
-                    const QuadComplex old = widen(work[static_cast<std::size_t>(j)]);
-                    want = plus(want, times(t, old));
-                    gauge += magnitude(t) * magnitude(old);
-                  }
-                  const double ratio = error_ratio(*x.at(i), want, gauge, c);
+                  const std::size_t row = static_cast<std::size_t>(i);
+                  const double ratio = error_ratio(*x.at(i), want.value[row], want.gauge[row], c);
                   worst = std::fmax(worst, ratio);
                   ASSERT_LE(ratio, 1) << uplo << trans << diag << " n " << n << " incx " << incx << " element " << i;
                 }
                 tally.within(block_tiers[which], worst);
               }
-  }
+          }
+        }
 }
 
 template <class T>
@@ -148,141 +172,67 @@ constexpr Updates<double> updates<double> = {"dsyr_block", "dsyr2_block", QTB_BL
 
 TYPED_TEST(RealTrianglePieces, OfARankUpdateMakeTheWholeUpdate) {
   using T = TypeParam;
-  for (int which = 0; which < 3; which++) {
-    if (!processor_runs(block_tiers[which])) continue;
-    for (const bool two : {false, true}) {
-      Tally &tally = TallyReport::of(two ? updates<T>.syr2_name : updates<T>.syr_name);
-      for (const char *uplo : {"U", "u", "L", "l"})
-        for (QtbInt n : {1, 4, 9, 41, 90})
-          for (QtbInt incx : {1, -1, 3})
-            for (QtbInt incy : {1, -2})
-              for (const T alpha : {T(0), T(1), T(-0.75)})
+  for (const bool two : {false, true}) {
+    Tally &tally = TallyReport::of(two ? updates<T>.syr2_name : updates<T>.syr_name);
+    for (const char *uplo : {"U", "u", "L", "l"})
+      for (QtbInt n : {1, 4, 9, 41, 90})
+        for (const T alpha : {T(0), T(1), T(-0.75)}) {
+          const bool upper = *uplo == 'U' || *uplo == 'u';
+          HalfMatrix<T> before(n, upper);
+          std::vector<T> of_x = draw_elements<T>(n), of_y = draw_elements<T>(n);
+          if (n > 2) of_x[2] = of_y[2] = of_x[0] = 0;
+          std::vector<QuadComplex> want(static_cast<std::size_t>(n * n));
+          std::vector<Quad> gauge(static_cast<std::size_t>(n * n));
+          for (QtbInt j = 0; j < n; j++)
+            for (QtbInt i = 0; i < n; i++) {
+              if (!is_stored(upper, i, j)) continue;
+              const std::size_t row = static_cast<std::size_t>(i), column = static_cast<std::size_t>(j);
+              const Quad xi = of_x[row], xj = of_x[column], yi = of_y[row], yj = of_y[column], old = *before.at(i, j);
+              const Quad sum = two ? xi * yj + yi * xj : xi * xj;
+              const Quad added = two ? magnitude(xi * yj) + magnitude(yi * xj) : magnitude(sum);
+              const std::size_t element = static_cast<std::size_t>(i + j * n);
+              want[element] = {Quad(alpha) * sum + old, 0};
+              gauge[element] = magnitude(Quad(alpha)) * added + magnitude(old);
+            }
+          for (int which = 0; which < 3; which++) {
+            if (!processor_runs(block_tiers[which])) continue;
+            for (QtbInt incx : {1, -1, 3})
+              for (QtbInt incy : {1, -2}) {
+                if (!two && incy != 1) continue;  // it has no y
                 for (const std::vector<QtbInt> &cut : cuts(n)) {
-                  const bool upper = *uplo == 'U' || *uplo == 'u';
-                  HalfMatrix<T> before(n, upper), a(n, upper);
+                  HalfMatrix<T> a(n, upper);
                   a.take(before);
-                  Spread<T> x(n, incx), y(n, incy);
-                  if (n > 2) *x.at(2) = *y.at(2) = *x.at(0) = 0;
-                  double worst = 0;
+                  Spread<T> x(of_x, incx), y(of_y, incy);
                   QtbInt s = 0;
                   for (const QtbInt w : cut) {
-                    const QtbInt other = upper ? s : n - s - w, start = upper ? 0 : s, length = w + other;
+                    const QtbInt outside = upper ? s : n - s - w, start = upper ? 0 : s, length = w + outside;
                     T *first = w == 0 ? a.array.data() : upper ? a.at(0, s) : a.at(s, s);
                     if (two)
                       updates<T>.syr2_block[which](uplo, &w, &alpha, x.piece(start, length), &incx,
-                                                   y.piece(start, length), &incy, first, &a.ld, &other);
+                                                   y.piece(start, length), &incy, first, &a.ld, &outside);
                     else
                       updates<T>.syr_block[which](uplo, &w, &alpha, x.piece(start, length), &incx, first, &a.ld,
-                                                  &other);
+                                                  &outside);
                     s += w;
                   }
+                  double worst = 0;
                   for (QtbInt j = 0; j < n; j++)
                     for (QtbInt i = 0; i < n; i++) {
                       if (!is_stored(upper, i, j)) {
                         ASSERT_TRUE(same_bits(*a.at(i, j), *before.at(i, j))) << "the other triangle";
                         continue;
                       }
-                      const Quad xi = *x.at(i), xj = *x.at(j), yi = *y.at(i), yj = *y.at(j), old = *before.at(i, j);
-                      const Quad sum = two ? xi * yj + yi * xj : xi * xj;
-                      const Quad added = two ? magnitude(xi * yj) + magnitude(yi * xj) : magnitude(sum);
-                      const double ratio = error_ratio(*a.at(i, j), Quad(alpha) * sum + old,
-                                                       magnitude(Quad(alpha)) * added + magnitude(old), two ? 5 : 3);
+                      const std::size_t element = static_cast<std::size_t>(i + j * n);
+                      const double ratio = error_ratio(*a.at(i, j), want[element], gauge[element], two ? 5 : 3);
                       worst = std::fmax(worst, ratio);
                       ASSERT_LE(ratio, 1) << uplo << " n " << n << " element (" << i << ", " << j << ")";
                     }
                   tally.within(block_tiers[which], worst);
                 }
-    }
-  }
-}
-
-// The bodies of rank-k updates: of one shape per kind, with S the type of alpha and beta.
-template <class T, class S>
-void expect_rank_k(const char *routine, int tier,
-                   void (*body)(const char *, const char *, const QtbInt *, const QtbInt *, const S *, const T *,
-                                const QtbInt *, const S *, T *, const QtbInt *),
-                   bool hermitian, std::initializer_list<QtbInt> orders) {
-  if (!processor_runs(tier)) return;
-  Tally &tally = TallyReport::of(routine);
-  const S scalars[][2] = {{value<S>(1, 0), value<S>(1, 0)},       {value<S>(0, 0), value<S>(1, 0)},
-                          {value<S>(0, 0), value<S>(0, 0)},       {value<S>(0, 0), value<S>(0.5, -0.25)},
-                          {value<S>(-0.75, 0.5), value<S>(0, 0)}, {value<S>(-0.75, 0.5), value<S>(0.5, 0.25)}};
-  const QtbInt large = 40;  // from here on each form takes one pair of scalars, in turn
-  int turn = 0;
-  for (const char *uplo : {"U", "u", "L", "l"})
-    for (const char *trans = *uplo < 'a' ? (hermitian ? "NC" : "NT") : (hermitian ? "nc" : "nt"); *trans != 0; trans++)
-      for (const QtbInt n : orders)
-        for (const QtbInt k : {0, 1, 5, 33})
-          for (const auto &[alpha, beta] : scalars) {
-            if (n >= large && ++turn % 7 != 0) continue;
-            const bool upper = *uplo == 'U' || *uplo == 'u', transposed = *trans != 'N' && *trans != 'n';
-            Stored<T> a(transposed ? k : n, transposed ? n : k);
-            const QuadComplex wide_alpha = widen(alpha), wide_beta = widen(beta);
-            const bool nothing = (k == 0 || magnitude(wide_alpha) == 0) && wide_beta.re == 1 && wide_beta.im == 0;
-            HalfMatrix<T> before(n, upper), c(n, upper);
-            if constexpr (is_complex<T>)
-              for (QtbInt j = 0; hermitian && j < n; j++) before.at(j, j)->im = static_cast<Real<T>>(NAN);
-            c.take(before);
-            if (magnitude(wide_beta) == 0)
-              for (QtbInt j = 0; j < n; j++)
-                for (QtbInt i = 0; i < n; i++) *c.at(i, j) = value<T>(NAN, NAN);
-            body(uplo, trans, &n, &k, &alpha, a.array.data(), &a.ld, &beta, c.array.data(), &c.ld);
-            double worst = 0;
-            const double bound = static_cast<double>(is_complex<T> ? 2 * k + 4 : k + 3);
-            for (QtbInt j = 0; j < n; j++)
-              for (QtbInt i = 0; i < n; i++) {
-                if (!is_stored(upper, i, j) || nothing) {
-                  if (magnitude(wide_beta) != 0) {
-                    ASSERT_TRUE(same_bits(*c.at(i, j), *before.at(i, j))) << routine << " wrote where it may not";
-                  }
-                  continue;
-                }
-                QuadComplex sum;
-                Quad gauge = 0;
-                for (QtbInt l = 0; l < k; l++) {
-                  QuadComplex p = widen(transposed ? *a.at(l, i) : *a.at(i, l));
-                  QuadComplex q = widen(transposed ? *a.at(l, j) : *a.at(j, l));
-                  if (hermitian) (transposed ? p : q).im *= -1;
-                  sum = plus(sum, times(p, q));
-                  gauge += magnitude(p) * magnitude(q);
-                }
-                QuadComplex want = times(wide_alpha, sum);
-                gauge *= magnitude(wide_alpha);
-                if (magnitude(wide_beta) != 0) {
-                  QuadComplex old = widen(*before.at(i, j));
-                  if (hermitian && i == j) old.im = 0;
-                  want = plus(want, times(wide_beta, old));
-                  gauge += magnitude(wide_beta) * magnitude(old);
-                }
-                const double ratio = error_ratio(*c.at(i, j), want, gauge, bound);
-                worst = std::fmax(worst, ratio);
-                ASSERT_LE(ratio, 1) << routine << " " << uplo << *trans << " n " << n << " k " << k << " element (" << i
-                                    << ", " << j << ")";
-                if constexpr (is_complex<T>)
-                  if (hermitian && i == j) {
-                    ASSERT_EQ(c.at(i, j)->im, 0) << routine << " diagonal";
-                  }
               }
-            tally.within(tier, worst);
           }
-}
-
-class RankKBodies : public Seeded {};
-
-TEST_F(RankKBodies, UpdateTheirTriangleAlone) {
-  const std::initializer_list<QtbInt> orders = {0, 1, 3, 4, 5, 12, 19, 73};
-#define QTB_EXPECT_BODIES(tier)                                                                             \
-  expect_rank_k<float, float>("ssyrk_body", tier_##tier, qtb_blas_##tier##_xssyrk_body, false, orders);     \
-  expect_rank_k<double, double>("dsyrk_body", tier_##tier, qtb_blas_##tier##_xdsyrk_body, false, orders);   \
-  expect_rank_k<cfloat, cfloat>("csyrk_body", tier_##tier, qtb_blas_##tier##_xcsyrk_body, false, orders);   \
-  expect_rank_k<cdouble, cdouble>("zsyrk_body", tier_##tier, qtb_blas_##tier##_xzsyrk_body, false, orders); \
-  expect_rank_k<cfloat, float>("cherk_body", tier_##tier, qtb_blas_##tier##_xcherk_body, true, orders);     \
-  expect_rank_k<cdouble, double>("zherk_body", tier_##tier, qtb_blas_##tier##_xzherk_body, true, orders);   \
-  expect_rank_k<double, double>("dsyrk_n4", tier_##tier, qtb_blas_##tier##_xdsyrk_n4, false, {4});
-  QTB_EXPECT_BODIES(ssse3)
-  QTB_EXPECT_BODIES(sse42)
-  QTB_EXPECT_BODIES(avx)
-#undef QTB_EXPECT_BODIES
+        }
+  }
 }
 
 }  // namespace
