@@ -23,19 +23,41 @@ struct ChunkCopy {
   const T *row(QtbInt i) const { return element + i * depth; }
 };
 
+// Moves one vector. Compilers would make a call of a loop of nothing but these, for a few vectors an expensive one.
+template <class T>
+[[gnu::always_inline]] inline void move_vector(T *to, Vec<T> v) {
+  keep_in_place(v);
+  store_aligned(to, v);
+}
+
+// The rows that fill up the last pair.
+template <class T>
+void clear_row(QtbInt rows, QtbInt depth, ChunkCopy<T> &copy) {
+  if (rows % 2 != 0)
+    for (QtbInt l = 0; l < depth; l += lanes<T>) move_vector(copy.row(rows) + l, zero<T>());
+}
+
 // Rows as they are: row i of op(A) at a + i*lda.
 template <class T>
-void copy_rows(QtbInt rows, QtbInt depth, const T *a, QtbInt lda, ChunkCopy<T> &copy) {
-  for (QtbInt i = 0; i < rows; i++, a += lda) {
+[[gnu::noinline]] void copy_rows(QtbInt rows, QtbInt depth, const T *a, QtbInt lda, ChunkCopy<T> &copy) {
+  const auto copy_some = [&](QtbInt i, auto count) __attribute__((always_inline)) {
+    const T *const from = a + i * lda;
     T *const to = copy.row(i);
+    const auto copy_vectors = [&](QtbInt l, auto part) __attribute__((always_inline)) {
+      repeat<count.value>(
+          [&](auto r) { move_vector(to + l + r.value * copy.depth, load_part<part.value>(from + l + r.value * lda)); });
+    };
+    constexpr int whole = static_cast<int>(lanes<T>);
     QtbInt l = 0;
-    for (; l + lanes<T> <= depth; l += lanes<T>) store_aligned(to + l, load_unaligned(a + l));
-    if constexpr (lanes < T >> 1)
-      if (l < depth)
-        with_count<lanes<T> - 1>(depth - l, [&](auto count) { store_aligned(to + l, load_part<count.value>(a + l)); });
-  }
-  if (rows % 2 != 0)
-    for (QtbInt v = 0; v < copy.vectors_of(depth); v++) store_aligned(copy.row(rows) + v * lanes<T>, zero<T>());
+    for (; l + whole <= depth; l += whole) copy_vectors(l, Constant<whole>());
+    if constexpr (whole > 1)
+      if (l < depth) with_count<whole - 1>(depth - l, [&](auto part) { copy_vectors(l, part); });
+  };
+  constexpr int at_once = 4;
+  QtbInt i = 0;
+  for (; i + at_once <= rows; i += at_once) copy_some(i, Constant<at_once>());
+  for (; i < rows; i++) copy_some(i, Constant<1>());
+  clear_row(rows, depth, copy);
 }
 
 // A square of lanes x lanes elements: its columns become rows.
@@ -62,7 +84,7 @@ template <class T>
 
 // Rows that lie across the columns of A: element (i, l) of op(A) at a[i + l*lda]. Rows that fill up a square are zeros.
 template <class T>
-void copy_across(QtbInt rows, QtbInt depth, const T *a, QtbInt lda, ChunkCopy<T> &copy) {
+[[gnu::noinline]] void copy_across(QtbInt rows, QtbInt depth, const T *a, QtbInt lda, ChunkCopy<T> &copy) {
   constexpr int whole = static_cast<int>(lanes<T>);
   const auto copy_columns = [&](QtbInt l, auto columns) {
     const auto copy_square = [&](QtbInt i, auto count) {
@@ -84,9 +106,7 @@ void copy_across(QtbInt rows, QtbInt depth, const T *a, QtbInt lda, ChunkCopy<T>
   for (; l + whole <= depth; l += whole) copy_columns(l, Constant<whole>());
   if constexpr (whole > 1)
     if (l < depth) with_count<whole - 1>(depth - l, [&](auto columns) { copy_columns(l, columns); });
-  if constexpr (whole == 1)
-    if (rows % 2 != 0)
-      for (QtbInt v = 0; v < depth; v++) store_aligned(copy.row(rows) + v, zero<T>());
+  if constexpr (whole == 1) clear_row(rows, depth, copy);
 }
 
 }  // namespace

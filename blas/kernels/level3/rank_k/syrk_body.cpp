@@ -1,9 +1,9 @@
 // The bodies of syrk and herk (update.h tells what is computed): the triangle in chunks of at most 72 rows.
 //
 // A chunk on the diagonal is copied to the stack by slices of the depth (chunk_copy.h, 41,472 bytes), and its elements
-// are summed two rows by two (pair_sums.h) and added to C slice by slice; beta is applied with the first one. Between
+// are summed two rows by two (row_sums.h) and added to C slice by slice; beta is applied with the first one. Between
 // chunks GEMM computes the rectangles.
-#include "blas/kernels/level3/rank_k/pair_sums.h"
+#include "blas/kernels/level3/rank_k/row_sums.h"
 #include "blas/kernels/level3/rank_k/split.h"
 #include "blas/kernels/level3/rank_k/tile_triangle.h"
 
@@ -15,67 +15,111 @@ template <class Update>
 struct Elements {
   using T = typename Update::Element;
   using S = typename Update::Scalar;
+  static constexpr Conjugated no = Conjugated::none;
+  const Update &u;
   Finish<S> finish;
-  S alpha, beta;
-  Elements(S a, S b) : finish(a, b), alpha(a), beta(b) {}
+  S beta;
+  // What is conjugated in element (i, j) as sum of row i with row j, and of row j with row i.
+  Conjugated as_it_is, mirrored;
+  Elements(const Update &update, S b)
+      : u(update),
+        finish(update.alpha, b),
+        beta(b),
+        as_it_is(!Update::hermitian  ? no
+                 : update.transposed ? Conjugated::first
+                                     : Conjugated::second),
+        mirrored(!Update::hermitian  ? no
+                 : update.transposed ? Conjugated::second
+                                     : Conjugated::first) {}
 
-  template <int count>
-  void store(T *c, Vec<T> sum) const {
-    store_part<count>(c, finish(sum, [=] { return load_part<count>(static_cast<const T *>(c)); }));
+  // The first rows of count sums, get(i) for row i, below each other from c on.
+  template <int count, class Get>
+  [[gnu::always_inline]] void store_column(T *c, QtbInt rows, Conjugated conjugated, Get get) const {
+    constexpr int whole = static_cast<int>(lanes<T>), vectors = (count + whole - 1) / whole;
+    repeat<vectors>([&](auto v) __attribute__((always_inline)) {
+      constexpr int first = v.value * whole, wanted = count - first < whole ? count - first : whole;
+      if (first >= rows) return;
+      Sum<T> sums[whole];
+      repeat<wanted>([&](auto i) __attribute__((always_inline)) { sums[i.value] = get(Constant<first + i.value>()); });
+      const Vec<T> sum = totals(sums, conjugated);
+      const auto store = [&](auto part) __attribute__((always_inline)) {
+        store_part<part.value>(c + first, finish(sum, [=] { return load_part<part.value>(c + first); }));
+      };
+      if constexpr (wanted == 1)
+        store(Constant<1>());
+      else if (rows - first >= wanted)
+        store(Constant<wanted>());
+      else
+        with_count<wanted - 1>(rows - first, store);
+    });
   }
-  void store_pair(T *c, const Pair<T> &pair) const {
-    constexpr int in_vector = Pair<T>::in_vector;
-    repeat<Pair<T>::vectors>([&](auto v) { store<in_vector>(c + v.value * in_vector, pair.v[v.value]); });
+  // A Hermitian diagonal element: the imaginary part of its sum is 0, and that of C is not read.
+  void store_real(T *c, const Sum<T> &sum) const {
+    S *const re = parts(c);
+    S v = u.alpha * sum_lanes(sum.direct);
+    if (!is_zero(beta)) v += beta * load_single(re);
+    store_single(re, v);
+    store_single(re + 1, S{0});
   }
-  // The first element of a pair.
-  void store_first(T *c, const Pair<T> &pair) const { store<1>(c, pair.v[0]); }
-  void store_diagonal(T *c, const Pair<T> &pair) const {
-    if constexpr (!Update::hermitian) {
-      store_first(c, pair);
-    } else {
-      S *const re = parts(c);
-      S total;
-      store_lowest(&total, pair.v[0]);
-      total *= alpha;
-      if (!is_zero(beta)) total += beta * load_single(re);
-      store_single(re, total);
-      store_single(re + 1, S{0});
-    }
+
+  // The sums are no constants: compilers keep those in memory.
+  template <int tile_rows>
+  void add_tile(const ChunkCopy<T> &copy, QtbInt vectors, QtbInt i, QtbInt rows, QtbInt j, QtbInt columns) const {
+    TileSums<T, tile_rows> s = sum_tile<T, tile_rows>(vectors, copy.row(i), copy.row(j));
+    store_column<tile_rows>(
+        u.at(i, j), rows, as_it_is, [&](auto r) __attribute__((always_inline)) { return s.sum[r.value][0]; });
+    if (columns > 1)
+      store_column<tile_rows>(
+          u.at(i, j + 1), rows, as_it_is, [&](auto r) __attribute__((always_inline)) { return s.sum[r.value][1]; });
+  }
+  template <int tile_rows>
+  void add_triangle(const ChunkCopy<T> &copy, QtbInt vectors, QtbInt j, QtbInt rows) const {
+    constexpr int diagonal = Update::hermitian ? 1 : 0;  // of the elements of a column, stored apart
+    TriangleSums<T, tile_rows> s = sum_triangle<T, tile_rows>(vectors, copy.row(j));
+    repeat<tile_rows>([&](auto e) __attribute__((always_inline)) {
+      constexpr int column = e.value, above = column + 1 - diagonal, below = tile_rows - column - diagonal;
+      if (column >= rows) return;
+      if (u.upper) {
+        if constexpr (above > 0)
+          store_column<above>(
+              u.at(j, j + column), above,
+              as_it_is, [&](auto r) __attribute__((always_inline)) { return s.sum[r.value][column]; });
+      } else {
+        if constexpr (below > 0)
+          store_column<below>(
+              u.at(j + column + diagonal, j + column), rows - column - diagonal,
+              mirrored, [&](auto r) __attribute__((always_inline)) {
+                return s.sum[column][column + diagonal + r.value];
+              });
+      }
+      if constexpr (Update::hermitian) store_real(u.at(j + column, j + column), s.sum[column][column]);
+    });
   }
 };
 
+// f(Constant<rows>()) for the rows that tiles take at once, or for two where no more are left.
+template <class T, class F>
+[[gnu::always_inline]] inline void with_tile_rows(QtbInt rows, F f) {
+  if (rows_at_once<T> == 2 || rows <= 2)
+    f(Constant<2>());
+  else
+    f(Constant<rows_at_once<T>>());
+}
+
+// The rows of a group stay in the first cache level while the pairs beside them pass.
 template <class Update>
 void add_slice(const Update &u, const ChunkCopy<typename Update::Element> &copy, QtbInt vectors,
                const Elements<Update> &elements) {
   using T = typename Update::Element;
-  const Second second = !Update::hermitian ? Second::plain
-                        : u.transposed     ? Second::first_conjugated
-                                           : Second::conjugated;
-  const Second mirrored = !Update::hermitian ? Second::plain
-                          : u.transposed     ? Second::conjugated
-                                             : Second::first_conjugated;
-  for (QtbInt j = 0; j < u.n; j += 2) {
-    const bool two_columns = j + 1 < u.n;
-    const QtbInt end = u.upper ? j : u.n;
-    for (QtbInt i = u.upper ? 0 : j + 2; i < end; i += 2) {
-      const SquareSums<T> s(vectors, copy.row(i), copy.row(j));
-      repeat<2>([&](auto e) {
-        const Pair<T> pair = totals(s.sum[0][e.value], s.sum[1][e.value], second);
-        if (e.value == 1 && !two_columns) return;
-        if (i + 1 < u.n)
-          elements.store_pair(u.at(i, j + e.value), pair);
-        else
-          elements.store_first(u.at(i, j + e.value), pair);
-      });
-    }
-    const TriangleSums<T> s(vectors, copy.row(j));
-    elements.store_diagonal(u.at(j, j), totals(s.first, s.first, second));
-    if (!two_columns) continue;
-    if (u.upper)
-      elements.store_first(u.at(j, j + 1), totals(s.off, s.off, second));
-    else
-      elements.store_first(u.at(j + 1, j), totals(s.off, s.off, mirrored));
-    elements.store_diagonal(u.at(j + 1, j + 1), totals(s.second, s.second, second));
+  constexpr QtbInt step = rows_at_once<T>;
+  for (QtbInt i = 0; i < u.n; i += step) {
+    const QtbInt rows = u.n - i < step ? u.n - i : step, end = u.upper ? u.n : i;
+    with_tile_rows<T>(
+        rows, [&](auto tile_rows) __attribute__((always_inline)) {
+          elements.template add_triangle<tile_rows.value>(copy, vectors, i, rows);
+          for (QtbInt j = u.upper ? i + step : 0; j < end; j += 2)
+            elements.template add_tile<tile_rows.value>(copy, vectors, i, rows, j, u.n - j);
+        });
   }
 }
 
@@ -91,7 +135,7 @@ void update_chunk(const Update &u) {
       copy_rows(u.n, depth, u.a + l, u.lda, copy);
     else
       copy_across(u.n, depth, u.a + l * u.lda, u.lda, copy);
-    add_slice(u, copy, copy.vectors_of(depth), Elements<Update>(u.alpha, beta));
+    add_slice(u, copy, copy.vectors_of(depth), Elements<Update>(u, beta));
     if constexpr (is_complex<S>)
       beta = {1, 0};
     else
