@@ -229,8 +229,10 @@ TEST(Tiles, OnTheDiagonalAreWholeSquaresOfGemmAndOffItRectangles) {
   EXPECT_EQ(calls_of(qtb_blas_def_xdsyrk, "U", "N", 128, 2), Calls({"gemm NT 128x128"}));
   EXPECT_EQ(calls_of(qtb_blas_def_xdsyrk, "U", "N", 129, 2),
             Calls({"gemm NT 128x128", "gemm NT 128x1", "gemm NT 1x1"}));
-  EXPECT_EQ(calls_of(qtb_blas_def_xzherk, "L", "C", 130, 2),
-            Calls({"gemm CN 64x64", "gemm CN 2x64", "gemm CN 64x64", "gemm CN 2x64", "gemm CN 64x64", "gemm CN 2x2"}));
+  EXPECT_EQ(calls_of(qtb_blas_def_xzherk, "L", "C", 66, 2),
+            Calls({"gemm CN 32x32", "gemm CN 2x32", "gemm CN 32x32", "gemm CN 2x32", "gemm CN 32x32", "gemm CN 2x2"}));
+  EXPECT_EQ(calls_of(qtb_blas_def_xzherk, "L", "C", 255, 1).front(), "gemm CN 32x32");
+  EXPECT_EQ(calls_of(qtb_blas_def_xzherk, "L", "C", 256, 1).front(), "gemm CN 64x64");
   EXPECT_EQ(calls_of(qtb_blas_def_xdsyrk, "U", "N", 129, 0), Calls());
 }
 

@@ -56,9 +56,8 @@ struct Elements {
   // A Hermitian diagonal element: the imaginary part of its sum is 0, and that of C is not read.
   void store_real(T *c, const Sum<T> &sum) const {
     S *const re = parts(c);
-    S v = u.alpha * sum_lanes(sum.direct);
-    if (!is_zero(beta)) v += beta * load_single(re);
-    store_single(re, v);
+    const S old = is_zero(beta) ? S{0} : beta * load_single(re);
+    store_single(re, old + u.alpha * sum_lanes(sum.direct));
     store_single(re + 1, S{0});
   }
 

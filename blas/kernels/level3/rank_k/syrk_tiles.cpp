@@ -2,25 +2,30 @@
 // tile_triangle.h how).
 //
 // The buffer of a tile on the diagonal stands on the stack: 131,072 bytes in double precision, 65,536 in single and in
-// complex double, 32,768 in complex single. The smaller tile of the complex types halves what is computed in vain, of
-// the other triangle.
+// complex double, 32,768 in complex single. The smaller tiles of the complex types, of small matrices above all, make
+// less of the other triangle, which is in vain.
 #include "blas/kernels/level3/rank_k/tile_triangle.h"
 #include "blas/kernels/level3/rank_k/update.h"
 
 namespace qtb::QTB_TIER {
 namespace {
 
+// The rows of a tile, and of one of a matrix of fewer rows than small.
+struct TileOrder {
+  QtbInt usual, small, order_of_small;
+};
 template <class T>
-constexpr QtbInt tile_order = 128;
+constexpr TileOrder tile_order = {128, 0, 0};
 template <class R>
-constexpr QtbInt tile_order<Complex<R>> = 64;
+constexpr TileOrder tile_order<Complex<R>> = {64, 256, 32};
 
 template <class Update>
 void update_by_tiles(const Update &u) {
   using T = typename Update::Element;
-  constexpr QtbInt order = tile_order<T>;
+  constexpr TileOrder orders = tile_order<T>;
+  const QtbInt order = u.n < orders.small ? orders.order_of_small : orders.usual;
   if (u.only_scales()) return scale_triangle<Update::hermitian>(u.upper, u.n, u.beta, u.c, u.ldc);
-  alignas(64) T tile[order * order];
+  alignas(64) T tile[orders.usual * orders.usual];
   walk_tiles(
       u.upper, u.n, order,
       [&](QtbInt i0, QtbInt rows, QtbInt j0, QtbInt columns) {
