@@ -44,3 +44,5 @@ qtb_add_test(nested_blocks_test SOURCES kernels/level3/nested_blocks_test.cpp LI
   SHARDS 4)
 qtb_add_test(unblocked_test SOURCES kernels/level3/unblocked_test.cpp LIBRARIES qtb_static qtb_platform_static
   SHARDS 4)
+qtb_add_test(triangle_pieces_test SOURCES kernels/level3/triangle_pieces_test.cpp LIBRARIES qtb_static
+  qtb_platform_static SHARDS 2)
