@@ -2,6 +2,7 @@
 //
 // small_path<T>: C := alpha*op(A)*op(B) + beta*C with the arguments of gemm, without packing (small.cpp).
 // scale_columns<T>: C := beta*C (scale_c.cpp).
+// one<T>: a factor of 1.
 #pragma once
 
 #include "blas/kernels/kernel.h"
@@ -32,6 +33,13 @@ constexpr ScaleProcedure<T> *scale_columns = nullptr;
   constexpr ScaleProcedure<T> *scale_columns<T> = QTB_TIER_NAME(x##t##gemm_scale_c);
 QTB_PARTS(QTB_NAME_PARTS)
 #undef QTB_NAME_PARTS
+
+// An object, so that its address can be passed: compilers make a constant on the stack by instructions that no tier
+// has.
+template <class T>
+constexpr T one = 1;
+template <class R>
+constexpr Complex<R> one<Complex<R>> = {1, 0};
 
 }  // namespace
 }  // namespace qtb::QTB_TIER

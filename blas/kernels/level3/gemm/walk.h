@@ -57,13 +57,6 @@ struct Block {
   T *stage;
 };
 
-// An object, so that its address can be passed: compilers make a constant on the stack by instructions that no tier
-// has.
-template <class T>
-constexpr T one = 1;
-template <class R>
-constexpr Complex<R> one<Complex<R>> = {1, 0};
-
 // C := beta*C + alpha*op(A)*op(B) over rows i0 and up, columns j0 to j0 + n and depth l0 to l0 + k, without packing.
 template <class T>
 void run_small(const Product<T> &p, bool a_is_n, bool b_is_n, QtbInt i0, QtbInt j0, QtbInt n, QtbInt l0, QtbInt k,
