@@ -35,9 +35,9 @@ set(QTB_KERNEL_SOURCES
   # level3
   blas/kernels/level3/gemm/scale_c.cpp
   blas/kernels/level3/gemm/small.cpp
+  blas/kernels/level3/rank_k/syr2k.cpp
   blas/kernels/level3/symmetric/symm.cpp
   # plain
-  blas/kernels/plain/syr2k.cpp
   blas/kernels/plain/trmm.cpp
   blas/kernels/plain/trsm.cpp
 )

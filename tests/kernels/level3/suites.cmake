@@ -22,3 +22,13 @@ endforeach()
 qtb_add_test(rank_k_test SOURCES kernels/level3/rank_k_test.cpp LIBRARIES qtb_static qtb_platform_static SHARDS 3)
 qtb_add_test(triangle_pieces_test SOURCES kernels/level3/triangle_pieces_test.cpp LIBRARIES qtb_static qtb_platform_static
   SHARDS 2)
+qtb_add_test(symm_test SOURCES kernels/level3/symm_test.cpp LIBRARIES qtb_static qtb_platform_fake
+  RUNS ${gemm_processors} SHARDS 5)
+qtb_add_test(syr2k_test SOURCES kernels/level3/syr2k_test.cpp LIBRARIES qtb_static qtb_platform_fake
+  RUNS ${gemm_processors} SHARDS 5)
+# They note the products that the kernels call, and refuse requests for memory.
+foreach(suite symm_test syr2k_test)
+  foreach(name qtb_blas_sse42_xdgemm qtb_blas_sse42_xzgemm qtb_serv_malloc)
+    target_link_options(${suite} PRIVATE -Wl,--wrap=${name})
+  endforeach()
+endforeach()
