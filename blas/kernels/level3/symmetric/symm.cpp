@@ -70,7 +70,14 @@ struct SymmetricProduct {
       copy_symmetric<T, hermitian, false>(tile.count, from, lda, copy, alpha);
     add(one<T>, Op::none, copy, tile.count, tile, tile, others);
   }
+  // One tile and one step are no loop: small products are spared what goes ahead of loops.
   void add_all(QtbInt order, QtbInt others, QtbInt most, T *copy) const {
+    if (order <= most && others <= other_step)
+      add_tile({0, order}, copy, {0, others});
+    else
+      add_tiles(order, others, most, copy);
+  }
+  [[gnu::noinline]] void add_tiles(QtbInt order, QtbInt others, QtbInt most, T *copy) const {
     const bool stored_first = left == upper;
     for (QtbInt o0 = 0; o0 < others; o0 += other_step) {
       const Range step{o0, smaller(other_step, others - o0)};

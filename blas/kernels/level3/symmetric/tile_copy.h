@@ -14,79 +14,98 @@ namespace {
 
 constexpr int columns_together = 4;
 
+// What becomes of an element in its two places. Passed by value: stores to the tile could otherwise change it, as far
+// as compilers see.
 template <class T, bool hermitian>
-struct TileCopy {
-  const T *a;
-  QtbInt lda;
-  T *tile;
-  QtbInt order;
+struct Mirroring {
   T alpha;
   Scaled<T> stored;
-  ScaledConjugate<T> mirrored;
+  ScaledConjugate<T> conjugated;
+  explicit Mirroring(T factor) : alpha(factor), stored(factor), conjugated(factor) {}
 
-  TileCopy(QtbInt n, const T *from, QtbInt ld, T *to, T factor)
-      : a(from), lda(ld), tile(to), order(n), alpha(factor), stored(factor), mirrored(factor) {}
-
-  void copy_vectors(QtbInt i0, QtbInt j0) const {
-    constexpr int step = static_cast<int>(lanes<T>);
-    repeat<columns_together / step>([&](auto g) {
-      repeat<columns_together / step>([&](auto r) {
-        const QtbInt i = i0 + r.value * step, j = j0 + g.value * step;
-        Vec<T> v[step];
-        repeat<step>([&](auto s) {
-          const Vec<T> x = load_unaligned(a + i + (j + s.value) * lda), here = stored(x);
-          store_unaligned(tile + i + (j + s.value) * order, here);
-          v[s.value] = hermitian ? mirrored(x) : here;
-        });
-        transpose(v);
-        repeat<step>([&](auto s) { store_unaligned(tile + j + (i + s.value) * order, v[s.value]); });
-      });
-    });
-  }
-  void copy_element(QtbInt i, QtbInt j) const {
-    Vec<T> x;
-    if constexpr (is_complex<T>)
-      x = load_repeated(a + i + j * lda);
-    else
-      x = broadcast(load_single(a + i + j * lda));
-    const Vec<T> here = stored(x);
-    store_lowest(tile + i + j * order, here);
-    store_lowest(tile + j + i * order, hermitian ? mirrored(x) : here);
-  }
-  void copy_diagonal(QtbInt j) const {
+  // The image of x, of which v is what is stored.
+  [[gnu::always_inline]] Vec<T> mirrored(Vec<T> x, Vec<T> v) const {
     if constexpr (hermitian)
-      tile[j + j * order] = load_single(parts(a + j + j * lda)) * alpha;
+      return conjugated(x);
     else
-      copy_element(j, j);
+      return v;
+  }
+  [[gnu::always_inline]] void copy_element(const T *from, T *to, T *image) const {
+    const Vec<T> x = load_everywhere(from), v = stored(x);
+    store_lowest(to, v);
+    store_lowest(image, mirrored(x, v));
+  }
+  [[gnu::always_inline]] void copy_diagonal(const T *from, T *to) const {
+    if constexpr (hermitian)
+      *to = load_single(parts(from)) * alpha;
+    else
+      store_lowest(to, stored(load_everywhere(from)));
   }
 
-  // Rows begin to end of some columns, all of them off the diagonal.
-  void copy_rows(QtbInt begin, QtbInt end, QtbInt j0, QtbInt columns) const {
-    QtbInt i = begin;
-    if (columns == columns_together)
-      for (; i + columns_together <= end; i += columns_together) copy_vectors(i, j0);
-    for (; i < end; i++)
-      for (QtbInt j = j0; j < j0 + columns; j++) copy_element(i, j);
-  }
-  void copy_triangle(bool upper, QtbInt j0, QtbInt columns) const {
-    for (QtbInt j = j0; j < j0 + columns; j++) {
-      copy_diagonal(j);
-      for (QtbInt i = j + 1; i < j0 + columns; i++) upper ? copy_element(j, i) : copy_element(i, j);
-    }
+ private:
+  static Vec<T> load_everywhere(const T *p) {
+    if constexpr (is_complex<T>)
+      return load_repeated(p);
+    else
+      return broadcast(load_single(p));
   }
 };
 
+// Four rows of four columns, and the columns of their image.
+template <class T, bool hermitian>
+[[gnu::always_inline]] inline void copy_block(const T *from, QtbInt lda, T *to, T *image, QtbInt order,
+                                              Mirroring<T, hermitian> m) {
+  constexpr int step = static_cast<int>(lanes<T>), vectors = columns_together / step;
+  repeat<vectors>([&](auto g) {
+    repeat<vectors>([&](auto r) {
+      Vec<T> v[step];
+      repeat<step>([&](auto s) {
+        constexpr int row = r.value * step, column = g.value * step + s.value;
+        const Vec<T> x = load_unaligned(from + row + column * lda), here = m.stored(x);
+        store_unaligned(to + row + column * order, here);
+        v[s.value] = m.mirrored(x, here);
+      });
+      transpose(v);
+      repeat<step>(
+          [&](auto s) { store_unaligned(image + g.value * step + (r.value * step + s.value) * order, v[s.value]); });
+    });
+  });
+}
+
+// The triangle of some columns, the first element of the diagonal at from.
+template <bool upper, class T, bool hermitian>
+[[gnu::always_inline]] inline void copy_triangle(QtbInt columns, const T *from, QtbInt lda, T *to, QtbInt order,
+                                                 Mirroring<T, hermitian> m) {
+  for (QtbInt j = 0; j < columns; j++) {
+    m.copy_diagonal(from + j + j * lda, to + j + j * order);
+    for (QtbInt i = upper ? 0 : j + 1, end = upper ? j : columns; i < end; i++)
+      m.copy_element(from + i + j * lda, to + i + j * order, to + j + i * order);
+  }
+}
+
 template <class T, bool hermitian, bool upper>
 void copy_symmetric(QtbInt order, const T *a, QtbInt lda, T *tile, T alpha) {
-  const TileCopy<T, hermitian> copy(order, a, lda, tile, alpha);
-  for (QtbInt j0 = 0, columns; j0 < order; j0 += columns) {
-    columns = order - j0 < columns_together ? order - j0 : columns_together;
-    copy.copy_triangle(upper, j0, columns);
-    if constexpr (upper)
-      copy.copy_rows(0, j0, j0, columns);
-    else
-      copy.copy_rows(j0 + columns, order, j0, columns);
+  constexpr QtbInt four = columns_together;
+  const Mirroring<T, hermitian> m(alpha);
+  QtbInt j0 = 0;
+  for (; j0 + four <= order; j0 += four) {
+    const QtbInt first = upper ? 0 : j0 + four;
+    const T *from = a + first + j0 * lda;
+    T *to = tile + first + j0 * order, *image = tile + j0 + first * order;
+    copy_triangle<upper>(four, a + j0 + j0 * lda, lda, tile + j0 + j0 * order, order, m);
+    QtbInt rows = upper ? j0 : order - first;
+    for (; rows >= four; rows -= four, from += four, to += four, image += four * order)
+      copy_block(from, lda, to, image, order, m);
+    for (; rows > 0; rows--, from++, to++, image += order)
+      repeat<columns_together>(
+          [&](auto j) { m.copy_element(from + j.value * lda, to + j.value * order, image + j.value); });
   }
+  const QtbInt columns = order - j0;
+  if (columns == 0) return;
+  copy_triangle<upper>(columns, a + j0 + j0 * lda, lda, tile + j0 + j0 * order, order, m);
+  if constexpr (upper)
+    for (QtbInt j = j0; j < order; j++)
+      for (QtbInt i = 0; i < j0; i++) m.copy_element(a + i + j * lda, tile + i + j * order, tile + j + i * order);
 }
 
 }  // namespace
