@@ -35,6 +35,7 @@ set(QTB_KERNEL_SOURCES
   # level3
   blas/kernels/level3/gemm/scale_c.cpp
   blas/kernels/level3/gemm/small.cpp
+  blas/kernels/level3/triangular/unblocked.cpp
   # plain
   blas/kernels/plain/symm.cpp
   blas/kernels/plain/syr2k.cpp
@@ -50,8 +51,8 @@ set(QTB_KERNEL_SOURCES_def
   blas/kernels/level3/gemm/def/folding_kernels.cpp
   blas/kernels/level3/gemm/def/pack.cpp
   blas/kernels/level3/gemm/pack.cpp
-  blas/kernels/plain/trmm.cpp
-  blas/kernels/plain/trsm.cpp
+  blas/kernels/level3/triangular/def/trmm.cpp
+  blas/kernels/level3/triangular/def/trsm.cpp
 )
 set(QTB_KERNEL_SOURCES_sse3
   blas/kernels/level2/gemv_kernels.cpp
@@ -60,8 +61,8 @@ set(QTB_KERNEL_SOURCES_sse3
   blas/kernels/level3/gemm/pack.cpp
   blas/kernels/level3/gemm/sse3/dgemm.cpp
   blas/kernels/level3/gemm/sse3/dgemm_kernel.cpp
-  blas/kernels/plain/trmm.cpp
-  blas/kernels/plain/trsm.cpp
+  blas/kernels/level3/triangular/def/trmm.cpp
+  blas/kernels/level3/triangular/def/trsm.cpp
 )
 set(QTB_KERNEL_SOURCES_ssse3
   blas/kernels/level2/gemv_kernels.cpp
@@ -73,6 +74,7 @@ set(QTB_KERNEL_SOURCES_ssse3
   blas/kernels/level3/gemm/ssse3/pack.cpp
   blas/kernels/level3/triangular/level_trmm.cpp
   blas/kernels/level3/triangular/level_trsm.cpp
+  blas/kernels/level3/triangular/small_right.cpp
 )
 set(QTB_KERNEL_SOURCES_sse42
   blas/kernels/level2/gemv_kernels.cpp
@@ -85,6 +87,7 @@ set(QTB_KERNEL_SOURCES_sse42
   blas/kernels/level3/gemm/sse42/pieces.cpp
   blas/kernels/level3/triangular/level_trmm.cpp
   blas/kernels/level3/triangular/level_trsm.cpp
+  blas/kernels/level3/triangular/small_right.cpp
 )
 set(QTB_KERNEL_SOURCES_avx
   blas/kernels/level2/gemv_kernels.cpp
@@ -96,6 +99,7 @@ set(QTB_KERNEL_SOURCES_avx
   blas/kernels/level3/gemm/sse42/gemm_kernel.cpp
   blas/kernels/level3/triangular/level_trmm.cpp
   blas/kernels/level3/triangular/level_trsm.cpp
+  blas/kernels/level3/triangular/small_right.cpp
 )
 set(qtb_tier_sources "")
 foreach(tier IN LISTS QTB_TIERS)

@@ -21,5 +21,17 @@ TriForm read_form(const char *side, const char *uplo, const char *transa, const 
 // Whether op(T) is an upper triangle.
 inline bool is_upper(const TriForm &form) { return form.upper == (form.op == Op::none); }
 
+template <class T>
+using TriProcedure = QTB_FUNCTION_TYPE(trmm, T);
+
+// A procedure of this shape for a form.
+template <class T>
+void call_with_form(TriProcedure<T> *procedure, const TriForm &form, QtbInt m, QtbInt n, T alpha, const T *a,
+                    QtbInt lda, T *b, QtbInt ldb) {
+  static constexpr char ops[] = {'N', 'T', 'C'};
+  procedure(form.left ? "L" : "R", form.upper ? "U" : "L", &ops[static_cast<int>(form.op)], form.unit ? "U" : "N", &m,
+            &n, &alpha, a, &lda, b, &ldb);
+}
+
 }  // namespace
 }  // namespace qtb::QTB_TIER
