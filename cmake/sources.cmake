@@ -72,9 +72,9 @@ set(QTB_KERNEL_SOURCES_ssse3
   blas/kernels/level3/gemm/ssse3/gemm.cpp
   blas/kernels/level3/gemm/ssse3/gemm_kernel.cpp
   blas/kernels/level3/gemm/ssse3/pack.cpp
+  blas/kernels/level3/triangular/level_trmm.cpp
+  blas/kernels/level3/triangular/level_trsm.cpp
   blas/kernels/level3/triangular/small_right.cpp
-  blas/kernels/plain/trmm.cpp
-  blas/kernels/plain/trsm.cpp
 )
 set(QTB_KERNEL_SOURCES_sse42
   blas/kernels/level2/gemv_kernels.cpp
@@ -85,9 +85,9 @@ set(QTB_KERNEL_SOURCES_sse42
   blas/kernels/level3/gemm/sse42/dgemm_kernel.cpp
   blas/kernels/level3/gemm/sse42/gemm_kernel.cpp
   blas/kernels/level3/gemm/sse42/pieces.cpp
+  blas/kernels/level3/triangular/level_trmm.cpp
+  blas/kernels/level3/triangular/level_trsm.cpp
   blas/kernels/level3/triangular/small_right.cpp
-  blas/kernels/plain/trmm.cpp
-  blas/kernels/plain/trsm.cpp
 )
 set(QTB_KERNEL_SOURCES_avx
   blas/kernels/level2/gemv_kernels.cpp
@@ -97,9 +97,9 @@ set(QTB_KERNEL_SOURCES_avx
   blas/kernels/level3/gemm/pack.cpp
   blas/kernels/level3/gemm/pieces.cpp
   blas/kernels/level3/gemm/sse42/gemm_kernel.cpp
+  blas/kernels/level3/triangular/level_trmm.cpp
+  blas/kernels/level3/triangular/level_trsm.cpp
   blas/kernels/level3/triangular/small_right.cpp
-  blas/kernels/plain/trmm.cpp
-  blas/kernels/plain/trsm.cpp
 )
 set(qtb_tier_sources "")
 foreach(tier IN LISTS QTB_TIERS)

@@ -18,3 +18,10 @@ qtb_add_test(nested_blocks_test SOURCES kernels/level3/nested_blocks_test.cpp LI
   SHARDS 4)
 qtb_add_test(unblocked_test SOURCES kernels/level3/unblocked_test.cpp LIBRARIES qtb_static qtb_platform_static
   SHARDS 4)
+qtb_add_test(triangular_levels_test SOURCES kernels/level3/triangular_levels_test.cpp)
+qtb_add_test(triangular_sweep_test SOURCES kernels/level3/triangular_sweep_test.cpp LIBRARIES qtb_static
+  qtb_platform_fake RUNS "plain=QTB_TEST_PROCESSOR=plain" "sse41=QTB_TEST_PROCESSOR=sse41" SHARDS 4)
+qtb_add_test(triangular_level3_test SOURCES kernels/level3/triangular_test.cpp LIBRARIES qtb_static qtb_platform_fake
+  RUNS "plain=QTB_TEST_PROCESSOR=plain" "sse41=QTB_TEST_PROCESSOR=sse41" SHARDS 2)
+# It counts the products that a walk asks for.
+target_link_options(triangular_level3_test PRIVATE -Wl,--wrap=qtb_blas_sse42_xdgemm)
