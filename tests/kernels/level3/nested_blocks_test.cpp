@@ -6,7 +6,7 @@ namespace {
 
 template <class T>
 void register_routine(int tier, const char *routine, Triangular<T> *procedure) {
-  with_sweep<T>(tier, routine, "", procedure, true, [](const auto &sweep) {
+  with_sweep<T>(tier, routine, "", procedure, Role::routine, [](const auto &sweep) {
     register_test("small_triangles_on_both_sides", sweep.label(),
                   [=] { sweep.all_options("LR", range(0, 20), range(0, 20), 10); });
     register_test("edges_of_inner_blocks_on_the_left", sweep.label(), [=] {

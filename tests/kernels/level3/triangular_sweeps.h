@@ -25,12 +25,15 @@ constexpr Scalar product_alphas[] = {{0.7, -0.9}, {1, 0}, {0, 0}, {-1, 0}, {1, 0
 template <class T>
 using Triangular = QTB_FUNCTION_TYPE(trmm, T);
 
-// A procedure of the shape of trmm. A kernel that solves has no alpha: it is called with one.
+// What is told of alpha: a kernel is not called with 0, and one that solves has none.
+enum class Role { routine, kernel, solving_kernel };
+
+// A procedure of the shape of trmm.
 template <class T>
 class TriangularSweep {
  public:
-  TriangularSweep(const char *label, const char *routine, Triangular<T> *procedure, bool takes_alpha)
-      : label_(label), routine_(routine, calls::kind_of<T>(routine), procedure, procedure), takes_alpha_(takes_alpha) {}
+  TriangularSweep(const char *label, const char *routine, Triangular<T> *procedure, Role role)
+      : label_(label), routine_(routine, calls::kind_of<T>(routine), procedure, procedure), role_(role) {}
 
   const char *label() const { return label_; }
 
@@ -66,7 +69,8 @@ class TriangularSweep {
   Problem draw(int number, Values values) const {
     Problem p = draw_problem(seed_of(label_, number), values);
     if (values == Values::rounding) p.alpha = Draw(p.seed).one_of(product_alphas);
-    if (!takes_alpha_) p.alpha = {1, 0};
+    if (role_ != Role::routine && p.alpha.is_zero()) p.alpha = {1, 0};
+    if (role_ == Role::solving_kernel) p.alpha = {1, 0};
     return p;
   }
   bool try_one(const Problem &p, Session &session) const {
@@ -77,17 +81,17 @@ class TriangularSweep {
 
   const char *label_;
   Routine<Triangular<T>> routine_;
-  bool takes_alpha_;
+  Role role_;
 };
 
 // f(sweep) for a procedure of a tier, if the processor runs it.
 template <class T, class F>
-void with_sweep(int tier, const char *routine, const char *part, Triangular<T> *procedure, bool takes_alpha, F f) {
+void with_sweep(int tier, const char *routine, const char *part, Triangular<T> *procedure, Role role, F f) {
   if (!test::processor_runs(tier)) return;
   static std::map<std::string, std::string> labels;  // outlive the tests
   const std::string label = std::string(routine) + part + " " + test::tier_name(tier);
   const std::string &kept = labels[label] = label;
-  f(TriangularSweep<T>(kept.c_str(), routine, procedure, takes_alpha));
+  f(TriangularSweep<T>(kept.c_str(), routine, procedure, role));
 }
 
 inline int run_sweeps(int argc, char **argv, void (*register_all)()) {

@@ -21,8 +21,13 @@ namespace qtb::surface {
 namespace {
 
 template <class T>
+Role role_of(const char *routine) {
+  return calls::kind_of<T>(routine).solve ? Role::solving_kernel : Role::kernel;
+}
+
+template <class T>
 void register_unblocked(int tier, const char *routine, Triangular<T> *procedure) {
-  with_sweep<T>(tier, routine, "_unblocked", procedure, !calls::kind_of<T>(routine).solve, [](const auto &sweep) {
+  with_sweep<T>(tier, routine, "_unblocked", procedure, role_of<T>(routine), [](const auto &sweep) {
     register_test("small_triangles_on_both_sides", sweep.label(),
                   [=] { sweep.all_options("LR", range(0, 12), range(0, 12), 2); });
     register_test("larger_triangles_on_the_left", sweep.label(), [=] {
@@ -37,7 +42,7 @@ void register_unblocked(int tier, const char *routine, Triangular<T> *procedure)
 
 template <class T>
 void register_small_right(int tier, const char *routine, Triangular<T> *procedure) {
-  with_sweep<T>(tier, routine, "_small_right", procedure, !calls::kind_of<T>(routine).solve, [](const auto &sweep) {
+  with_sweep<T>(tier, routine, "_small_right", procedure, role_of<T>(routine), [](const auto &sweep) {
     register_test("one_to_eight_columns", sweep.label(), [=] {
       sweep.all_options("R", {0, 1, 2, 3, 4, 5, 7, 8, 9, 13, 30}, range(1, 8));
     });
