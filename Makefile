@@ -12,11 +12,12 @@ MUTANTS ?= .
 # The lists (*.def) are laid out by hand.
 sources = $(shell git ls-files '*.cpp' '*.h' '*.c')
 
-.PHONY: help build demo test test-long bench lint format asan tsan fuzz mutants coverage install clean
+.PHONY: help build interfaces demo test test-long bench lint format asan tsan fuzz mutants coverage install clean
 .DEFAULT_GOAL := help
 
 help:
 	@echo 'make build      the library: build/release/libqtb.so'
+	@echo 'make interfaces  the companions that stand in for a BLAS: build/release/interfaces'
 	@echo 'make demo       builds and runs the examples'
 	@echo 'make test       builds everything and runs the tests'
 	@echo 'make test-long  more cases, both sanitizers, and the fuzz targets'
@@ -35,6 +36,11 @@ build:
 	@tools/packages.sh build
 	cmake --preset release
 	cmake --build --preset release -j $(JOBS) --target qtb
+
+interfaces:
+	@tools/packages.sh build
+	cmake --preset release
+	cmake --build --preset release -j $(JOBS) --target interfaces
 
 demo:
 	@tools/packages.sh demo

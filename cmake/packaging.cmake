@@ -14,3 +14,19 @@ install(FILES ${PROJECT_BINARY_DIR}/qtb-config-version.cmake DESTINATION ${packa
 file(RELATIVE_PATH prefix_from_pkgconfig ${CMAKE_INSTALL_FULL_LIBDIR}/pkgconfig ${CMAKE_INSTALL_PREFIX})
 configure_file(cmake/qtb.pc.in qtb.pc @ONLY)
 install(FILES ${PROJECT_BINARY_DIR}/qtb.pc DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig)
+
+# The companions, in a folder of their own: among the other libraries libblas.so.3 would become the system's.
+if(QTB_BUILD_INTERFACES)
+  set(companions_folder ${CMAKE_INSTALL_LIBDIR}/qtb)
+  install(TARGETS qtb_companion_blas qtb_companion_blas64 qtb_companion_qtb64 qtb_cblas EXPORT qtb
+    LIBRARY DESTINATION ${companions_folder})
+  install(FILES include/qtb/cblas.h include/qtb/cblas_routines.def DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/qtb)
+  function(qtb_install_package package library flags description)
+    configure_file(cmake/qtb-companion.pc.in ${package}.pc @ONLY)
+    install(FILES ${PROJECT_BINARY_DIR}/${package}.pc DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig)
+  endfunction()
+  qtb_install_package(qtb-lp64 blas "" "BLAS with integers of 32 bits, from Fortran and C")
+  qtb_install_package(qtb-cblas blas "" "the C interface of BLAS with integers of 32 bits")
+  qtb_install_package(qtb-ilp64 blas64 -DCBLAS_ILP64 "BLAS with integers of 64 bits, from Fortran and C")
+  qtb_install_package(qtb-ilp64-suffixed qtb64 "" "BLAS with integers of 64 bits, under names that end in _64")
+endif()

@@ -181,11 +181,17 @@ set(QTB_PLATFORM_SOURCES
   service/platform/linux_messages.cpp
 )
 
+# Said by each library for itself: this is the product's.
+set(QTB_OWN_SOURCES
+  service/own_tier.cpp
+)
+
 file(GLOB_RECURSE qtb_found RELATIVE ${PROJECT_SOURCE_DIR} CONFIGURE_DEPENDS
   ${PROJECT_SOURCE_DIR}/blas/*.cpp ${PROJECT_SOURCE_DIR}/service/*.cpp)
 foreach(source IN LISTS qtb_found)
   if(NOT source IN_LIST QTB_KERNEL_SOURCES AND NOT source IN_LIST qtb_tier_sources
-      AND NOT source IN_LIST QTB_CORE_SOURCES AND NOT source IN_LIST QTB_PLATFORM_SOURCES)
+      AND NOT source IN_LIST QTB_CORE_SOURCES AND NOT source IN_LIST QTB_PLATFORM_SOURCES
+      AND NOT source IN_LIST QTB_OWN_SOURCES)
     message(FATAL_ERROR "${source} is in no list of cmake/sources.cmake")
   endif()
 endforeach()

@@ -48,8 +48,22 @@ std::int32_t tier_override() {
   return number > 0 && number <= qtb::largest_asked_tier ? number : no_override;
 }
 
+// The test of avx takes either of two bits; a library that takes the tier unasked wants both, and the registers saved.
+bool may_take_unasked(std::int32_t tier) {
+  if (tier < tier_avx) return true;
+  constexpr std::uint32_t saves_state_and_has_avx = 3;
+  constexpr std::uint64_t vector_registers = 6;
+  return bits(feature_bits(), 27, 28) == saves_state_and_has_avx &&
+         (platform_saved_state() & vector_registers) == vector_registers;
+}
+
 // From the highest tier down, the first whose test passes; no test is made behind it.
 std::int32_t tier_of_processor() {
+  if (qtb_serv_takes_best_tier) {
+    for (std::int32_t tier = tier_count - 1; tier > tier_def; --tier)
+      if (tier_tests[tier].passes() && may_take_unasked(tier)) return tier;
+    return tier_def;
+  }
   if (!qtb_serv_cpu_is_belmo()) return tier_def;
   const std::int32_t asked = asked_tiers.load(relaxed);
   for (std::int32_t tier = tier_count - 1; tier > tier_def; --tier) {

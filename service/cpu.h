@@ -22,6 +22,10 @@ QTB_HIDDEN int qtb_serv_cpu_has_sse3();
 // kernels for SSE4.1 wants to know.
 QTB_HIDDEN int qtb_serv_cpu_takes_sse41();
 
+// What this library takes where nothing is asked for: the tier by the rules of the product, or the best that the
+// processor and the operating system have, whoever made them. Each library has one source that says so.
+QTB_HIDDEN extern const bool qtb_serv_takes_best_tier;
+
 // 1 on the vendor "AuthenticAMD" with base family 15 and extended family 1; cached after the first call.
 QTB_HIDDEN int qtb_serv_cpu_is_amd_family16();
 

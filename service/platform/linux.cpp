@@ -24,6 +24,12 @@ CpuidRegisters platform_cpuid(std::uint32_t leaf, std::uint32_t subleaf) {
   return r;
 }
 
+std::uint64_t platform_saved_state() {
+  std::uint32_t low, high;
+  __asm__ volatile("xgetbv" : "=a"(low), "=d"(high) : "c"(0));
+  return static_cast<std::uint64_t>(high) << 32 | low;
+}
+
 // ---- The environment ----
 
 std::size_t platform_environment(const char *name, char *buffer, std::size_t size) {

@@ -16,6 +16,9 @@ struct CpuidRegisters {
 // The CPUID instruction. A leaf that the processor lacks gives what the processor gives.
 CpuidRegisters platform_cpuid(std::uint32_t leaf, std::uint32_t subleaf);
 
+// The parts of the processor's state that the operating system saves (XCR0). Only where CPUID says that it does.
+std::uint64_t platform_saved_state();
+
 // ---- The environment ----
 
 // Returns the length of an environment variable's value, 0 where the variable is absent or empty, and copies as much of

@@ -28,6 +28,8 @@ void insert_processors(ProcessorSet *set, int first, int last) {
 
 using namespace qtb::test;
 
+std::uint64_t platform_saved_state() { return fake.saved_state; }
+
 CpuidRegisters platform_cpuid(std::uint32_t leaf, std::uint32_t subleaf) {
   ++fake.cpuid_calls;
   if (fake.on_cpuid) fake.on_cpuid();

@@ -46,6 +46,8 @@ struct FakeSystem {
   std::atomic<int> cpuid_calls{0};
   std::function<void()> on_cpuid;  // called by each of them, where it is set
 
+  std::uint64_t saved_state = 7;  // of the registers: those of 8, 16 and 32 bytes
+
   ProcessorSet process = {}, online = {};
   bool masks_known = true;
   std::set<int> refused;            // processors that a thread cannot be bound to although they are online

@@ -40,7 +40,7 @@ using InPlaceProcedure = void(QTB_IN_PLACE_KERNEL_PARAMS(T));
 template <class Procedure>
 struct KernelRecord {
   Procedure *any, *aligned;
-  QtbInt stage_per_k;
+  QtbInt stage_per_k = -1;  // where there is no kernel: addresses are no constants to instrumented builds
 };
 
 // Every tier's build sees the whole list and takes its own.
@@ -55,7 +55,7 @@ constexpr KernelRecord<InnerProcedure<T>> inner_kernel_in{};
 template <class T, Family family>
 consteval KernelRecord<InnerProcedure<T>> find_inner_kernel() {
   constexpr KernelRecord<InnerProcedure<T>> record = inner_kernel_in<this_tier, T, family>;
-  static_assert(record.any != nullptr,
+  static_assert(record.stage_per_k >= 0,
                 "blas/kernels/level3/gemm/kernels.def: write the inner kernel of this family, type and tier");
   return record;
 }
