@@ -275,9 +275,8 @@ TYPED_TEST(Triangular, AZeroOnTheDiagonalGivesNothingFiniteInItsRow) {
               } else {
                 finite = std::isfinite(got), right = got == want;
               }
-              if (r == hole) ASSERT_FALSE(finite) << tier_name(tier) << " " << form << " row " << r;
-              if (r != hole && (r < hole) == up)
-                ASSERT_TRUE(right) << tier_name(tier) << " " << form << " row " << r << " of " << order;
+              ASSERT_TRUE(r != hole || !finite) << tier_name(tier) << " " << form << " row " << r;
+              ASSERT_TRUE(r == hole || (r < hole) != up || right) << tier_name(tier) << " " << form << " row " << r;
             }
         });
       }

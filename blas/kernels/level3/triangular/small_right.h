@@ -3,8 +3,8 @@
 //   trmm_small_right    B := alpha*B*op(T)
 //   trsm_small_right    B := B*op(T)^-1
 //
-// B is m x n with columns ldb apart, T stands in a with columns lda apart and does not overlap B. m may be 0, alpha not. No
-// alignment is asked for. The other triangle is never read, nor a unit diagonal. A solve divides by the diagonal.
+// B is m x n with columns ldb apart, T stands in a with columns lda apart and does not overlap B. m may be 0, and
+// alpha not. No alignment is asked for. Neither the other triangle nor a unit diagonal is read. A solve divides.
 #pragma once
 
 #include "blas/kernels/level3/gemm/parts.h"

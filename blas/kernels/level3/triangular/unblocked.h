@@ -3,9 +3,9 @@
 //   trmm_unblocked    B := alpha*op(T)*B, or alpha*B*op(T)
 //   trsm_unblocked    B := op(T)^-1*B, or B*op(T)^-1
 //
-// B is m x n with columns ldb apart, T stands in a with columns lda apart and does not overlap B. m and n may be 0, alpha not. No
-// alignment is asked for. The other triangle is never read, nor a unit diagonal, and no element of B meets one of T
-// that is not stored: an infinity in B reaches only what it has a part in. A solve divides by the diagonal.
+// B is m x n with columns ldb apart, T stands in a with columns lda apart and does not overlap B. m and n may be 0,
+// alpha not. No alignment is asked for. The other triangle is never read, nor a unit diagonal, and no element of B
+// meets one of T that is not stored: an infinity in B reaches only what it has a part in. A solve divides truly.
 #pragma once
 
 #include "blas/kernels/level3/gemm/parts.h"
