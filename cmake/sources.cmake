@@ -37,7 +37,6 @@ set(QTB_KERNEL_SOURCES
   blas/kernels/level3/rank_k/syr2k.cpp
   blas/kernels/level3/symmetric/symm.cpp
   blas/kernels/level3/triangular/unblocked.cpp
-  # plain
 )
 
 # Compiled for some tiers only: these lists alone decide where.

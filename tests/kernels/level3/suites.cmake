@@ -33,7 +33,6 @@ foreach(suite symm_test syr2k_test)
   endforeach()
 endforeach()
 qtb_add_test(small_right_test SOURCES kernels/level3/small_right_test.cpp LIBRARIES qtb_static qtb_platform_static)
-qtb_add_test(triangle_pieces_test SOURCES kernels/level3/triangle_pieces_test.cpp LIBRARIES qtb_static SHARDS 2)
 qtb_add_test(nested_blocks_test SOURCES kernels/level3/nested_blocks_test.cpp LIBRARIES qtb_static qtb_platform_static
   SHARDS 4)
 qtb_add_test(unblocked_test SOURCES kernels/level3/unblocked_test.cpp LIBRARIES qtb_static qtb_platform_static
@@ -45,10 +44,3 @@ qtb_add_test(triangular_level3_test SOURCES kernels/level3/triangular_test.cpp L
   RUNS "plain=QTB_TEST_PROCESSOR=plain" "sse41=QTB_TEST_PROCESSOR=sse41" SHARDS 2)
 # It counts the products that a walk asks for.
 target_link_options(triangular_level3_test PRIVATE -Wl,--wrap=qtb_blas_sse42_xdgemm)
-qtb_add_test(small_right_test SOURCES kernels/level3/small_right_test.cpp LIBRARIES qtb_static qtb_platform_static)
-qtb_add_test(nested_blocks_test SOURCES kernels/level3/nested_blocks_test.cpp LIBRARIES qtb_static qtb_platform_static
-  SHARDS 4)
-qtb_add_test(unblocked_test SOURCES kernels/level3/unblocked_test.cpp LIBRARIES qtb_static qtb_platform_static
-  SHARDS 4)
-qtb_add_test(triangle_pieces_test SOURCES kernels/level3/triangle_pieces_test.cpp LIBRARIES qtb_static
-  qtb_platform_static SHARDS 2)

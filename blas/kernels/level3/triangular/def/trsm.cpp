@@ -4,7 +4,7 @@
 namespace qtb::QTB_TIER {
 namespace {
 
-constexpr QtbInt inner_block = QTB_TIER_IS(def) ? 256 : 128;
+constexpr QtbInt inner_block = this_tier == tier_def ? 256 : 128;
 
 template <class T>
 QTB_FUNCTION(trmm, T, trsm) {
