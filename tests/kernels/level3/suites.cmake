@@ -34,9 +34,9 @@ foreach(suite symm_test syr2k_test)
 endforeach()
 qtb_add_test(small_right_test SOURCES kernels/level3/small_right_test.cpp LIBRARIES qtb_static qtb_platform_static)
 qtb_add_test(nested_blocks_test SOURCES kernels/level3/nested_blocks_test.cpp LIBRARIES qtb_static qtb_platform_static
-  SHARDS 4)
+  SHARDS 8)
 qtb_add_test(unblocked_test SOURCES kernels/level3/unblocked_test.cpp LIBRARIES qtb_static qtb_platform_static
-  SHARDS 4)
+  SHARDS 8)
 qtb_add_test(triangular_levels_test SOURCES kernels/level3/triangular_levels_test.cpp)
 qtb_add_test(triangular_sweep_test SOURCES kernels/level3/triangular_sweep_test.cpp LIBRARIES qtb_static
   qtb_platform_fake RUNS "plain=QTB_TEST_PROCESSOR=plain" "sse41=QTB_TEST_PROCESSOR=sse41" SHARDS 4)

@@ -69,7 +69,7 @@ class TriangularSweep {
   Problem draw(int number, Values values) const {
     Problem p = draw_problem(seed_of(label_, number), values);
     if (values == Values::rounding) p.alpha = Draw(p.seed).one_of(product_alphas);
-    if (role_ != Role::routine && p.alpha.is_zero()) p.alpha = {1, 0};
+    if (role_ != Role::routine && is_zero(scalar<T>(p.alpha))) p.alpha = {1, 0};
     if (role_ == Role::solving_kernel) p.alpha = {1, 0};
     return p;
   }
