@@ -22,7 +22,10 @@ QTB_FUNCTION(gemv, T, gemv) {
   x = walk_start(x, lenx, *incx);
   y = walk_start(y, leny, *incy);
 #if QTB_TIER_AT_LEAST(sse3)
-  if constexpr (sizeof(T) != sizeof(float)) return tiled_product<T>({op, *m, *n, *alpha, a, *lda, x, *incx, y, *incy});
+  if constexpr (sizeof(T) != sizeof(float)) {
+    if (*incx == 1 && *incy == 1 && on_8_bytes(a, x, y)) return gemv_kernel<T>(op, *lda)(m, n, alpha, a, lda, x, y);
+    return tiled_product<T>({op, *m, *n, *alpha, a, *lda, x, *incx, y, *incy});
+  }
 #endif
   direct_product<T>(op, {*m, *n, *alpha, a, *lda, x, *incx, y, *incy});
 }
