@@ -6,7 +6,8 @@
 #   BENCH_PARTS            what to run (default: slot level1 level2 kernels gemm flat families threads level3 balance)
 #                            slot     what a dispatch slot costs
 #                            level1   Level 1 on one thread and on all, and beside the peer
-#                            level2   Level 2: every option and increment in cache, some beyond it, and on all threads
+#                            level2   Level 2: every option and increment in cache, odd leading dimensions, some beyond
+#                                     the caches, and on all threads
 #                            kernels  the inner kernels of matrix products, beside what their instructions allow
 #                            gemm     matrix products on one thread, beside the peer
 #                            flat     matrix products with one short side, on one thread, beside the peer
@@ -17,6 +18,7 @@
 #   BENCH_TIERS            on which tiers (default: all)
 #   BENCH_LONG             with any value, square products of sizes 2000 and 4000 too, and Level 2 with every option at
 #                          every size
+#   BENCH_QUICK            with any value, Level 2 at few sizes with few options, in about a minute and a half a tier
 #   BENCH_FILTER           regular expression of the Level-1 cases (default: all)
 #   BENCH_MIN_TIME         seconds per Level-1 case (default 0.005)
 #   PEER                   path of another BLAS shared library to compare with; PEER2 and PEER3 more of them
@@ -85,7 +87,31 @@ some_options=N,T,U,UNN,LTN
 # The routines with a parallel path.
 threaded=gemv,ssymv,dsymv,ssyr,dsyr,ssyr2,dsyr2,trmv,trsv
 
+# What goes beyond the caches: a matrix of 4000 x 4000 doubles has 128 MB.
+large=dgemv,dger,dsymv,dspmv,dsyr,dsyr2,dtrmv,dtrsv,dtpmv,dtpsv,dgbmv,dtbsv
+
+quick_level2() {
+  set -- --turns 7 --seconds 0.03
+  heading "Level 2, one thread${PEER:+, beside $PEER}"
+  beside_peer level2 --threads 1 --routines level2 --options N,T,U,UNN --sizes 8,32,200 "$@"
+  heading "Level 2, one thread, an odd leading dimension${PEER:+, beside $PEER}"
+  beside_peer level2-odd --threads 1 --routines gemv,trmv,trsv --options N,T,UNN --sizes 100 --spare 1 "$@"
+  heading "Level 2, one thread, increments${PEER:+, beside $PEER}"
+  beside_peer level2-increments --threads 1 --routines gemv,dsymv,dtrmv,dtrsv,dger --options N,T,U,UNN \
+    --increments 2,-1 --sizes 100 "$@"
+  heading "Level 2, one thread, large${PEER:+, beside $PEER}"
+  beside_peer level2-large --threads 1 --options N,T,U,UNN,UTN --sizes 500,4000 \
+    --routines dgemv,dsymv,dtrmv,dtrsv,dger "$@"
+  heading "Level 2, $threads threads, beside one"
+  compared level2-threads-serial --threads "$threads" --routines $threaded --options N,T,U,UNN \
+    --sizes 200,1000 --peer self --peer-setting QTB_NUM_THREADS=1 "$@"
+}
+
 part_level2() {
+  if [ -n "${BENCH_QUICK:-}" ]; then
+    quick_level2
+    return 0
+  fi
   set -- --turns 7 --seconds 0.1
   if [ -n "${BENCH_LONG:-}" ]; then
     heading "Level 2, one thread, every option and increment${PEER:+, beside $PEER}"
@@ -100,9 +126,12 @@ part_level2() {
     beside_peer level2-increments --threads 1 --routines level2 --options $some_options --increments 2,-1 \
       --sizes 100 "$@"
     heading "Level 2, one thread, large${PEER:+, beside $PEER}"
-    beside_peer level2-large --threads 1 --options N,T,U,UNN,UTN --sizes 1000,2000,4000 \
-      --routines dgemv,dger,dsymv,dspmv,dsyr,dsyr2,dtrmv,dtrsv,dtpmv,dtpsv,dgbmv,dtbsv --bands 100 "$@"
+    beside_peer level2-large --threads 1 --options N,T,U,UNN,UTN --sizes 1000,2000,4000 --routines $large --bands 100 \
+      "$@"
   fi
+  heading "Level 2, one thread, an odd leading dimension${PEER:+, beside $PEER}"
+  beside_peer level2-odd --threads 1 --routines gemv,ger,ssymv,dsymv,trmv,trsv --options N,T,U,UNN,LTN \
+    --sizes 32,100,500 --spare 1 "$@"
   heading "Level 2, $threads threads, beside one"
   compared level2-threads-serial --threads "$threads" --routines $threaded --options N,T,U,UNN,UTN \
     --sizes 100,200,500,1000,4000 --peer self --peer-setting QTB_NUM_THREADS=1 "$@"

@@ -122,6 +122,9 @@ section 'Level 3 beside gemm, all threads' \
 section 'Level 2, one thread' \
   'GFLOP/s / share of what caches, memory and arithmetic allow / ratio to the peer' \
   rate level2 level2-large level2-increments level2-options
+section 'Level 2, one thread, leading dimensions one beyond the rows' \
+  'GFLOP/s / share of what caches, memory and arithmetic allow / ratio to the peer' \
+  rate level2-odd
 section 'Level 2, triangular matrices beside general ones, one thread' \
   'Rate over that of gemv of the same order and transposition, in the same run' \
   gemv level2 level2-large level2-options

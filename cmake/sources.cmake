@@ -159,6 +159,17 @@ if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
   endforeach()
 endif()
 
+# Some processors decode a jump slowly that crosses or ends on a boundary of 32 bytes. Where the arithmetic of a column
+# is as short as what stands around it, a loop placed so loses up to a sixth.
+include(CheckCXXCompilerFlag)
+set(qtb_placed_jumps -Wa,-malign-branch-boundary=32,-malign-branch=jcc+fused+jmp,-malign-branch-prefix-size=0)
+check_cxx_compiler_flag("${qtb_placed_jumps}" QTB_ASSEMBLER_PLACES_JUMPS)
+if(QTB_ASSEMBLER_PLACES_JUMPS)
+  set(qtb_short_columns ${qtb_hand_vectorised})
+  list(FILTER qtb_short_columns INCLUDE REGEX "^blas/kernels/level2/")
+  set_property(SOURCE ${qtb_short_columns} APPEND PROPERTY COMPILE_OPTIONS ${qtb_placed_jumps})
+endif()
+
 # The inner kernels of GEMV read and write by halves what stands 8 bytes off a boundary: the compiler would join them.
 if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
   set_property(SOURCE blas/kernels/level2/gemv_kernels.cpp APPEND PROPERTY COMPILE_OPTIONS

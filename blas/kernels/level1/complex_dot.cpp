@@ -82,27 +82,23 @@ V join_parts(V first, V second) {
 }
 
 // One procedure for both products of a type: its loops are long.
-template <class T>
-struct LaneSums {
-  Vec<T> first, second;
-};
 template <Row row, bool contiguous, class T>
-[[gnu::noinline]] LaneSums<T> sum_products(QtbInt n, const T *x, QtbInt incx, const T *y, QtbInt incy) {
+[[gnu::noinline]] Vec<T> sum_products(bool conjugate, QtbInt n, const T *x, QtbInt incx, const T *y, QtbInt incy) {
   Walk<const T, const T> walk{n, x, incx, y, incy};
   LaneProducts<T> products;
   passes<row, contiguous>(walk, products);
   single_passes<1>(walk, products);
-  return {sum_elements(join_accumulators(products.first)), sum_elements(join_accumulators(products.second))};
+  const Vec<T> first = sum_elements(join_accumulators(products.first));
+  const Vec<T> second = sum_elements(join_accumulators(products.second));
+  return conjugate ? join_parts<true, Real<T>>(first, second) : join_parts<false, Real<T>>(first, second);
 }
 
 template <Row row, bool conjugate, class T>
 T *dot(T *result, const QtbInt *n, const T *x, const QtbInt *incx, const T *y, const QtbInt *incy) {
   Vec<T> value = zero<T>();
-  if (*n > 0) {
-    const LaneSums<T> sums = dot_is_contiguous(*incx, *incy) ? sum_products<row, true>(*n, x, 1, y, 1)
-                                                             : sum_products<row, false>(*n, x, *incx, y, *incy);
-    value = join_parts<conjugate, Real<T>>(sums.first, sums.second);
-  }
+  if (*n > 0)
+    value = dot_is_contiguous(*incx, *incy) ? sum_products<row, true>(conjugate, *n, x, 1, y, 1)
+                                            : sum_products<row, false>(conjugate, *n, x, *incx, y, *incy);
   store_lowest(result, value);
   return result;
 }

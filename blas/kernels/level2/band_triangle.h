@@ -52,57 +52,53 @@ void own_dot(QTB_PARAMS_cdot(cdouble)) {
   conjugated ? QTB_TIER_NAME(xzdotc)(QTB_ARGS_cdot) : QTB_TIER_NAME(xzdotu)(QTB_ARGS_cdot);
 }
 
-// Columns with the elements of x that they meet. x counts from its first element; a call takes the vector's argument,
-// which is its last element in memory order where the increment is negative.
-template <class T, class Triangle>
-struct ColumnCalls {
-  Triangle t;
-  LineVector<T> x;
-  bool unit;
-
-  static constexpr QtbInt one = 1;
-  T *argument(QtbInt first, QtbInt rows) const { return x.start + (x.inc < 0 ? first + rows - 1 : first) * x.inc; }
-
-  // x += factor * column j beside the diagonal.
-  void add(QtbInt j, const T *column, T factor) const {
-    const QtbInt first = t.begin(j), rows = t.end(j) - first;
-    if (rows > 0) own_axpy(&rows, &factor, column + first, &one, argument(first, rows), &x.inc);
-  }
-  template <bool conjugated>
-  T dot(QtbInt j, const T *column) const {
-    const QtbInt first = t.begin(j), rows = t.end(j) - first;
-    T sum{};
-    if (rows > 0) own_dot<conjugated>(&sum, &rows, column + first, &one, argument(first, rows), &x.inc);
-    return sum;
-  }
-
-  template <Task task, Op op>
-  void take(QtbInt j, const T *column) const {
-    constexpr bool conjugated = op == Op::conjugate;
-    const auto diagonal = [&] { return conjugate_if<conjugated>(load_element(column + j)); };
-    if constexpr (op == Op::none) {
-      T own = x.get(j);
-      if (is_zero(own)) return;
-      if (task == Task::solve && !unit) own = quotient(own, diagonal());
-      add(j, column, task == Task::solve ? -own : own);
-      if (task == Task::product && !unit) own = own * diagonal();
-      x.set(j, own);
-    } else if constexpr (task == Task::product) {
-      const T own = x.get(j);
-      x.set(j, (unit ? own : diagonal() * own) + dot<conjugated>(j, column));
-    } else {
-      const T own = x.get(j) - dot<conjugated>(j, column);
-      x.set(j, unit ? own : quotient(own, diagonal()));
-    }
-  }
-};
-
+// A column's part beside the diagonal with the elements of x that it meets. A call takes the vector's argument, which
+// is its last element where the increment is negative. Columns are short, so that addresses are kept from column to
+// column, and nothing but those is kept across a call.
 template <Task task, Op op, class T, class Triangle>
 [[gnu::noinline]] void call_columns(const Triangle &t, bool unit, const LineVector<T> &x) {
-  const ColumnCalls<T, Triangle> calls{t, x, unit};
-  for (QtbInt i = 0; i < t.n; ++i) {
-    const QtbInt j = goes_forward<task, op, Triangle> ? i : t.n - 1 - i;
-    calls.template take<task, op>(j, t.origin + j * t.along);
+  constexpr bool upper = Triangle::upper, forward = goes_forward<task, op, Triangle>, conjugated = op == Op::conjugate;
+  constexpr QtbInt one = 1;
+  const QtbInt first = forward ? 0 : t.n - 1, lda = t.along + 1;
+  const QtbInt own_step = forward ? x.inc : -x.inc, diagonal_step = forward ? lda : -lda;
+  T *own = x.start + first * x.inc;
+  const T *diagonal = t.origin + first * lda;
+  QtbInt room = forward == upper ? 0 : t.n - 1;  // rows of the matrix beside the diagonal
+  for (QtbInt left = t.n; left > 0; --left) {
+    const QtbInt rows = room < t.k ? room : t.k;
+    const T *const beside = upper ? diagonal - rows : diagonal + 1;
+    // The elements of x on these rows: the nearest one is next to the column's own.
+    T *const nearest = upper ? own - x.inc : own + x.inc, *const farthest =
+                                                              upper ? own - rows * x.inc : own + rows * x.inc;
+    T *const argument = upper == (x.inc < 0) ? nearest : farthest;
+    const auto of_diagonal = [&] { return conjugate_if<conjugated>(load_element(diagonal)); };
+    if constexpr (op == Op::none) {
+      T factor = load_element(own);
+      if (!is_zero(factor)) {
+        if constexpr (task == Task::product) {
+          if (!unit) store_element(own, factor * of_diagonal());
+        } else {
+          if (!unit) store_element(own, factor = Divisor<T>(of_diagonal()).divide(factor));
+          factor = -factor;
+        }
+        if (rows > 0) own_axpy(&rows, &factor, beside, &one, argument, &x.inc);
+      }
+    } else {
+      T sum{};
+      if (rows > 0) own_dot<conjugated>(&sum, &rows, beside, &one, argument, &x.inc);
+      T value = load_element(own);
+      if constexpr (task == Task::product) {
+        if (!unit) value = of_diagonal() * value;
+        value += load_element(&sum);
+      } else {
+        value -= load_element(&sum);
+        if (!unit) value = Divisor<T>(of_diagonal()).divide(value);
+      }
+      store_element(own, value);
+    }
+    own += own_step;
+    diagonal += diagonal_step;
+    room += forward == upper ? 1 : -1;
   }
 }
 

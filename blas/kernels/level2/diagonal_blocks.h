@@ -11,6 +11,7 @@
 // is worked on in a copy.
 #pragma once
 
+#include "blas/kernels/level2/divisor.h"
 #include "blas/kernels/level2/sweep.h"
 
 namespace qtb::QTB_TIER {
@@ -34,14 +35,6 @@ template <bool forward>
 constexpr int turn(int s, int count) {
   return forward ? s : count - 1 - s;
 }
-
-// A quotient of complex elements is long: it is a procedure.
-template <class T>
-[[gnu::noinline]] T quotient(T a, T b) {
-  return a / b;
-}
-inline float quotient(float a, float b) { return a / b; }
-inline double quotient(double a, double b) { return a / b; }
 
 // ---- Products ----
 
@@ -95,7 +88,7 @@ struct Solve {
           x[j] -= element_of<Case>(a + i + j * lda) * x[i];
         }
       }
-      if constexpr (!Case::unit) x[j] = quotient(x[j], element_of<Case>(a + j + j * lda));
+      if constexpr (!Case::unit) x[j] = Divisor<T>(element_of<Case>(a + j + j * lda)).divide(x[j]);
       if constexpr (!Case::transposed) {
         for (int r = s + 1; r < count; r++) {
           const int i = turn<forward>(r, count);

@@ -19,10 +19,12 @@ QTB_FUNCTION(gemv, T, gemv) {
   if (is_zero(*alpha)) return;
   x = walk_start(x, lenx, *incx);
   y = walk_start(y, leny, *incy);
-  if constexpr (this_tier >= tier_sse3 && sizeof(T) != sizeof(float))
+  if constexpr (this_tier >= tier_sse3 && sizeof(T) != sizeof(float)) {
+    if (*incx == 1 && *incy == 1 && on_8_bytes(a, x, y)) return gemv_kernel<T>(op, *lda)(m, n, alpha, a, lda, x, y);
     tiled_product<T>({op, *m, *n, *alpha, a, *lda, x, *incx, y, *incy});
-  else
+  } else {
     direct_product<T>(op, {*m, *n, *alpha, a, *lda, x, *incx, y, *incy});
+  }
 }
 
 }  // namespace

@@ -85,11 +85,15 @@ void dot_group(const Group<T> &g, const T *x, T *y) {
   add_totals(sums, g.conjugated, g.alpha, y);
 }
 
-// Odd's columns only count in groups of two and more.
+// Odd's columns only count in groups of two and more. The arguments stay in registers: what passes through memory on
+// the way to a small product takes longer than its arithmetic.
 template <bool transposed, QtbInt ahead, template <class> class Even, template <class> class Odd,
           template <class> class Beside, class T>
-[[gnu::noinline]] void all_groups(QtbInt columns, Group<T> group, const T *x, T *y) {
+[[gnu::noinline]] void all_groups(QtbInt columns, QtbInt rows, T alpha, const T *a, QtbInt lda, const T *x, T *y,
+                                  bool conjugated) {
+  const bool peels = lanes<T> > 1 && phase(a) != 0;
   const auto take = [&](auto count) __attribute__((always_inline)) {
+    const Group<T> group{rows, alpha, a, lda, peels, conjugated};
     if constexpr (!transposed) {
       add_group<count.value, ahead, Even, Odd, Beside>(group, x, y);
       x += count.value;
@@ -97,7 +101,7 @@ template <bool transposed, QtbInt ahead, template <class> class Even, template <
       dot_group<count.value, ahead, Even, Odd, Beside>(group, x, y);
       y += count.value;
     }
-    group.a += count.value * group.lda;
+    a += count.value * lda;
   };
   for (; columns >= 4; columns -= 4) take(Constant<4>());
   if ((columns & 2) != 0) take(Constant<2>());
@@ -108,27 +112,23 @@ template <class T, Op op, Parity parity>
 void gemv_kernel(QTB_GEMV_KERNEL_PARAMS(T)) {
   if (*rows < 1) return;
   constexpr QtbInt ahead = bytes_ahead<T, op, parity>();
-  constexpr bool transposed = op != Op::none;
+  constexpr bool transposed = op != Op::none, conjugated = op == Op::conjugate;
   const QtbInt beside = transposed ? phase(x) : phase(y);
-  Group<T> group{*rows, *alpha, a, *lda, false, op == Op::conjugate};
   if constexpr (parity == Parity::any) {
     if (phase(a) == 0 && beside == 0)
-      all_groups<transposed, ahead, Aligned, Aligned, Aligned>(*columns, group, x, y);
+      all_groups<transposed, ahead, Aligned, Aligned, Aligned>(*columns, *rows, *alpha, a, *lda, x, y, conjugated);
     else
-      all_groups<transposed, ahead, Halves, Halves, Halves>(*columns, group, x, y);
+      all_groups<transposed, ahead, Halves, Halves, Halves>(*columns, *rows, *alpha, a, *lda, x, y, conjugated);
+  } else if (phase(a) == beside) {
+    if constexpr (parity == Parity::even)
+      all_groups<transposed, ahead, Aligned, Aligned, Aligned>(*columns, *rows, *alpha, a, *lda, x, y, conjugated);
+    else
+      all_groups<transposed, ahead, Aligned, Halves, Aligned>(*columns, *rows, *alpha, a, *lda, x, y, conjugated);
   } else {
-    group.peels = phase(a) != 0;
-    if (phase(a) == beside) {
-      if constexpr (parity == Parity::even)
-        all_groups<transposed, ahead, Aligned, Aligned, Aligned>(*columns, group, x, y);
-      else
-        all_groups<transposed, ahead, Aligned, Halves, Aligned>(*columns, group, x, y);
-    } else {
-      if constexpr (parity == Parity::even)
-        all_groups<transposed, ahead, Aligned, Aligned, Halves>(*columns, group, x, y);
-      else
-        all_groups<transposed, ahead, Aligned, Halves, Halves>(*columns, group, x, y);
-    }
+    if constexpr (parity == Parity::even)
+      all_groups<transposed, ahead, Aligned, Aligned, Halves>(*columns, *rows, *alpha, a, *lda, x, y, conjugated);
+    else
+      all_groups<transposed, ahead, Aligned, Halves, Halves>(*columns, *rows, *alpha, a, *lda, x, y, conjugated);
   }
 }
 

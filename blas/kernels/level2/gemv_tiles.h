@@ -152,11 +152,13 @@ template <class T>
   }
 }
 
+// Of vectors with increments, or at other addresses: the inner kernels take the rest as it is.
 template <class T>
 void tiled_product(const TiledProduct<T> &p) {
-  if (!on_8_bytes(p.a, p.x, p.y)) return plain_product(p);
-  if (p.incx != 1 || p.incy != 1) return product_of_tiles(p);
-  gemv_kernel<T>(p.op, p.lda)(&p.m, &p.n, &p.alpha, p.a, &p.lda, p.x, p.y);
+  if (on_8_bytes(p.a, p.x, p.y))
+    product_of_tiles(p);
+  else
+    plain_product(p);
 }
 
 }  // namespace

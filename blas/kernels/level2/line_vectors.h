@@ -74,8 +74,9 @@ template <bool conjugated, int count, class T>
     walk.template single<1>();
   }
   if (rows > 0) walk.template single<0>();
-  repeat<count>([&](auto j)
-                    __attribute__((always_inline)) { sums[j.value] += walk.template total<conjugated, j.value>(); });
+  repeat<count>([&](auto j) __attribute__((always_inline)) {
+    store_element(sums + j.value, load_element(sums + j.value) + walk.template total<conjugated, j.value>());
+  });
 }
 
 // ---- Elements apart ----
@@ -101,7 +102,9 @@ template <bool conjugated, int count, class T>
       sum[j.value] += conjugate_if<conjugated>(load_element(columns[j.value] + i)) * element;
     });
   }
-  repeat<count>([&](auto j) __attribute__((always_inline)) { sums[j.value] += sum[j.value]; });
+  repeat<count>([&](auto j) __attribute__((always_inline)) {
+    store_element(sums + j.value, load_element(sums + j.value) + sum[j.value]);
+  });
 }
 
 // ---- The vector ----

@@ -64,15 +64,11 @@ T load_element(const T *p) {
   else
     return load_single(p);
 }
-template <class T>
-void store_element(T *p, T v) {
-  if constexpr (is_complex<T>) {
-    store_single(parts(p), v.re);
-    store_single(parts(p) + 1, v.im);
-  } else {
-    store_single(p, v);
-  }
-}
+// The parts together, in one store: a vector load that follows is then served by it, and need not wait for memory.
+inline void store_element(float *p, float v) { store_single(p, v); }
+inline void store_element(double *p, double v) { store_single(p, v); }
+inline void store_element(cfloat *p, cfloat v) { store_lowest(p, _mm_unpacklo_ps(_mm_set_ss(v.re), _mm_set_ss(v.im))); }
+inline void store_element(cdouble *p, cdouble v) { store_lowest(p, _mm_set_pd(v.im, v.re)); }
 
 // One element of an update: of a complex one the whole vector is filled with it, so that no lane computes anything
 // else.
@@ -375,7 +371,9 @@ template <int count, bool conjugated, class T>
 [[gnu::noinline]] void dot_columns(QtbInt rows, const T *const (&columns)[count], const T *x, T (&sums)[count]) {
   ColumnSums<T, count> s;
   dot_sweep(rows, AnyColumns<T, count>(columns), x, s);
-  repeat<count>([&](auto j) { sums[j.value] += s.template total<conjugated>(j.value); });
+  repeat<count>([&](auto j) __attribute__((always_inline)) {
+    store_element(sums + j.value, load_element(sums + j.value) + s.template total<conjugated>(j.value));
+  });
 }
 
 }  // namespace

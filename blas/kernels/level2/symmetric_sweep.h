@@ -14,7 +14,7 @@
 // From shortest_mirrored rows on, rows of the rectangle go eight a pass in vectors. A contiguous y is brought to a
 // vector boundary by single rows first; where they cannot, and for what is left, rows go singly, into the lowest lanes
 // of the same sums. Elements that fill a vector need none of that. Vectors of strided elements are gathered and
-// scattered. The sums are kept as in sweep.h.
+// scattered. The sums are kept as in sweep.h. A prefetch may name what stands behind a column; it touches nothing.
 #pragma once
 
 #include "blas/kernels/level2/sweep.h"
@@ -23,6 +23,11 @@ namespace qtb::QTB_TIER {
 namespace {
 
 constexpr QtbInt shortest_mirrored = 9;  // rows from which on vectors pay
+
+// Columns of so many rows belong to a matrix beyond the caches: a pass asks for what it will need so far ahead.
+template <class T>
+constexpr QtbInt shortest_asked_for = 8192 / static_cast<QtbInt>(sizeof(T));
+constexpr QtbInt bytes_ahead = 512;
 
 // Vectors per turn of the loop over passes: where a vector takes many instructions, a pass takes several turns.
 template <class T, bool strided>
@@ -64,6 +69,14 @@ struct MirroredRows {
     advance(vectors * lanes<T>);
   }
 
+  // A core that does two products with every element keeps no more than a few lines of each column on their way from
+  // memory by itself, and none across the boundary of a page.
+  [[gnu::always_inline]] void ask_for_columns() const {
+    repeat<count>([&](auto j) __attribute__((always_inline)) {
+      _mm_prefetch(reinterpret_cast<const char *>(columns.template row<j.value>()) + bytes_ahead, _MM_HINT_T0);
+    });
+  }
+
   // One row of the columns begin to end - 1, and of the diagonal, if it is one of them.
   template <int begin, int end, int diagonal = -1>
   [[gnu::always_inline]] void single() {
@@ -94,7 +107,13 @@ struct MirroredRows {
     if (rows >= shortest_mirrored && (!peels || element_aligned(y.p))) {
       if constexpr (peels)
         for (; phase(y.p) != 0; --rows) single<0, count>();
-      for (QtbInt left = rows / rows_per_pass * (rows_per_pass / lanes<T> / turn); left > 0; --left) pass<turn>();
+      QtbInt left = rows / rows_per_pass * (rows_per_pass / lanes<T> / turn);
+      if constexpr (!strided && !is_complex<T>)
+        for (; rows >= shortest_asked_for<T> && left > 0; --left) {
+          ask_for_columns();
+          pass<turn>();
+        }
+      for (; left > 0; --left) pass<turn>();
       rows %= rows_per_pass;
     }
     for (; rows > 0; --rows) single<0, count>();

@@ -8,45 +8,66 @@
 // one that may use threads.
 
 #include "blas/kernels/level2/syr.h"
+#include "blas/kernels/level2/sweep.h"
 #include "blas/thread/drivers.h"
 
 namespace qtb::QTB_TIER {
 namespace {
 
-// column[i] += factor*x[first + i].
-inline void add_multiple(QtbInt rows, cfloat factor, const From<cfloat> &x, QtbInt first, cfloat *column) {
+// column[i] += factor*x[i] for rows elements; x is what a routine of the interface expects.
+inline void add_multiple(QtbInt rows, cfloat factor, const cfloat *x, QtbInt incx, cfloat *column) {
   if constexpr (this_tier >= tier_ssse3) {
     const QtbInt one = 1;
-    QTB_TIER_NAME(xcaxpy)(&rows, &factor, x.argument(first, rows), &x.inc, column, &one);
+    QTB_TIER_NAME(xcaxpy)(&rows, &factor, x, &incx, column, &one);
   } else {
     const OneVector<cfloat> work(factor);
-    if (x.inc == 1)
-      update_column(rows, column, work, x.cursor<true>(first));
+    const From<cfloat> from(x, rows, incx);
+    if (incx == 1)
+      update_column(rows, column, work, from.cursor<true>(0));
     else
-      update_column(rows, column, work, x.cursor<false>(first));
+      update_column(rows, column, work, from.cursor<false>(0));
   }
 }
-inline void add_multiple(QtbInt rows, cdouble factor, const From<cdouble> &x, QtbInt first, cdouble *column) {
+inline void add_multiple(QtbInt rows, cdouble factor, const cdouble *x, QtbInt incx, cdouble *column) {
   constexpr auto axpy = this_tier >= tier_ssse3 ? QTB_TIER_NAME(xzaxpy) : qtb_blas_zaxpy;
   const QtbInt one = 1;
-  axpy(&rows, &factor, x.argument(first, rows), &x.inc, column, &one);
+  axpy(&rows, &factor, x, &incx, column, &one);
 }
 
-template <class R>
-[[gnu::noinline]] void update_hermitian(QtbInt columns, StoredColumns<Complex<R>> a, R alpha, From<Complex<R>> x) {
+// Most columns of a small matrix are so short that what goes on around a call counts: the diagonal is done before it,
+// so that nothing is kept across but addresses, and those advance.
+template <bool upper, class R>
+[[gnu::noinline]] void update_hermitian(QtbInt order, StoredColumns<Complex<R>> a, R alpha, const From<Complex<R>> &x) {
   using T = Complex<R>;
-  for (; columns > 0; --columns, a.advance()) {
-    const T of_column = x[a.first + a.diagonal()];
-    T *const diagonal = a.column + a.diagonal();
-    R real = load_single(diagonal).re;
-    if (!is_zero(of_column)) {
+  QtbInt rows = upper ? 0 : order - 1;  // beside the diagonal
+  const T *own = x.base, *others = x.argument(upper ? 0 : 1, rows);
+  // An argument is the end of the vector that is lowest in memory: it moves where that is the one at the diagonal.
+  const QtbInt others_step = upper == (x.inc < 0) ? x.inc : 0;
+  for (; order > 0; --order) {
+    T *const diagonal = upper ? a.column + rows : a.column;
+    const T of_column = load_element(own);
+    R real = load_single(parts(diagonal));
+    if (is_zero(of_column)) {
+      store_element(diagonal, T{real, 0});
+    } else {
       const T factor = alpha * conjugate(of_column);
-      const QtbInt off = a.ends_on_diagonal() ? 0 : 1;
-      if (a.rows > 1) add_multiple(a.rows - 1, factor, x, a.first + off, a.column + off);
       real += real_part(of_column * factor);
+      store_element(diagonal, T{real, 0});
+      if (rows > 0) add_multiple(rows, factor, others, x.inc, upper ? a.column : a.column + 1);
     }
-    store_single(diagonal, T{real, 0});
+    own += x.inc;
+    others += others_step;
+    a.column += a.step;
+    a.step += a.growth;
+    rows += upper ? 1 : -1;
   }
+}
+template <class R>
+void update_hermitian(QtbInt order, const StoredColumns<Complex<R>> &a, R alpha, const From<Complex<R>> &x) {
+  if (a.ends_on_diagonal())
+    update_hermitian<true>(order, a, alpha, x);
+  else
+    update_hermitian<false>(order, a, alpha, x);
 }
 
 template <class T>

@@ -18,6 +18,7 @@
 //   holds_group(size)    whether a group's triangle on the diagonal is stored in full
 #pragma once
 
+#include "blas/kernels/level2/divisor.h"
 #include "blas/kernels/level2/line_vectors.h"
 
 namespace qtb::QTB_TIER {
@@ -30,16 +31,6 @@ template <Task task, Op op, class Triangle>
 constexpr bool goes_forward = (Triangle::upper == (op == Op::none)) == (task == Task::product);
 
 // ---- One group ----
-
-// A complex division is long: it stands once.
-template <class T>
-T quotient(T a, T b) {
-  return a / b;
-}
-template <class R>
-[[gnu::noinline]] Complex<R> quotient(Complex<R> a, Complex<R> b) {
-  return a / b;
-}
 
 template <class T, class Triangle>
 struct GroupTask {
@@ -96,7 +87,7 @@ struct GroupTask {
         Constant<Triangle::upper>(), [&](auto q) __attribute__((always_inline)) {
           any_zero = any_zero || is_zero(now[q.value]);
           if (any_zero) return;
-          if (!unit) now[q.value] = quotient(now[q.value], element<false>(group, j, q.value, q.value));
+          if (!unit) now[q.value] = Divisor<T>(element<false>(group, j, q.value, q.value)).divide(now[q.value]);
           factors[q.value] = -now[q.value];
           repeat<count>([&](auto p) __attribute__((always_inline)) {
             if constexpr (stored<p.value, q.value>)
@@ -150,7 +141,7 @@ struct GroupTask {
             if constexpr (stored<p.value, q.value>)
               now[q.value] = now[q.value] - element<conjugated>(group, j, p.value, q.value) * now[p.value];
           });
-          if (!unit) now[q.value] = quotient(now[q.value], element<conjugated>(group, j, q.value, q.value));
+          if (!unit) now[q.value] = Divisor<T>(element<conjugated>(group, j, q.value, q.value)).divide(now[q.value]);
         });
     store(j, now);
   }

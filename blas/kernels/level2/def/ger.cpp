@@ -15,18 +15,25 @@ void add_multiple(QtbInt m, T factor, const T *x, QtbInt incx, T *column) {
     store_lowest(column + i, f.add_to(load_repeated(column + i), [&](auto) { return load_repeated(x + i * incx); }));
 }
 
-// Four columns at once, each element of x loaded for all of them.
+// Four columns at once, each vector of x loaded for all of them.
 template <class T>
-void add_multiples(QtbInt m, const T (&factors)[4], const T *x, T *a, QtbInt lda) {
-  const Factor<T> f0(factors[0]), f1(factors[1]), f2(factors[2]), f3(factors[3]);
-  for (QtbInt i = 0; i < m; i++) {
-    const Vec<T> element = load_repeated(x + i);
-    const auto add_to = [&](const Factor<T> &f, T *p) { store_lowest(p, add(load_repeated(p), f.times(element))); };
-    add_to(f0, a + i);
-    add_to(f1, a + i + lda);
-    add_to(f2, a + i + 2 * lda);
-    add_to(f3, a + i + 3 * lda);
+[[gnu::noinline]] void add_multiples(QtbInt m, const T (&factors)[4], const T *x, T *a, QtbInt lda) {
+  const Factor<T> f[] = {Factor<T>(factors[0]), Factor<T>(factors[1]), Factor<T>(factors[2]), Factor<T>(factors[3])};
+  T *column[] = {a, a + lda, a + 2 * lda, a + 3 * lda};
+  for (; m >= lanes<T>; m -= lanes<T>, x += lanes<T>) {
+    const Vec<T> elements = load_unaligned(x);
+    repeat<4>([&](auto j) __attribute__((always_inline)) {
+      T *&p = column[j.value];
+      store_unaligned(p, add(load_unaligned(p), f[j.value].times(elements)));
+      p += lanes<T>;
+    });
   }
+  if (m == 0) return;
+  const Vec<T> element = load_repeated(x);
+  repeat<4>([&](auto j) __attribute__((always_inline)) {
+    T *const p = column[j.value];
+    store_lowest(p, add(load_repeated(p), f[j.value].times(element)));
+  });
 }
 
 template <class T, bool conjugated>
