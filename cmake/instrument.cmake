@@ -7,8 +7,9 @@
 set(QTB_INSTRUMENT "" CACHE STRING "asan, tsan, fuzz, coverage or nothing")
 set_property(CACHE QTB_INSTRUMENT PROPERTY STRINGS "" asan tsan fuzz coverage)
 
-# The environment that every test gets.
-set(QTB_TEST_ENVIRONMENT "")
+# The environment that every test gets. Idle threads of the OpenMP runtime sleep: several tests run at once, and teams
+# that wait actively would keep each other from running.
+set(QTB_TEST_ENVIRONMENT "OMP_WAIT_POLICY=passive")
 
 # The library is built without the type information that the check of polymorphic types reads, and takes operands at any
 # address, also between elements, as the processor does.
@@ -28,10 +29,8 @@ elseif(QTB_INSTRUMENT STREQUAL "tsan")
   add_link_options(-fsanitize=thread)
   cmake_path(GET OpenMP_omp_LIBRARY PARENT_PATH openmp_folder)
   find_library(QTB_ARCHER archer HINTS ${openmp_folder} PATHS /usr/lib/llvm-14/lib REQUIRED)
-  # The OpenMP runtime itself is not instrumented: what it does to the program's memory is not a race. Its idle threads
-  # sleep, or the many teams of a test that run slowly here would keep each other from running at all.
-  list(APPEND QTB_TEST_ENVIRONMENT "TSAN_OPTIONS=ignore_noninstrumented_modules=1" "OMP_TOOL_LIBRARIES=${QTB_ARCHER}"
-    "OMP_WAIT_POLICY=passive")
+  # The OpenMP runtime itself is not instrumented: what it does to the program's memory is not a race.
+  list(APPEND QTB_TEST_ENVIRONMENT "TSAN_OPTIONS=ignore_noninstrumented_modules=1" "OMP_TOOL_LIBRARIES=${QTB_ARCHER}")
 elseif(QTB_INSTRUMENT STREQUAL "fuzz")
   add_compile_options(${qtb_asan} -fsanitize=fuzzer-no-link)
   add_link_options(${qtb_asan})

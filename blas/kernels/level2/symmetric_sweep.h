@@ -24,9 +24,9 @@ namespace {
 
 constexpr QtbInt shortest_mirrored = 9;  // rows from which on vectors pay
 
-// Columns of so many rows belong to a matrix beyond the caches: a pass asks for what it will need so far ahead.
-template <class T>
-constexpr QtbInt shortest_asked_for = 8192 / static_cast<QtbInt>(sizeof(T));
+// Columns of so many rows of doubles belong to a matrix beyond the caches: a pass asks for what it will need so far
+// ahead. With floats the passes are no slower than the memory.
+constexpr QtbInt shortest_asked_for = 1024;
 constexpr QtbInt bytes_ahead = 512;
 
 // Vectors per turn of the loop over passes: where a vector takes many instructions, a pass takes several turns.
@@ -108,8 +108,8 @@ struct MirroredRows {
       if constexpr (peels)
         for (; phase(y.p) != 0; --rows) single<0, count>();
       QtbInt left = rows / rows_per_pass * (rows_per_pass / lanes<T> / turn);
-      if constexpr (!strided && !is_complex<T>)
-        for (; rows >= shortest_asked_for<T> && left > 0; --left) {
+      if constexpr (!strided && !is_complex<T> && sizeof(T) == sizeof(double))
+        for (; rows >= shortest_asked_for && left > 0; --left) {
           ask_for_columns();
           pass<turn>();
         }

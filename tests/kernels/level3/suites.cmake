@@ -20,8 +20,8 @@ foreach(name sse42_xdsyrk_body sse42_xdsyrk_n4 sse42_xssyrk_body sse42_xcsyrk_bo
   target_link_options(rank_k_splits_test PRIVATE -Wl,--wrap=qtb_blas_${name})
 endforeach()
 qtb_add_test(rank_k_test SOURCES kernels/level3/rank_k_test.cpp LIBRARIES qtb_static qtb_platform_static SHARDS 3)
-qtb_add_test(triangle_pieces_test SOURCES kernels/level3/triangle_pieces_test.cpp LIBRARIES qtb_static qtb_platform_static
-  SHARDS 2)
+qtb_add_test(triangle_pieces_test SOURCES kernels/level3/triangle_pieces_test.cpp LIBRARIES qtb_static
+  qtb_platform_static SHARDS 2)
 qtb_add_test(symm_test SOURCES kernels/level3/symm_test.cpp LIBRARIES qtb_static qtb_platform_fake
   RUNS ${gemm_processors} SHARDS 5)
 qtb_add_test(syr2k_test SOURCES kernels/level3/syr2k_test.cpp LIBRARIES qtb_static qtb_platform_fake

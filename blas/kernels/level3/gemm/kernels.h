@@ -20,7 +20,7 @@
       T *stage
 
 extern "C" {
-#define QTB_INNER_KERNEL(tier, T, family, any, aligned, stage, step)         \
+#define QTB_INNER_KERNEL(tier, T, family, any, aligned, stage, step)   \
   QTB_HIDDEN void qtb_blas_##tier##_##any(QTB_INNER_KERNEL_PARAMS(T)); \
   QTB_HIDDEN void qtb_blas_##tier##_##aligned(QTB_INNER_KERNEL_PARAMS(T));
 #define QTB_IN_PLACE_KERNEL(tier, T, family, any, aligned)                \
@@ -46,7 +46,7 @@ struct KernelRecord {
 // Every tier's build sees the whole list and takes its own.
 template <ProcessorTier tier, class T, Family family>
 constexpr KernelRecord<InnerProcedure<T>> inner_kernel_in{};
-#define QTB_INNER_KERNEL(tier, T, family, any, aligned, stage, step)                                  \
+#define QTB_INNER_KERNEL(tier, T, family, any, aligned, stage, step)                            \
   template <>                                                                                   \
   constexpr KernelRecord<InnerProcedure<T>> inner_kernel_in<tier_##tier, T, Family::family> = { \
       qtb_blas_##tier##_##any, qtb_blas_##tier##_##aligned, stage};

@@ -8,20 +8,13 @@
 #pragma once
 
 #include "blas/kernels/level3/gemm/family.h"
+#include "blas/kernels/level3/gemm/tier_gemm.h"
 #include "blas/kernels/level3/triangular/unblocked.h"
 
 namespace qtb::QTB_TIER {
 namespace {
 
 constexpr QtbInt outer_block = 1024;
-
-template <class T>
-constexpr GemmProcedure<T> *gemm_of_tier = nullptr;
-#define QTB_NAME_GEMM(t, T) \
-  template <>               \
-  constexpr GemmProcedure<T> *gemm_of_tier<T> = QTB_TIER_NAME(x##t##gemm);
-QTB_PARTS(QTB_NAME_GEMM)
-#undef QTB_NAME_GEMM
 
 // The options of the products; their first letters alone are read.
 constexpr const char *product_options[] = {"No transpose", "Transpose", "Conjugate transpose"};
@@ -52,11 +45,11 @@ struct Nested {
     set_real(one, 1);
     set_real(factor, solves ? -1 : 1);
     if (form.left)
-      gemm_of_tier<T>(op, plain, &to_count, &others, &from_count, &factor, panel, &lda, b_at(from), &ldb, &one,
-                      b_at(to), &ldb);
+      tier_gemm<T>(op, plain, &to_count, &others, &from_count, &factor, panel, &lda, b_at(from), &ldb, &one, b_at(to),
+                   &ldb);
     else
-      gemm_of_tier<T>(plain, op, &others, &to_count, &from_count, &factor, b_at(from), &ldb, panel, &lda, &one,
-                      b_at(to), &ldb);
+      tier_gemm<T>(plain, op, &others, &to_count, &from_count, &factor, b_at(from), &ldb, panel, &lda, &one, b_at(to),
+                   &ldb);
   }
   static void set_real(T &v, Real<T> value) {
     if constexpr (is_complex<T>)

@@ -6,6 +6,7 @@
 #pragma once
 
 #include "blas/kernels/level3/gemm/buffers.h"
+#include "blas/kernels/level3/gemm/tier_gemm.h"
 #include "blas/kernels/level3/triangular/base.h"
 #include "blas/kernels/level3/triangular/small_right.h"
 #include "service/cpu.h"
@@ -30,15 +31,6 @@ using levels::LevelRow;
 using levels::Sse41;
 using levels::TriLevel;
 using levels::whole;
-
-// The product of this tier, by type.
-template <class T>
-constexpr GemmProcedure<T> *gemm_slot = nullptr;
-#define QTB_NAME_GEMM(t, T) \
-  template <>               \
-  constexpr GemmProcedure<T> *gemm_slot<T> = QTB_TIER_NAME(x##t##gemm);
-QTB_PARTS(QTB_NAME_GEMM)
-#undef QTB_NAME_GEMM
 
 // The named procedures by routine and type.
 template <class T>
@@ -89,10 +81,10 @@ void run_panel(const TriForm &form, QtbInt begin, QtbInt width, QtbInt size, Qtb
   const T *const panel = a + first + begin * lda;
   T *const block = b + begin * step, *const rest = b + first * step;
   if constexpr (left)
-    gemm_slot<T>(op, letters, &to, &others, &from, &factor, panel, &lda, spread ? block : rest, &ldb, &one,
+    tier_gemm<T>(op, letters, &to, &others, &from, &factor, panel, &lda, spread ? block : rest, &ldb, &one,
                  spread ? rest : block, &ldb);
   else
-    gemm_slot<T>(letters, op, &others, &to, &from, &factor, spread ? block : rest, &ldb, panel, &lda, &one,
+    tier_gemm<T>(letters, op, &others, &to, &from, &factor, spread ? block : rest, &ldb, panel, &lda, &one,
                  spread ? rest : block, &ldb);
 }
 
