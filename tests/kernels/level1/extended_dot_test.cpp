@@ -37,9 +37,13 @@ TEST(dsdot, and_sdsdot_are_within_their_bounds_at_every_place) {
           Placed<float> px(arena_x, x, n, incx, Flush::back, offset);
           Placed<float> py(arena_y, y, n, incy, Flush::back, (5 * offset) % 16);
           in_every_tier([&](int tier) {
-            FiniteOnly guard;
-            const double got = dsdot[tier](&n, px.data(), &incx, py.data(), &incy);
-            const float got_single = sdsdot[tier](&n, &sb, px.data(), &incx, py.data(), &incy);
+            double got;
+            float got_single;
+            {
+              const FiniteOnly guard;
+              got = dsdot[tier](&n, px.data(), &incx, py.data(), &incy);
+              got_single = sdsdot[tier](&n, &sb, px.data(), &incx, py.data(), &incy);
+            }
             const double r = error_ratio(got, sum.value, sum.gauge, sum.roundings);
             const double r_single = qtb::reference::ratio_of_rounded(got_single, sum_and_sb);
             TallyReport::of("dsdot").within(tier, r);
