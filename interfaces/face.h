@@ -3,7 +3,8 @@
 // A face is compiled once per convention. The build defines
 //   QTB_FACE_INT      the integer of the interface: std::int32_t or std::int64_t
 //   QTB_FACE_SUFFIX   what stands behind a routine's name and ahead of Fortran's underscore: nothing or _64
-// A routine takes every argument by a pointer, integers of 64 bits; an Argument makes that of what a caller gave.
+// A routine takes every argument by a pointer, integers of 64 bits; an Argument makes that of what a caller gave. No
+// rule is judged before: a null integer stays null, so that what is wrong ahead of it is reported and not met here.
 #pragma once
 
 #include <cstddef>
@@ -53,7 +54,8 @@ class Argument<const T *> {
   Argument(const T *given) : pointer(given) {}
   Argument(const void *given) : pointer(static_cast<const T *>(given)) {}
   Argument(T given) requires std::is_arithmetic_v<T> : copy(given), pointer(&copy) {}
-  Argument(const std::int32_t *given) requires std::is_same_v<T, QtbInt> : copy(*given), pointer(&copy) {}
+  Argument(const std::int32_t *given) requires std::is_same_v<T, QtbInt>
+      : copy(given == nullptr ? 0 : *given), pointer(given == nullptr ? nullptr : &copy) {}
   Argument(const Argument &) = delete;
   operator const T *() const { return pointer; }
 

@@ -2,6 +2,7 @@
 #include "interfaces/reports.h"
 
 #include <algorithm>
+#include <atomic>
 #include <cstdarg>
 #include <cstdio>
 #include <cstring>
@@ -17,6 +18,27 @@ namespace qtb::face {
 namespace {
 
 constexpr std::size_t name_limit = 32;  // of a routine, in an array of characters
+
+// What this thread's call told the reporters. The reporters of this library read it here, since another thread may
+// report at the same time; a program's own find it in the two variables that they have always had.
+struct Caller {
+  bool from_c = false, row_major = false;
+};
+thread_local Caller caller;
+
+void publish(const Caller &now) {
+  caller = now;
+  std::atomic_ref(QTB_CALL_FROM_C).store(now.from_c, std::memory_order_relaxed);
+  std::atomic_ref(QTB_ROW_MAJOR).store(now.row_major, std::memory_order_relaxed);
+}
+
+// The C face reports as long as it lives.
+class Report {
+ public:
+  explicit Report(bool row_major) { publish({true, row_major}); }
+  ~Report() { publish({}); }
+  Report(const Report &) = delete;
+};
 
 // Positions of a row-major call: what stands at one place of the call on transposes stands at the other of the
 // caller's, counted with the layout. The first row whose name is part of the routine's holds.
@@ -70,21 +92,15 @@ void print(const char *name, std::int64_t number, std::int32_t length) {
 
 void report_rule(bool row_major, const char *fortran_name, QtbInt number) {
   const Int info = static_cast<Int>(number);
-  QTB_CALL_FROM_C = 1;
-  QTB_ROW_MAJOR = row_major;
+  const Report report(row_major);
   QTB_FORTRAN_NAME(xerbla)(fortran_name, &info, std::strlen(fortran_name));
-  QTB_CALL_FROM_C = 0;
-  QTB_ROW_MAJOR = 0;
 }
 
 void report_option(bool row_major, int position, const char *c_name, const char *what, int value) {
-  QTB_CALL_FROM_C = 1;
-  QTB_ROW_MAJOR = row_major;
+  const Report report(row_major);
   char text[64];
   std::snprintf(text, sizeof text, "Illegal %s setting, %d\n", what, value);
   QTB_C_NAME(xerbla)(position, c_name, "%s", text);
-  QTB_CALL_FROM_C = 0;
-  QTB_ROW_MAJOR = 0;
 }
 
 void report_no_memory(const char *c_name) {
@@ -100,7 +116,7 @@ int QTB_CALL_FROM_C = 0;
 int QTB_ROW_MAJOR = 0;
 
 void QTB_FORTRAN_NAME(xerbla)(const char *name, const QTB_FACE_INT *info, std::size_t length) {
-  if (QTB_CALL_FROM_C != 0) return QTB_C_NAME(xerbla)(*info + 1, qtb::face::CName(name, length).text, "");
+  if (qtb::face::caller.from_c) return QTB_C_NAME(xerbla)(*info + 1, qtb::face::CName(name, length).text, "");
   qtb::face::print(name, *info, static_cast<std::int32_t>(std::min(length, qtb::face::name_limit)));
 }
 
@@ -119,7 +135,7 @@ QTB_FACE_INT QTB_FORTRAN_NAME(lsame)(const char *a, const char *b) { return qtb:
 
 void QTB_C_NAME(xerbla)(QTB_FACE_INT position, const char *routine, const char *format, ...) {
   std::int32_t shown = static_cast<std::int32_t>(position);
-  if (QTB_ROW_MAJOR != 0) shown = qtb::face::caller_position(routine, shown);
+  if (qtb::face::caller.row_major) shown = qtb::face::caller_position(routine, shown);
   qtb::face::print(routine, shown, -1);
   if (format == nullptr || *format == '\0') return;
   std::va_list arguments;

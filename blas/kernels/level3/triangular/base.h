@@ -46,18 +46,17 @@ void run_packed(const TriForm &form, QtbInt n, QtbInt others, T alpha, const T *
 template <Routine routine, bool left, class T>
 void run_rectangle(const TriForm &form, QtbInt t, QtbInt rest, QtbInt others, T alpha, const T *a, QtbInt lda, T *b,
                    QtbInt ldb) {
-  static constexpr char letters[] = {'N', 'T', 'C'};
-  const char *const op = &letters[static_cast<int>(form.op)];
+  const char *const op = letter(form.op), *const none = letter(Op::none);
   const T *const rectangle = form.upper ? a + t * lda : a + t;
   T *const far = b + t * (left ? 1 : ldb);
-  const T one = one_element<T>(), factor = routine == Routine::trsm ? -one : alpha;
+  const T factor = routine == Routine::trsm ? -one<T> : alpha;
   const bool to_near = acts_as_upper(left, form.upper, form.op == Op::none);
   const QtbInt to = to_near ? t : rest, from = to_near ? rest : t;
   if constexpr (left)
-    small_path<T>(op, letters, &to, &others, &from, &factor, rectangle, &lda, to_near ? far : b, &ldb, &one,
+    small_path<T>(op, none, &to, &others, &from, &factor, rectangle, &lda, to_near ? far : b, &ldb, &one<T>,
                   to_near ? b : far, &ldb);
   else
-    small_path<T>(letters, op, &others, &to, &from, &factor, to_near ? far : b, &ldb, rectangle, &lda, &one,
+    small_path<T>(none, op, &others, &to, &from, &factor, to_near ? far : b, &ldb, rectangle, &lda, &one<T>,
                   to_near ? b : far, &ldb);
 }
 

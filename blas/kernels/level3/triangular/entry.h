@@ -43,7 +43,6 @@ QTB_FUNCTION(trmm, T, triangular) {
   const TriForm form{is_letter(*side, 'L'), is_letter(*uplo, 'U'), read_op<T>(transa), is_letter(*diag, 'U')};
   constexpr auto request = levels::find_buffers(routine, this_tier);
   const GemmBuffers<T> buffers = get_buffers<T, Family::base>(request.mb, request.nb, request.kb, 0);
-  const T one = one_element<T>();
   if (routine == Routine::trmm && !form.left) {
     if (*n <= most_small_columns)
       trmm_small_right(form, *m, *n, *alpha, a, *lda, b, *ldb);
@@ -52,9 +51,9 @@ QTB_FUNCTION(trmm, T, triangular) {
   } else {
     if (!is_one(*alpha)) scale_columns<T>(m, n, alpha, b, ldb);
     if (form.left)
-      begin_walk<routine, 'L'>(form, diag, m, n, &one, a, lda, b, ldb, buffers);
+      begin_walk<routine, 'L'>(form, diag, m, n, &one<T>, a, lda, b, ldb, buffers);
     else
-      begin_walk<routine, 'R'>(form, diag, m, n, &one, a, lda, b, ldb, buffers);
+      begin_walk<routine, 'R'>(form, diag, m, n, &one<T>, a, lda, b, ldb, buffers);
   }
   free_buffers(buffers);
 }

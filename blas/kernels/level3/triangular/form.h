@@ -1,7 +1,7 @@
 // TriForm: which of its cases a triangular product or solve is.
 #pragma once
 
-#include "blas/kernels/element.h"
+#include "blas/kernels/level3/gemm/tier_gemm.h"
 
 namespace qtb::QTB_TIER {
 namespace {
@@ -28,9 +28,8 @@ using TriProcedure = QTB_FUNCTION_TYPE(trmm, T);
 template <class T>
 void call_with_form(TriProcedure<T> *procedure, const TriForm &form, QtbInt m, QtbInt n, T alpha, const T *a,
                     QtbInt lda, T *b, QtbInt ldb) {
-  static constexpr char ops[] = {'N', 'T', 'C'};
-  procedure(form.left ? "L" : "R", form.upper ? "U" : "L", &ops[static_cast<int>(form.op)], form.unit ? "U" : "N", &m,
-            &n, &alpha, a, &lda, b, &ldb);
+  procedure(form.left ? "L" : "R", form.upper ? "U" : "L", letter(form.op), form.unit ? "U" : "N", &m, &n,
+            &alpha, a, &lda, b, &ldb);
 }
 
 }  // namespace

@@ -8,6 +8,7 @@
 #pragma once
 
 #include "blas/kernels/level3/gemm/family.h"
+#include "blas/kernels/level3/gemm/parts.h"
 #include "blas/kernels/level3/gemm/tier_gemm.h"
 #include "blas/kernels/level3/triangular/unblocked.h"
 
@@ -15,9 +16,6 @@ namespace qtb::QTB_TIER {
 namespace {
 
 constexpr QtbInt outer_block = 1024;
-
-// The options of the products; their first letters alone are read.
-constexpr const char *product_options[] = {"No transpose", "Transpose", "Conjugate transpose"};
 
 // One call: the triangle and B.
 template <bool solves, class T>
@@ -37,25 +35,14 @@ struct Nested {
   // What the rows or columns from to count on of B get from those from from count on.
   void rectangle(QtbInt to, QtbInt to_count, QtbInt from, QtbInt from_count) const {
     if (to_count == 0 || from_count == 0) return;
-    const char *const op = product_options[static_cast<int>(form.op)], *const plain = product_options[0];
     // Of op(T) in front of B, rows to and columns from; of op(T) behind it the other way round.
     const QtbInt row = form.left == (form.op == Op::none) ? to : from, column = row == to ? from : to;
     const T *const panel = a + row + column * lda;
-    T factor{}, one{};
-    set_real(one, 1);
-    set_real(factor, solves ? -1 : 1);
+    const T factor = solves ? -one<T> : one<T>;
     if (form.left)
-      tier_gemm<T>(op, plain, &to_count, &others, &from_count, &factor, panel, &lda, b_at(from), &ldb, &one, b_at(to),
-                   &ldb);
+      gemm(form.op, Op::none, to_count, others, from_count, factor, panel, lda, b_at(from), ldb, one<T>, b_at(to), ldb);
     else
-      tier_gemm<T>(plain, op, &others, &to_count, &from_count, &factor, b_at(from), &ldb, panel, &lda, &one, b_at(to),
-                   &ldb);
-  }
-  static void set_real(T &v, Real<T> value) {
-    if constexpr (is_complex<T>)
-      v.re = value;
-    else
-      v = value;
+      gemm(Op::none, form.op, others, to_count, from_count, factor, b_at(from), ldb, panel, lda, one<T>, b_at(to), ldb);
   }
   void diagonal(QtbInt begin, QtbInt count) const {
     const QtbInt m = form.left ? count : others, n = form.left ? others : count;
@@ -63,9 +50,7 @@ struct Nested {
     if constexpr (solves) {
       trsm_unblocked(form, m, n, block, lda, b_at(begin), ldb);
     } else {
-      T one{};
-      set_real(one, 1);
-      trmm_unblocked(form, m, n, one, block, lda, b_at(begin), ldb);
+      trmm_unblocked(form, m, n, one<T>, block, lda, b_at(begin), ldb);
     }
   }
 

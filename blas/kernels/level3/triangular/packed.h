@@ -7,6 +7,7 @@
 // pair of doubles. A unit diagonal is not read. Everything lies on vector boundaries.
 #pragma once
 
+#include "blas/kernels/level3/gemm/parts.h"
 #include "blas/kernels/level3/triangular/levels.h"
 #include "blas/kernels/level3/triangular/tile.h"
 
@@ -37,14 +38,6 @@ const T *element_at(const T *a, QtbInt lda, QtbInt i, QtbInt k) {
 }
 
 template <class T>
-T one_element() {
-  if constexpr (is_complex<T>)
-    return {1, 0};
-  else
-    return 1;
-}
-
-template <class T>
 void set_element(Real<T> *tile, QtbInt row, QtbInt column, T v) {
   Real<T> *at = tile + column * row_length<T, packed_width> + row;
   at[0] = real_part(v);
@@ -66,7 +59,7 @@ void pack_diagonal_tile(const PackedForm<T> &form, const T *a, QtbInt lda, Real<
     if constexpr (routine == Routine::trmm) {
       set_element(out, k, k, form.unit ? form.alpha : value(k, k));
     } else {
-      const T reciprocal = form.unit ? one_element<T>() : one_element<T>() / value(k, k);
+      const T reciprocal = form.unit ? one<T> : one<T> / value(k, k);
       Real<T> *at = out + packed_tile<T> + k * planes<T> * lanes<Real<T>>;
       store_aligned(at, broadcast(real_part(reciprocal)));
       if constexpr (is_complex<T>) store_aligned(at + lanes<Real<T>>, broadcast(reciprocal.im));

@@ -71,21 +71,19 @@ void run_block(const TriForm &form, QtbInt m, QtbInt n, T alpha, const T *a, Qtb
 template <Routine routine, bool left, class T>
 void run_panel(const TriForm &form, QtbInt begin, QtbInt width, QtbInt size, QtbInt others, T alpha, const T *a,
                QtbInt lda, T *b, QtbInt ldb) {
-  static constexpr char letters[] = {'N', 'T', 'C'};
   const QtbInt first = form.upper ? 0 : begin + width, count = form.upper ? begin : size - first;
   if (count == 0) return;
-  const char *const op = &letters[static_cast<int>(form.op)];
-  const T one = one_element<T>(), factor = routine == Routine::trsm ? -one : alpha;
+  const T factor = routine == Routine::trsm ? -one<T> : alpha;
   const bool spread = spreads(left, form.op == Op::none);
   const QtbInt step = left ? 1 : ldb, to = spread ? count : width, from = spread ? width : count;
   const T *const panel = a + first + begin * lda;
   T *const block = b + begin * step, *const rest = b + first * step;
   if constexpr (left)
-    tier_gemm<T>(op, letters, &to, &others, &from, &factor, panel, &lda, spread ? block : rest, &ldb, &one,
-                 spread ? rest : block, &ldb);
+    gemm(form.op, Op::none, to, others, from, factor, panel, lda, spread ? block : rest, ldb, one<T>,
+         spread ? rest : block, ldb);
   else
-    tier_gemm<T>(letters, op, &others, &to, &from, &factor, spread ? block : rest, &ldb, panel, &lda, &one,
-                 spread ? rest : block, &ldb);
+    gemm(Op::none, form.op, others, to, from, factor, spread ? block : rest, ldb, panel, lda, one<T>,
+         spread ? rest : block, ldb);
 }
 
 template <Routine routine, bool left, class T>
@@ -130,7 +128,7 @@ void level_walk(QTB_LEVEL_PARAMS(T)) {
 template <Routine routine, class T>
 void base_left(QTB_BASE_PARAMS(T)) {
   const TriForm form = form_of_flags<true, T>(*not_trans, *upper, *is_transpose, *diag);
-  run_base<routine, true>(form, *m, *n, one_element<T>(), a, *lda, b, *ldb, a_buffer, b_buffer);
+  run_base<routine, true>(form, *m, *n, one<T>, a, *lda, b, *ldb, a_buffer, b_buffer);
 }
 
 }  // namespace

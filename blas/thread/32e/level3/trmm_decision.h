@@ -55,26 +55,26 @@ template <class T>
 struct TrmmRules;  // left, right
 
 // clang-format off
-//                              unit from | triangle    slab          share             | both               sum              triangle         slab      share
+//                                   unit from triangle     slab        share             both triangle both slab sum        triangle  slab      share
 template <>
 struct TrmmRules<double> {
-  static constexpr TrmmRule left  = {4, 513, 0.00390625,  0.0078125,  ShareOf::rounded, below(1), below(6), up_to(6),  no_limit,        no_limit, 0};
-  static constexpr TrmmRule right = {4,   0, 0.00390625,  0.0078125,  ShareOf::rounded, no_limit, no_limit, up_to(10), up_to(1), below(4), 0};
+  static constexpr TrmmRule left  = {4,   513, 0.00390625,  0.0078125,  ShareOf::rounded, below(1),     below(6), up_to(6),  no_limit, no_limit, 0};
+  static constexpr TrmmRule right = {4,   0,   0.00390625,  0.0078125,  ShareOf::rounded, no_limit,     no_limit, up_to(10), up_to(1), below(4), 0};
 };
 template <>
 struct TrmmRules<float> {
   static constexpr TrmmRule left  = TrmmRules<double>::left;
-  static constexpr TrmmRule right = {8,   0, 0.001953125, 0.00390625, ShareOf::rounded, no_limit, no_limit, below(8),         no_limit,        no_limit, 16};
+  static constexpr TrmmRule right = {8,   0,   0.001953125, 0.00390625, ShareOf::rounded, no_limit,     no_limit, below(8),  no_limit, no_limit, 16};
 };
 template <>
 struct TrmmRules<cfloat> {
-  static constexpr TrmmRule left  = {1,   0, 0.00390625,  0.0078125,  ShareOf::rounded, below(1), below(2), no_limit,         no_limit,        no_limit, 0};
-  static constexpr TrmmRule right = {4,   0, 0,           0.0078125,  ShareOf::whole,   no_limit, no_limit, no_limit,         no_limit,        below(3), 5};
+  static constexpr TrmmRule left  = {1,   0,   0.00390625,  0.0078125,  ShareOf::rounded, below(1),     below(2), no_limit,  no_limit, no_limit, 0};
+  static constexpr TrmmRule right = {4,   0,   0,           0.0078125,  ShareOf::whole,   no_limit,     no_limit, no_limit,  no_limit, below(3), 5};
 };
 template <>
 struct TrmmRules<cdouble> {
-  static constexpr TrmmRule left  = {1,   0, 0.0078125,   0.015625,   ShareOf::rounded, below(1), below(2), no_limit,         no_limit,        no_limit, 0};
-  static constexpr TrmmRule right = {1,   0, 0,           0.015625,   ShareOf::whole,   no_limit, no_limit, no_limit,         no_limit,        below(3), 3};
+  static constexpr TrmmRule left  = {1,   0,   0.0078125,   0.015625,   ShareOf::rounded, below(1),     below(2), no_limit,  no_limit, no_limit, 0};
+  static constexpr TrmmRule right = {1,   0,   0,           0.015625,   ShareOf::whole,   no_limit,     no_limit, no_limit,  no_limit, below(3), 3};
 };
 // clang-format on
 
