@@ -18,7 +18,8 @@
 #   BENCH_TIERS            on which tiers (default: all)
 #   BENCH_LONG             with any value, square products of sizes 2000 and 4000 too, and Level 2 with every option at
 #                          every size
-#   BENCH_QUICK            with any value, Level 2 at few sizes with few options, in about a minute and a half a tier
+#   BENCH_QUICK            with any value, Level 2 and Level 3 at few sizes with few options, in about a minute and a
+#                          half a tier and in four
 #   BENCH_FILTER           regular expression of the Level-1 cases (default: all)
 #   BENCH_MIN_TIME         seconds per Level-1 case (default 0.005)
 #   PEER                   path of another BLAS shared library to compare with; PEER2 and PEER3 more of them
@@ -191,7 +192,24 @@ part_threads() {
 # The routines of Level 3 that cut their work into products.
 beside_gemm=trsm,trmm,symm,hemm,syrk,herk,syr2k
 
+quick_level3() {
+  heading "Level 3 beside gemm, one thread${PEER:+, beside $PEER}"
+  beside_peer level3 --threads 1 --routines "gemm,$beside_gemm" --options NN,LUNN,RLTN,LU,UN --sizes 8,32,100,300 \
+    --turns 5 --seconds 0.03
+  beside_peer level3-large --threads 1 --routines "gemm,$beside_gemm" --options NN,LUNN,LU,UN --sizes 1000 --turns 3 \
+    --seconds 0.03
+  beside_peer level3-flat --threads 1 --routines "$beside_gemm" --options LUNN,LL,LN --shapes 1000x4,4x1000 --turns 5 \
+    --seconds 0.03
+  heading "Level 3 beside gemm, $threads threads, beside one"
+  compared level3-threads-serial --threads "$threads" --routines "$beside_gemm" --options LUNN,LL,LN \
+    --sizes 100,300,1000 --peer self --peer-setting QTB_NUM_THREADS=1 --turns 3 --seconds 0.03
+}
+
 part_level3() {
+  if [ -n "${BENCH_QUICK:-}" ]; then
+    quick_level3
+    return 0
+  fi
   set -- --turns 7 --seconds 0.1
   heading "Level 3 beside gemm, one thread${PEER:+, beside $PEER}"
   beside_peer level3 --threads 1 --routines "gemm,$beside_gemm" --options NN,LUNN,LLTN,RUTN,RLNU,LU,RL,UN,LT,LC \

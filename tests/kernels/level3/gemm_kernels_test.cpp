@@ -15,7 +15,7 @@ using Kernel = void(QtbInt m, QtbInt n, QtbInt kp, const T *ap, QtbInt ldap, con
 
 extern "C" {
 #define QTB_INNER_KERNEL(tier, T, family, any, aligned, stage, step) \
-  QTB_HIDDEN Kernel<T> qtb_blas_##tier##_##any;                \
+  QTB_HIDDEN Kernel<T> qtb_blas_##tier##_##any;                      \
   QTB_HIDDEN Kernel<T> qtb_blas_##tier##_##aligned;
 #include "blas/kernels/level3/gemm/kernels.def"
 }

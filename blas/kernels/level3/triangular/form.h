@@ -28,8 +28,8 @@ using TriProcedure = QTB_FUNCTION_TYPE(trmm, T);
 template <class T>
 void call_with_form(TriProcedure<T> *procedure, const TriForm &form, QtbInt m, QtbInt n, T alpha, const T *a,
                     QtbInt lda, T *b, QtbInt ldb) {
-  procedure(form.left ? "L" : "R", form.upper ? "U" : "L", letter(form.op), form.unit ? "U" : "N", &m, &n,
-            &alpha, a, &lda, b, &ldb);
+  procedure(form.left ? "L" : "R", form.upper ? "U" : "L", letter(form.op), form.unit ? "U" : "N", &m, &n, &alpha, a,
+            &lda, b, &ldb);
 }
 
 }  // namespace
