@@ -6,7 +6,7 @@
 #pragma once
 
 #include "blas/kernels/level3/gemm/small.h"
-#include "blas/kernels/level3/triangular/divisor.h"
+#include "blas/kernels/level3/triangular/vector_divisor.h"
 
 namespace qtb::QTB_TIER {
 namespace {
@@ -77,7 +77,7 @@ struct Corner<false, T, n> {
 template <class T, int n>
 struct Corner<true, T, n> {
   Coefficient<T> c[n][n];
-  Divisor<T> divisor[n];
+  VectorDivisor<T> divisor[n];
   bool unit;
 
   [[gnu::noinline]] void load(const ByElement<T> &t, bool unit_diagonal, const T *) {

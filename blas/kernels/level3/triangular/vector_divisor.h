@@ -1,4 +1,4 @@
-// Divisor: what vectors of elements are divided by.
+// VectorDivisor: what vectors of elements are divided by.
 //
 // Single complex quotients are computed in double precision, by the squared magnitude, and rounded once. Double complex
 // ones are scaled by the larger part of the divisor, so that no square overflows: the ratio of the parts is taken once,
@@ -14,14 +14,14 @@ inline __m128 div(__m128 a, __m128 b) { return _mm_div_ps(a, b); }
 inline __m128d div(__m128d a, __m128d b) { return _mm_div_pd(a, b); }
 
 template <class T>
-struct Divisor {
+struct VectorDivisor {
   Vec<T> value;
   void set(T v) { value = broadcast(v); }
   Vec<T> divide(Vec<T> x) const { return div(x, value); }
 };
 
 template <>
-struct Divisor<cfloat> {
+struct VectorDivisor<cfloat> {
   __m128d re, im, square;
   void set(cfloat v) {
     const double real = v.re, imaginary = v.im;
@@ -39,7 +39,7 @@ struct Divisor<cfloat> {
 
 // (x*own + swapped(x)*other) / sum, where one of the factors is 1 and the other the ratio of the parts.
 template <>
-struct Divisor<cdouble> {
+struct VectorDivisor<cdouble> {
   __m128d own, other, sum;
   void set(cdouble v) {
     const double re = v.re < 0 ? -v.re : v.re, im = v.im < 0 ? -v.im : v.im;
