@@ -7,8 +7,10 @@
 
 #include <atomic>
 #include <cstdlib>
+#include <cstring>
 
 #include "service/cpuid.h"
+#include "service/messages.h"
 #include "service/platform/platform.h"
 
 namespace {
@@ -22,6 +24,8 @@ std::atomic<std::int32_t> asked_tiers{-1};        // -1 not looked at; else thos
 std::atomic<std::int32_t> sse41_cached{-1};       // -1 until asked
 std::atomic<std::int32_t> amd_family_cached{-1};  // -1 until tested
 
+std::atomic<bool> tier_warned{false};  // that QTB_TIER has no effect
+
 constexpr auto relaxed = std::memory_order_relaxed;
 
 std::uint32_t feature_bits() { return platform_cpuid(leaf_features, 0).ecx; }
@@ -31,10 +35,11 @@ int qtb_serv_cpu_has_baseline() { return 1; }
 
 enum Taken { by_itself, if_asked };
 struct TierTest {
+  const char *name;
   int (*passes)();
   Taken taken;
 };
-#define QTB_TIER_TEST(tier, TIER, flags, processor, taken, ...) {qtb_serv_cpu_has_##processor, taken},
+#define QTB_TIER_TEST(tier, TIER, flags, processor, taken, ...) {#tier, qtb_serv_cpu_has_##processor, taken},
 constexpr TierTest tier_tests[tier_count] = {QTB_TIER_ROWS(QTB_TIER_TEST)};
 #undef QTB_TIER_TEST
 
@@ -48,8 +53,10 @@ std::int32_t tier_override() {
   return number > 0 && number <= qtb::largest_asked_tier ? number : no_override;
 }
 
-// The test of avx takes either of two bits; a library that takes the tier unasked wants both, and the registers saved.
-bool may_take_unasked(std::int32_t tier) {
+// Whether the processor and the operating system have what the tier needs. The test of avx takes either of two bits;
+// here both are wanted, and that the registers are saved.
+bool can_run(std::int32_t tier) {
+  if (!tier_tests[tier].passes()) return false;
   if (tier < tier_avx) return true;
   constexpr std::uint32_t saves_state_and_has_avx = 3;
   constexpr std::uint64_t vector_registers = 6;
@@ -57,13 +64,34 @@ bool may_take_unasked(std::int32_t tier) {
          (platform_saved_state() & vector_registers) == vector_registers;
 }
 
+// The best that can run, whoever made the processor.
+std::int32_t native_tier() {
+  std::int32_t tier = tier_count - 1;
+  while (tier > tier_def && !can_run(tier)) --tier;
+  return tier;
+}
+
+// The tier that QTB_TIER asks for, or no_override. What cannot be had is told once.
+std::int32_t named_tier() {
+  char text[32];
+  const std::size_t length = platform_environment("QTB_TIER", text, sizeof text);
+  if (length == 0) return no_override;
+  MessageNumber why = message_no_such_tier;
+  if (length < sizeof text) {
+    if (std::strcmp(text, "native") == 0) return native_tier();
+    for (std::int32_t tier = 0; tier < tier_count; ++tier) {
+      if (std::strcmp(text, tier_tests[tier].name) != 0) continue;
+      if (can_run(tier)) return tier;
+      why = message_tier_lacking;
+    }
+  }
+  if (!tier_warned.exchange(true, relaxed)) qtb_serv_print(0, why, 1, text);
+  return no_override;
+}
+
 // From the highest tier down, the first whose test passes; no test is made behind it.
 std::int32_t tier_of_processor() {
-  if (qtb_serv_takes_best_tier) {
-    for (std::int32_t tier = tier_count - 1; tier > tier_def; --tier)
-      if (tier_tests[tier].passes() && may_take_unasked(tier)) return tier;
-    return tier_def;
-  }
+  if (qtb_serv_takes_best_tier) return native_tier();
   if (!qtb_serv_cpu_is_belmo()) return tier_def;
   const std::int32_t asked = asked_tiers.load(relaxed);
   for (std::int32_t tier = tier_count - 1; tier > tier_def; --tier) {
@@ -75,7 +103,8 @@ std::int32_t tier_of_processor() {
 
 }  // namespace
 
-// The override wins on every processor, also where the instructions are missing: who sets it knows better.
+// The override by number wins on every processor, also where the instructions are missing: who sets it knows better.
+// The one by name, which is read where there is no number, wins where it can run.
 ProcessorTier qtb_serv_cpu_detect() {
   const std::int32_t known = cached_tier.load(relaxed);
   if (known >= 0) return static_cast<ProcessorTier>(known);
@@ -84,7 +113,8 @@ ProcessorTier qtb_serv_cpu_detect() {
   if (asked_tiers.load(relaxed) == -1) asked_tiers.store(0, relaxed);
   if (asked != no_override && tier_tests[asked].taken == if_asked) asked_tiers.store(1 << asked, relaxed);
   const std::int32_t computed = tier_of_processor();
-  const std::int32_t tier = asked != no_override ? asked : computed;
+  const std::int32_t named = asked != no_override ? asked : named_tier();
+  const std::int32_t tier = named != no_override ? named : computed;
   cached_tier.store(tier, relaxed);
   return static_cast<ProcessorTier>(tier);
 }

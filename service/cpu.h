@@ -6,8 +6,8 @@
 
 extern "C" {
 
-// The tier of this process. Decided at the first call, from QTB_DEBUG_CPU_TYPE or the
-// processor, and kept; later calls are a load and a test. Never fails.
+// The tier of this process. Decided at the first call, from QTB_DEBUG_CPU_TYPE, QTB_TIER or the processor, and kept;
+// later calls are a load and a test. Never fails; a value of QTB_TIER that has no effect is told on standard output.
 QTB_HIDDEN ProcessorTier qtb_serv_cpu_detect();
 
 // Tests of the processor, each 1 or 0, each asking the processor anew.

@@ -31,6 +31,8 @@ constexpr Message messages[] = {
     {message_condition, "QTB INTERNAL ERROR: Condition %d detected in function %s"},
     {message_no_memory, "QTB INTERNAL ERROR: Not enough work memory in function %s"},
     {message_incompatible_options, "QTB ERROR: Incompatible optional parameters on entry to %s"},
+    {message_tier_lacking, "QTB WARNING: QTB_TIER=%s not convenient for this processor."},
+    {message_no_such_tier, "QTB WARNING: QTB_TIER=%s is no tier of this library."},
     {message_no_work_memory, "QTB INTERNAL ERROR: Not enough work memory in function %s"},
 };
 

@@ -14,6 +14,8 @@ enum MessageNumber : std::int32_t {
   message_no_memory = 8,             // %s routine
   message_incompatible_options = 9,  // %s routine
   message_no_work_memory = 1079,     // %s routine
+  message_tier_lacking = 2001,       // %s value of QTB_TIER
+  message_no_such_tier = 2002,       // %s value of QTB_TIER
 };
 
 namespace qtb {

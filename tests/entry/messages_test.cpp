@@ -53,10 +53,12 @@ TEST(Messages, the_built_in_texts) {
   EXPECT_EQ(print_builtin(8), "QTB INTERNAL ERROR: Not enough work memory in function %s\n");
   EXPECT_EQ(print_builtin(9), "QTB ERROR: Incompatible optional parameters on entry to %s\n");
   EXPECT_EQ(print_builtin(1079), "QTB INTERNAL ERROR: Not enough work memory in function %s\n");
+  EXPECT_EQ(print_builtin(2001), "QTB WARNING: QTB_TIER=%s not convenient for this processor.\n");
+  EXPECT_EQ(print_builtin(2002), "QTB WARNING: QTB_TIER=%s is no tier of this library.\n");
 }
 
 TEST(Messages, numbers_without_a_text_print_an_empty_line) {
-  for (std::int32_t number : {10, 500, 1078, 1080, 100000, -1, INT32_MIN, INT32_MAX})
+  for (std::int32_t number : {10, 500, 1078, 1080, 2000, 2003, 100000, -1, INT32_MIN, INT32_MAX})
     EXPECT_EQ(print_builtin(number), "\n") << number;
 }
 

@@ -1,7 +1,7 @@
 // A made-up operating system and processor behind service/platform/platform.h: what a test wants the library to find.
 //
 // A test sets up `fake` before it calls the library and reads from it what the library did. The library may then run on
-// any number of threads; the set-up itself is for one. Messages are not part of it.
+// any number of threads; the set-up itself is for one. Messages are fake_messages.h's.
 #pragma once
 
 #include <atomic>

@@ -2,6 +2,7 @@
 
 #include "service/cpu.h"
 
+#include <cstdio>
 #include <optional>
 
 #include "tests/platform/fake.h"
@@ -101,6 +102,97 @@ TEST(CpuDetect, ThreadsThatRaceOnTheFirstCallAgree) {
       for (const ProcessorTier tier : found) EXPECT_EQ(tier, *text != '\0' ? tier_avx : tier_sse42);
     });
   }
+}
+
+// The tier that QTB_TIER leads to, and what is printed.
+void expect_named(const std::string &vendor, std::uint32_t features, const std::string &name, int tier,
+                  const std::string &printed = "", std::uint64_t saved_state = 7) {
+  in_child([&] {
+    fake.processors[0].vendor = vendor;
+    fake.processors[0].features_ecx = features;
+    fake.saved_state = saved_state;
+    fake.environment["QTB_TIER"] = name;
+    testing::internal::CaptureStdout();
+    for (int call = 0; call < 3; ++call) EXPECT_EQ(qtb_serv_cpu_detect(), tier) << vendor << ' ' << name;
+    std::fflush(stdout);
+    EXPECT_EQ(testing::internal::GetCapturedStdout(), printed);
+  });
+}
+std::string lacking(const std::string &name) {
+  return "QTB WARNING: QTB_TIER=" + name + " not convenient for this processor.\n";
+}
+std::string unknown(const std::string &name) {
+  return "QTB WARNING: QTB_TIER=" + name + " is no tier of this library.\n";
+}
+constexpr std::uint32_t up_to_sse42 = sse3 | ssse3 | sse41 | sse42;
+
+TEST(NamedTier, NativeIsTheBestThatCanRunWhoeverMadeTheProcessor) {
+  for (const char *vendor : {"GenuineBelmo", "AuthenticAMD", "SomebodyElse"}) {
+    expect_named(vendor, 0, "native", tier_def);
+    expect_named(vendor, sse3, "native", tier_sse3);
+    expect_named(vendor, sse3 | ssse3, "native", tier_ssse3);
+    expect_named(vendor, up_to_sse42, "native", tier_sse42);
+    expect_named(vendor, everything, "native", tier_avx);
+  }
+}
+
+TEST(NamedTier, IsTakenOnEveryProcessorThatHasIt) {
+  const char *const names[] = {"def", "sse3", "ssse3", "sse42", "avx"};
+  for (const char *vendor : {"GenuineBelmo", "SomebodyElse"})
+    for (int tier = 0; tier < tier_count; ++tier) expect_named(vendor, everything, names[tier], tier);
+}
+
+TEST(NamedTier, ThatTheProcessorLacksIsToldOnceAndHasNoEffect) {
+  expect_named("GenuineBelmo", sse3 | ssse3, "sse42", tier_ssse3, lacking("sse42"));
+  expect_named("AuthenticAMD", sse3 | ssse3, "sse42", tier_def, lacking("sse42"));
+  expect_named("GenuineBelmo", up_to_sse42, "avx", tier_sse42, lacking("avx"));
+}
+
+TEST(NamedTier, NeedsWideRegistersThatTheSystemSaves) {
+  for (const std::uint64_t saved : {3, 5}) {
+    expect_named("GenuineBelmo", everything, "avx", tier_sse42, lacking("avx"), saved);
+    expect_named("GenuineBelmo", everything, "native", tier_sse42, "", saved);
+  }
+  for (const std::uint32_t one_bit : {save, avx}) {
+    expect_named("GenuineBelmo", up_to_sse42 | one_bit, "avx", tier_sse42, lacking("avx"));
+    expect_named("GenuineBelmo", up_to_sse42 | one_bit, "native", tier_sse42);
+  }
+}
+
+TEST(NamedTier, ThatIsNoneIsToldOnceAndHasNoEffect) {
+  for (const char *name : {"3", "AVX", "avx ", "nativ", "sse4", "%s%n"})
+    expect_named("GenuineBelmo", everything, name, tier_sse42, unknown(name));
+  expect_named("GenuineBelmo", everything, "native" + std::string(500, 'x'), tier_sse42,
+               unknown("native" + std::string(25, 'x')));
+  expect_named("GenuineBelmo", everything, "", tier_sse42);
+}
+
+TEST(NamedTier, GivesWayToANumber) {
+  for (const char *name : {"sse3", "native", "none"})
+    in_child([&] {
+      fake.environment[override_name] = "2";
+      fake.environment["QTB_TIER"] = name;
+      testing::internal::CaptureStdout();
+      EXPECT_EQ(qtb_serv_cpu_detect(), tier_ssse3);
+      std::fflush(stdout);
+      EXPECT_EQ(testing::internal::GetCapturedStdout(), "");
+    });
+  in_child([] {
+    fake.environment[override_name] = "5";
+    fake.environment["QTB_TIER"] = "sse3";
+    fake.processors[0].features_ecx = everything;
+    EXPECT_EQ(qtb_serv_cpu_detect(), tier_sse3);
+  });
+}
+
+TEST(NamedTier, IsToldOnceWhereThreadsRace) {
+  in_child([] {
+    fake.environment["QTB_TIER"] = "none";
+    testing::internal::CaptureStdout();
+    on_threads(16, [](int) { qtb_serv_cpu_detect(); });
+    std::fflush(stdout);
+    EXPECT_EQ(testing::internal::GetCapturedStdout(), unknown("none"));
+  });
 }
 
 TEST(CpuTests, LookAtOneBitEach) {
