@@ -15,27 +15,6 @@ void add_multiple(QtbInt m, T factor, const T *x, QtbInt incx, T *column) {
     store_lowest(column + i, f.add_to(load_repeated(column + i), [&](auto) { return load_repeated(x + i * incx); }));
 }
 
-// Four columns at once, each vector of x loaded for all of them.
-template <class T>
-[[gnu::noinline]] void add_multiples(QtbInt m, const T (&factors)[4], const T *x, T *a, QtbInt lda) {
-  const Factor<T> f[] = {Factor<T>(factors[0]), Factor<T>(factors[1]), Factor<T>(factors[2]), Factor<T>(factors[3])};
-  T *column[] = {a, a + lda, a + 2 * lda, a + 3 * lda};
-  for (; m >= lanes<T>; m -= lanes<T>, x += lanes<T>) {
-    const Vec<T> elements = load_unaligned(x);
-    repeat<4>([&](auto j) __attribute__((always_inline)) {
-      T *&p = column[j.value];
-      store_unaligned(p, add(load_unaligned(p), f[j.value].times(elements)));
-      p += lanes<T>;
-    });
-  }
-  if (m == 0) return;
-  const Vec<T> element = load_repeated(x);
-  repeat<4>([&](auto j) __attribute__((always_inline)) {
-    T *const p = column[j.value];
-    store_lowest(p, add(load_repeated(p), f[j.value].times(element)));
-  });
-}
-
 template <class T, bool conjugated>
 QTB_FUNCTION(ger, T, ger_inline) {
   if (*m <= 0 || *n <= 0 || is_zero(*alpha)) return;
@@ -49,11 +28,11 @@ QTB_FUNCTION(ger, T, ger_inline) {
   };
   QtbInt j = 0;
   if (*incx == 1 && *incy == 1)
-    for (; j + 4 <= *n; j += 4) {
+    for (; j + multiplied_columns <= *n; j += multiplied_columns) {
       if (skipped(j) || skipped(j + 1) || skipped(j + 2) || skipped(j + 3))
-        columns(j, j + 4);
+        columns(j, j + multiplied_columns);
       else
-        add_multiples(*m, {factor(j), factor(j + 1), factor(j + 2), factor(j + 3)}, x, a + j * *lda, *lda);
+        add_multiples(*m, {factor(j), factor(j + 1), factor(j + 2), factor(j + 3)}, x, a + j * *lda, *lda, 0);
     }
   columns(j, *n);
 }
