@@ -231,6 +231,7 @@ set(QTB_PLATFORM_SOURCES
 
 # Said by each library for itself: this is the product's.
 set(QTB_OWN_SOURCES
+  service/own_threads.cpp
   service/own_tier.cpp
 )
 

@@ -1,18 +1,19 @@
 # The companions: libraries that stand in for a BLAS of another convention. Each holds the core's objects of its own, so
-# that it works beside libqtb.so in one process, and takes the best tier of the processor by itself.
+# that it works beside libqtb.so in one process, takes the best tier of the processor by itself, and has the calls of
+# qtb/threads.h.
 #
 #   blas     libblas.so.3     32-bit integers, Fortran names and the C face
 #   blas64   libblas64.so.3   the same names, 64-bit integers
 #   qtb64    libqtb64.so      64-bit integers, names that end in _64 or 64_
-add_library(qtb_best_tier OBJECT interfaces/best_tier.cpp)
-target_link_libraries(qtb_best_tier PRIVATE qtb_options)
+add_library(qtb_companion_own OBJECT interfaces/best_tier.cpp interfaces/threads.cpp)
+target_link_libraries(qtb_companion_own PRIVATE qtb_options)
 
 # qtb_add_companion(name exported-name SUFFIX text BITS 32|64 [SOVERSION n])
 function(qtb_add_companion name exported)
   cmake_parse_arguments(arg "" "SUFFIX;BITS;SOVERSION" "" ${ARGN})
   set(target qtb_companion_${name})
   add_library(${target} SHARED interfaces/fortran.cpp interfaces/cblas.cpp interfaces/reports.cpp
-    ${qtb_shared_objects} $<TARGET_OBJECTS:qtb_platform> $<TARGET_OBJECTS:qtb_best_tier>)
+    ${qtb_shared_objects} $<TARGET_OBJECTS:qtb_platform> $<TARGET_OBJECTS:qtb_companion_own>)
   target_compile_definitions(${target} PRIVATE QTB_FACE_INT=std::int${arg_BITS}_t QTB_FACE_SUFFIX=${arg_SUFFIX}
     $<$<EQUAL:${arg_BITS},64>:CBLAS_ILP64>
     $<$<BOOL:${arg_SUFFIX}>:QTB_FACE_SECOND_NAMES>)

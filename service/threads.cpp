@@ -55,7 +55,8 @@ std::int32_t qtb_serv_get_max_threads(std::int32_t domain) {
   const ThreadSettings settings = thread_settings();
   if (settings.dynamic != 0 && omp_in_parallel()) return 1;
 
-  const std::int32_t given = given_threads(settings, domain);
+  const std::int32_t asked = qtb_serv_threads_asked_for();
+  const std::int32_t given = asked > 0 ? asked : given_threads(settings, domain);
   const bool is_explicit = given > 0;
   const std::int32_t requested = is_explicit ? given : omp_get_max_threads();
   if (settings.dynamic == 0) return requested;

@@ -22,6 +22,10 @@ QTB_HIDDEN std::int32_t qtb_serv_get_dynamic();
 // Reads all thread settings and counts the cores. The two above call it where that has not been done.
 QTB_HIDDEN void qtb_serv_read_thread_env();
 
+// The number that the program has set by a call, for the calling thread or for all: 0 where there is none. It goes
+// before what the environment gives. Each library has one source that says so.
+QTB_HIDDEN std::int32_t qtb_serv_threads_asked_for();
+
 // Counts logical processors and physical cores. The calling thread visits every processor of the machine, and ends with
 // the affinity of the process. A process that may not use all of the machine's processors counts one core, and
 // *logical stays as it was.

@@ -5,7 +5,13 @@ endif()
 set(companions ${PROJECT_BINARY_DIR}/interfaces)
 qtb_add_test(best_tier_test SOURCES interfaces/best_tier_test.cpp LIBRARIES qtb_static qtb_platform_fake)
 qtb_add_test(companion_reports_test SOURCES interfaces/reports_test.cpp LIBRARIES qtb::lp64)
+qtb_add_test(threads_calls_test SOURCES interfaces/threads_calls_test.cpp ../interfaces/threads.cpp
+  LIBRARIES qtb_static qtb_platform_fake)
 if(NOT QTB_INSTRUMENT)
+  # A team is counted where g++ begins it.
+  qtb_add_test(threads_honoured_test SOURCES interfaces/threads_honoured_test.cpp LIBRARIES qtb_companion_blas
+    RUNS sse42=QTB_DEBUG_CPU_TYPE=3 ENVIRONMENT QTB_DYNAMIC=FALSE)
+  set_target_properties(threads_honoured_test PROPERTIES ENABLE_EXPORTS ON)
   qtb_add_script_test(companion_names_test COMMAND interfaces/names_test.sh ${companions})
   qtb_add_script_test(companion_consumers_test COMMAND interfaces/consumers_test.sh ${PROJECT_BINARY_DIR})
   qtb_add_script_test(blas_testers_test COMMAND interfaces/testers_test.sh ${companions})
