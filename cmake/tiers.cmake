@@ -48,6 +48,6 @@ function(qtb_add_tiers)
     target_link_libraries(qtb_${tier} PRIVATE qtb_options)
     target_compile_definitions(qtb_${tier} PRIVATE QTB_TIER=${tier})
     target_compile_options(qtb_${tier} PRIVATE
-      ${QTB_TIER_FLAGS_${tier}} ${QTB_KERNEL_ALIGNMENT} -fno-exceptions -fno-rtti)
+      ${QTB_TIER_FLAGS_${tier}} ${QTB_KERNEL_ALIGNMENT} ${QTB_INSTRUMENT_KERNELS} -fno-exceptions -fno-rtti)
   endforeach()
 endfunction()
