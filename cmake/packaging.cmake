@@ -20,7 +20,8 @@ if(QTB_BUILD_INTERFACES)
   set(companions_folder ${CMAKE_INSTALL_LIBDIR}/qtb)
   install(TARGETS qtb_companion_blas qtb_companion_blas64 qtb_companion_qtb64 qtb_cblas EXPORT qtb
     LIBRARY DESTINATION ${companions_folder})
-  install(FILES include/qtb/cblas.h include/qtb/cblas_routines.def include/qtb/threads.h DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/qtb)
+  install(FILES include/qtb/cblas.h include/qtb/cblas_routines.def include/qtb/threads.h
+    DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/qtb)
   function(qtb_install_package package library flags description)
     configure_file(cmake/qtb-companion.pc.in ${package}.pc @ONLY)
     install(FILES ${PROJECT_BINARY_DIR}/${package}.pc DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig)
