@@ -32,12 +32,24 @@ template <int count, bool contiguous, class T>
   single_rows(p.m, walk);
 }
 
+// Elements that fill a vector: a row is one, and takes the same place in its sum, wherever x stands.
+template <int count, class T>
+[[gnu::always_inline]] inline void dot_whole_elements(QtbInt rows, const AnyColumns<T, count> &columns, const T *x,
+                                                      ColumnSums<T, count> &sums) {
+  DotRows<T, count, AnyColumns<T, count>, Unaligned<const T>> walk{columns, {x}, sums};
+  for (; rows >= 2; rows -= 2) walk.template pass<2>();
+  if (rows > 0) walk.template pass<1>();
+}
+
 template <int count, bool conjugated, bool contiguous, class T>
 [[gnu::always_inline]] inline void dot_group(const DirectProduct<T> &p) {
   ColumnSums<T, count> sums;
   const AnyColumns<T, count> columns(p.a, p.lda);
   if constexpr (contiguous) {
-    dot_sweep(p.m, columns, p.x, sums);
+    if constexpr (lanes<T> == 1)
+      dot_whole_elements(p.m, columns, p.x, sums);
+    else
+      dot_sweep(p.m, columns, p.x, sums);
     return add_totals(sums, conjugated, p.alpha, p.y);
   }
   DotRows<T, count, AnyColumns<T, count>, Strided<const T>> walk{columns, {p.x, p.incx}, sums};

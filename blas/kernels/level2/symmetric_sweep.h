@@ -44,6 +44,29 @@ auto *element_at(const Cursor &cursor, QtbInt i) {
     return cursor.p + i;
 }
 
+// The lowest lanes of as many vectors as one has lanes; rows for columns in as many; a vector with another lowest lane.
+inline __m128d lowest_of(const __m128d *v) { return _mm_unpacklo_pd(v[0], v[1]); }
+inline __m128 lowest_of(const __m128 *v) {
+  return _mm_movelh_ps(_mm_unpacklo_ps(v[0], v[1]), _mm_unpacklo_ps(v[2], v[3]));
+}
+[[gnu::always_inline]] inline void transpose(__m128d *v) {
+  const __m128d first = _mm_unpacklo_pd(v[0], v[1]);
+  v[1] = _mm_unpackhi_pd(v[0], v[1]);
+  v[0] = first;
+}
+[[gnu::always_inline]] inline void transpose(__m128 *v) { _MM_TRANSPOSE4_PS(v[0], v[1], v[2], v[3]); }
+inline __m128d with_lowest(__m128d v, __m128d lowest) { return _mm_move_sd(v, lowest); }
+inline __m128 with_lowest(__m128 v, __m128 lowest) { return _mm_move_ss(v, lowest); }
+// Lane k as the lowest one.
+template <int k>
+__m128d lane(__m128d v) {
+  return k == 0 ? v : _mm_unpackhi_pd(v, v);
+}
+template <int k>
+__m128 lane(__m128 v) {
+  return k == 0 ? v : _mm_shuffle_ps(v, v, k);
+}
+
 template <class T, int count, class X, class Y>
 struct MirroredRows {
   const T (&factor)[count];
@@ -80,6 +103,11 @@ struct MirroredRows {
   // One row of the columns begin to end - 1, and of the diagonal, if it is one of them.
   template <int begin, int end, int diagonal = -1>
   [[gnu::always_inline]] void single() {
+    store_lowest(y.p, row_of_y<begin, end, diagonal>());
+    advance(1);
+  }
+  template <int begin, int end, int diagonal>
+  [[gnu::always_inline]] Vec<T> row_of_y() {
     const RowFactor<T> row(load_lowest(x.p));
     Vec<T> of_y = load_row(y.p);
     repeat<count>([&](auto j) __attribute__((always_inline)) {
@@ -91,8 +119,41 @@ struct MirroredRows {
         add_lowest<j.value>(of_y, load_row(c));
       }
     });
-    store_lowest(y.p, of_y);
-    advance(1);
+    return of_y;
+  }
+
+  // As many rows as a vector has lanes, with the values and in the order of single rows: an element of y takes one
+  // column after another, lane for lane; the lowest lanes of the sums stand side by side and take one row after
+  // another.
+  static constexpr bool takes_blocks = count == 4 && !is_complex<T> && !requires { y.inc; };
+  [[gnu::always_inline]] QtbInt blocks(QtbInt rows) {
+    if (rows < lanes<T>) return rows;
+    Vec<T> lowest[count / lanes<T>];
+    repeat<count / lanes<T>>([&](auto k) __attribute__((always_inline)) {
+      lowest[k.value] = lowest_of(sums.sum + k.value * lanes<T>);
+    });
+    for (; rows >= lanes<T>; rows -= lanes<T>) {
+      Vec<T> c[count], of_y = load_unaligned(y.p);
+      repeat<count>([&](auto j) __attribute__((always_inline)) {
+        c[j.value] = columns.template vector<j.value>(0);
+        keep_in_place(c[j.value]);  // or both of its uses would load it
+        of_y = add(of_y, mul(factors.factor[j.value], c[j.value]));
+      });
+      store_unaligned(y.p, of_y);
+      repeat<count / lanes<T>>([&](auto k) __attribute__((always_inline)) {
+        transpose(c + k.value * lanes<T>);
+        repeat<lanes<T>>([&](auto i) __attribute__((always_inline)) {
+          lowest[k.value] =
+              add(lowest[k.value], mul(c[k.value * lanes<T> + i.value], broadcast(load_single(x.p + i.value))));
+        });
+      });
+      advance(lanes<T>);
+    }
+    repeat<count>([&](auto j) __attribute__((always_inline)) {
+      constexpr int k = j.value / lanes<T>;
+      sums.sum[j.value] = with_lowest(sums.sum[j.value], lane<j.value % lanes<T>>(lowest[k]));
+    });
+    return rows;
   }
 
   [[gnu::always_inline]] void rectangle(QtbInt rows) {
@@ -116,16 +177,27 @@ struct MirroredRows {
       for (; left > 0; --left) pass<turn>();
       rows %= rows_per_pass;
     }
+    if constexpr (takes_blocks) rows = blocks(rows);
     for (; rows > 0; --rows) single<0, count>();
   }
 
   template <bool upper>
   [[gnu::always_inline]] void triangle() {
     repeat<count>([&](auto p) __attribute__((always_inline)) {
-      if constexpr (upper)
-        single<p.value + 1, count, p.value>();
-      else
-        single<0, p.value, p.value>();
+      single<upper ? p.value + 1 : 0, upper ? count : p.value, p.value>();
+    });
+  }
+  // The same, with the group's own elements of y in vectors, and not stored yet: what loads four elements at once waits
+  // long for four stores.
+  template <bool upper>
+  [[gnu::always_inline]] void triangle(Vec<T> (&own)[count / lanes<T>]) {
+    Vec<T> of_y[count];
+    repeat<count>([&](auto p) __attribute__((always_inline)) {
+      of_y[p.value] = row_of_y < upper ? p.value + 1 : 0, upper ? count : p.value, p.value > ();
+      advance(1);
+    });
+    repeat<count / lanes<T>>([&](auto k) __attribute__((always_inline)) {
+      own[k.value] = lowest_of(of_y + k.value * lanes<T>);
     });
   }
 
@@ -171,7 +243,20 @@ template <bool upper, int count, class X, class Y, class T>
     column += step;
     step += growth;
   });
-  MirroredRows<T, count, X, Y> walk{factor, AnyColumns<T, count>(columns), x, y, ColumnFactors<T, count>(factor), {}};
+  using Walk = MirroredRows<T, count, X, Y>;
+  Walk walk{factor, AnyColumns<T, count>(columns), x, y, ColumnFactors<T, count>(factor), {}};
+  if constexpr (Walk::takes_blocks) {
+    Vec<T> own[count / lanes<T>];
+    if constexpr (upper) walk.rectangle(rows);
+    walk.template triangle<upper>(own);
+    if constexpr (!upper) walk.rectangle(rows);
+    repeat<count / lanes<T>>([&](auto k) __attribute__((always_inline)) {
+      constexpr int at = k.value * lanes<T>;
+      const Vec<T> totals = sum_lanes_of(walk.sums.sum + at);
+      store_unaligned(y.p + to_triangle + at, add(own[k.value], mul(broadcast(alpha), totals)));
+    });
+    return;
+  }
   if constexpr (upper) {
     if constexpr (count == 2)
       if (edge) walk.template single<0, 1>();
