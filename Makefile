@@ -12,12 +12,13 @@ MUTANTS ?= .
 # The lists (*.def) are laid out by hand.
 sources = $(shell git ls-files '*.cpp' '*.h' '*.c')
 
-.PHONY: help build interfaces demo test test-long bench lint format asan tsan fuzz mutants coverage install clean
+.PHONY: help build interfaces tools demo test test-long bench lint format asan tsan fuzz mutants coverage install clean
 .DEFAULT_GOAL := help
 
 help:
 	@echo 'make build      the library: build/release/libqtb.so'
 	@echo 'make interfaces  the companions that stand in for a BLAS: build/release/interfaces'
+	@echo 'make tools      qtb-info and qtb-trace: build/release/tools'
 	@echo 'make demo       builds and runs the examples'
 	@echo 'make test       builds everything and runs the tests'
 	@echo 'make test-long  more cases, both sanitizers, and the fuzz targets'
@@ -41,6 +42,11 @@ interfaces:
 	@tools/packages.sh build
 	cmake --preset release
 	cmake --build --preset release -j $(JOBS) --target interfaces
+
+tools:
+	@tools/packages.sh build
+	cmake --preset release
+	cmake --build --preset release -j $(JOBS) --target tools
 
 demo:
 	@tools/packages.sh demo
@@ -109,7 +115,7 @@ format:
 	@tools/packages.sh lint
 	clang-format -i $(sources)
 
-install: build
+install: build interfaces tools
 	cmake --install build/release --prefix $(PREFIX)
 
 clean:

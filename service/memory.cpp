@@ -11,6 +11,7 @@
 #include <cstdlib>
 #include <new>
 
+#include "service/memory_held.h"
 #include "service/platform/platform.h"
 
 namespace {
@@ -194,6 +195,17 @@ void qtb_serv_free(void *pointer) {
   for (std::int32_t i = 1; i <= lists && !found; ++i) found = release_entry(mm_lists[i], pointer);
   qtb_serv_unlock();
   if (!found) free_hook(pointer);
+}
+
+void qtb_serv_get_memory_held(MemoryHeld *held) {
+  *held = {0, 0, 0, !fast_path_disabled()};
+  qtb_serv_lock();
+  held->threads = mm_list_count.load(relaxed);
+  for (std::int64_t i = 1; i <= held->threads; ++i) {
+    held->buffers += mm_lists[i]->count.load(relaxed);
+    held->bytes += mm_lists[i]->total_bytes;
+  }
+  qtb_serv_unlock();
 }
 
 // Each name is a variable of that library which holds a function. A library that supplies the hooks has to stay.

@@ -10,8 +10,12 @@ packages_for() {
   case $1 in
     build | demo) echo cmake ninja-build g++ make pkg-config ;;
     # binutils reads what was built, libc-dev-bin has gencat for message catalogues, qemu-user plays other processors,
-    # gfortran is a caller, libblas3 a second opinion, and the -test packages have testers of a BLAS.
-    test) echo libgtest-dev binutils libc-dev-bin qemu-user gfortran libblas3 libblas-test libblas64-test ;;
+    # gfortran is a caller, libblas3 a second opinion, the -test packages have testers of a BLAS, and groff and man read
+    # the manual pages.
+    test)
+      echo libgtest-dev binutils libc-dev-bin qemu-user gfortran libblas3 libblas-test libblas64-test
+      echo groff-base man-db
+      ;;
     bench) echo libbenchmark-dev libopenblas0-pthread libblis4-pthread gnuplot-nox ;;
     lint) echo clang clang-format clang-tidy libomp-dev shellcheck ;;
     # libomp-dev has the OpenMP runtime that the thread sanitizer understands, llvm the symbolizer of its reports.

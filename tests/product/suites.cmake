@@ -10,6 +10,10 @@ if(NOT QTB_INSTRUMENT)
     COMMAND product/exports_test.sh $<TARGET_FILE:qtb> ${PROJECT_SOURCE_DIR}/blas/routines.def)
   qtb_add_script_test(exports_self_test
     COMMAND product/exports_self_test.sh ${PROJECT_SOURCE_DIR}/blas/routines.def)
+  if(TARGET tools)
+    qtb_add_script_test(promises_test
+      COMMAND product/promises_test.sh ${PROJECT_SOURCE_DIR} ${PROJECT_BINARY_DIR} ${CMAKE_CTEST_COMMAND})
+  endif()
   qtb_add_script_test(install_test COMMAND product/install_test.sh ${PROJECT_BINARY_DIR})
 endif()
 qtb_add_test(interface_test SOURCES product/interface_test.cpp LIBRARIES qtb)

@@ -2,6 +2,7 @@
 // trap.
 #pragma once
 
+#include <gtest/gtest.h>
 #include <unistd.h>
 
 #include <csignal>
@@ -34,6 +35,11 @@ inline std::uint64_t seed_of(const char *routine, int number) {
 }
 
 // ---- tests ----
+
+inline const bool failures_are_the_tests_own = [] {
+  report_failure = [](const char *problem, const char *what) { ADD_FAILURE() << problem << "\n" << what; };
+  return true;
+}();
 
 class BodyTest : public testing::Test {
  public:

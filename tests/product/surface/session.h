@@ -1,7 +1,6 @@
 // One routine under test: makes its calls in chosen surroundings, judges what they leave behind, and counts.
 #pragma once
 
-#include <gtest/gtest.h>
 #include <immintrin.h>
 #include <pthread.h>
 
@@ -33,6 +32,9 @@ inline std::map<std::string, Tally> &tallies() {
   static std::map<std::string, Tally> all;
   return all;
 }
+
+// Where a failure goes: the problem, with the routine at its head, and what is wrong. Each program sets it.
+inline void (*report_failure)(const char *problem, const char *what) = nullptr;
 
 // What is being run, for the handler of a trap.
 inline char current_problem[600];
@@ -176,7 +178,7 @@ class Session {
     va_start(values, format);
     std::vsnprintf(text, sizeof text, format, values);
     va_end(values);
-    ADD_FAILURE() << current_problem << "\n" << text;
+    report_failure(current_problem, text);
     ++failures_;
   }
 
