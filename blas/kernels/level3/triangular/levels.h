@@ -95,14 +95,14 @@ constexpr bool has_kind(const char *kinds, char kind) {
 }
 
 // The rows of a type and tier; one that does not exist is an error at compile time.
-consteval LevelRow find_levels(Routine routine, char side, char kind, ProcessorTier tier, Sse41 sse41) {
+constexpr LevelRow find_levels(Routine routine, char side, char kind, ProcessorTier tier, Sse41 sse41) {
   for (const LevelRow &row : level_rows)
     if (row.routine == routine && row.side == side && has_kind(row.kinds, kind) && (row.tiers >> tier & 1U) != 0 &&
         (row.sse41 == Sse41::any || row.sse41 == sse41))
       return row;
   __builtin_unreachable();
 }
-consteval BufferRow find_buffers(Routine routine, ProcessorTier tier) {
+constexpr BufferRow find_buffers(Routine routine, ProcessorTier tier) {
   for (const BufferRow &row : buffer_rows)
     if (row.routine == routine && (row.tiers >> tier & 1U) != 0) return row;
   __builtin_unreachable();
