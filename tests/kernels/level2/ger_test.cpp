@@ -157,4 +157,28 @@ TYPED_TEST(GerTest, a_nan_in_x_or_y_reaches_the_columns_that_are_not_skipped) {
   });
 }
 
+// A product that rounds to zero is no update in most tiers: the columns of a group take what they would take alone.
+TYPED_TEST(GerTest, a_factor_that_rounds_to_zero_does_to_a_group_what_it_does_to_a_column) {
+  using T = typename TypeParam::Element;
+  in_every_tier([](int tier) {
+    const QtbInt m = 3, n = 4, one = 1, lda = 3;
+    const Real<T> nan = std::numeric_limits<Real<T>>::quiet_NaN(), least = std::numeric_limits<Real<T>>::min();
+    T alpha{}, x[3] = {whole<T>(1), whole<T>(1), whole<T>(1)}, y[4] = {whole<T>(1), T{}, whole<T>(1), whole<T>(1)};
+    std::memcpy(static_cast<void *>(&alpha), &least, sizeof least);
+    std::memcpy(static_cast<void *>(x), &nan, sizeof nan);
+    std::memcpy(static_cast<void *>(&y[1]), &least, sizeof least);
+    T together[12] = {}, alone[12] = {};
+    TypeParam::ger[tier](&m, &n, &alpha, x, &one, y, &one, together, &lda);
+    for (int j = 0; j < 4; ++j) TypeParam::ger[tier](&m, &one, &alpha, x, &one, y + j, &one, alone + 3 * j, &lda);
+    const auto first_part_is_nan = [](const T &element) {
+      Real<T> part;
+      std::memcpy(&part, static_cast<const void *>(&element), sizeof part);
+      return std::isnan(part);
+    };
+    for (int i = 0; i < 12; ++i)
+      EXPECT_EQ(first_part_is_nan(together[i]), first_part_is_nan(alone[i])) << tier_name(tier) << " element " << i;
+    EXPECT_TRUE(first_part_is_nan(together[0])) << tier_name(tier);
+  });
+}
+
 }  // namespace
