@@ -18,13 +18,16 @@ namespace {
 std::atomic<int> asked_of_all{0};
 [[gnu::tls_model("initial-exec")]] thread_local int asked_of_thread = 0;
 
+// The exported names call this and not each other: of two companions in a process each would call the first one's.
+void ask_of_all(int threads) { asked_of_all.store(std::max(threads, 0), std::memory_order_relaxed); }
+
 }  // namespace
 
 std::int32_t qtb_serv_threads_asked_for() {
   return asked_of_thread != 0 ? asked_of_thread : asked_of_all.load(std::memory_order_relaxed);
 }
 
-void qtb_set_num_threads(int threads) { asked_of_all.store(std::max(threads, 0), std::memory_order_relaxed); }
+void qtb_set_num_threads(int threads) { ask_of_all(threads); }
 
 int qtb_set_num_threads_local(int threads) {
   const int former = asked_of_thread;
@@ -34,8 +37,8 @@ int qtb_set_num_threads_local(int threads) {
 
 int qtb_get_num_threads() { return qtb_serv_get_max_threads(domain_blas); }
 
-void blas_set_num_threads(int threads) { qtb_set_num_threads(threads); }
-int blas_get_num_threads() { return qtb_get_num_threads(); }
+void blas_set_num_threads(int threads) { ask_of_all(threads); }
+int blas_get_num_threads() { return qtb_serv_get_max_threads(domain_blas); }
 
 const char *qtb_get_tier() {
 #define QTB_TIER_TEXT(tier, TIER) #tier,

@@ -62,7 +62,8 @@ int print_process(long number) {
   for (const std::string &path : files) {
     const std::string_view name = std::string_view(path).substr(path.rfind('/') + 1);
     // A file that was replaced since is still to be had from the process.
-    const std::string version = name.find(".so") != name.npos ? version_in(root + "/root" + path) : std::string();
+    std::string version;
+    if (name.find(".so") != name.npos) version = version_in(std::string(root).append("/root").append(path));
     if (!version.empty())
       std::printf("QTB %-12s %s\n", version.c_str(), path.c_str());
     else if (name.starts_with("libqtb-trace"))

@@ -113,7 +113,7 @@ extern "C" QTB_EXPORT void GOMP_parallel(void (*body)(void *), void *data, unsig
     if (known == nullptr) target.procedure.store(known = procedure_behind(target.name), std::memory_order_release);
     return known;
   };
-  if (this_thread.depth != 0) {
+  if (this_thread.frame != 0) {
     unsigned team = threads;
     if (team == 0) team = static_cast<unsigned>(reinterpret_cast<int (*)()>(procedure(most))());
     if (team > this_thread.team) this_thread.team = team;

@@ -80,14 +80,14 @@ struct Reader {
 // Counts what the calls below it take as theirs.
 class Timed {
  public:
-  Timed() {
-    this_thread.depth = 1;
+  explicit Timed(std::uintptr_t frame) {
+    this_thread.frame = frame;
     this_thread.team = 1;
     begin_ = __rdtsc();
   }
   void end(Table *table, RoutineNumber routine, Face face, const CallShape &shape) const {
     const std::uint64_t ticks = __rdtsc() - begin_;
-    this_thread.depth = 0;
+    this_thread.frame = 0;
     if (table != nullptr) record(*table, Key::of(routine, face, this_thread.team, shape), ticks);
   }
 
@@ -114,10 +114,11 @@ R forward(Target &target, RoutineNumber routine, const Shape &shape, A... argume
   void *procedure = target.procedure.load(std::memory_order_acquire);
   if (procedure == nullptr) [[unlikely]]
     procedure = find_target(target);
-  if (this_thread.depth != 0) return call_procedure<R>(procedure, arguments...);
+  const auto frame = reinterpret_cast<std::uintptr_t>(__builtin_frame_address(0));
+  if (frame < this_thread.frame) return call_procedure<R>(procedure, arguments...);
   Table *const table = this_thread.table != nullptr ? this_thread.table : take_table();
   const CallShape what = shape();
-  const Timed timed;
+  const Timed timed(frame);
   if constexpr (std::is_void_v<R>) {
     call_procedure<R>(procedure, arguments...);
     timed.end(table, routine, face, what);

@@ -83,10 +83,11 @@ struct Table {
   Table *next;                      // in the list of all
 };
 
-// A thread in a call of its program's. Calls within it are of that call.
+// A thread in a call of its program's. Calls within it are of that call: they stand below its frame on the stack. One
+// that a jump or an exception has left needs no end: the next call stands above it.
 struct ThreadState {
   Table *table;
-  std::uint32_t depth;
+  std::uintptr_t frame;  // 0 outside of all calls
   std::uint32_t team;
 };
 [[gnu::tls_model("initial-exec")]] extern constinit thread_local ThreadState this_thread;
