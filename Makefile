@@ -12,7 +12,8 @@ MUTANTS ?= .
 # The lists (*.def) are laid out by hand.
 sources = $(shell git ls-files '*.cpp' '*.h' '*.c')
 
-.PHONY: help build interfaces packages demo test test-long bench lint format asan tsan fuzz mutants coverage install clean
+.PHONY: help build interfaces packages demo test test-long bench lint format asan tsan fuzz mutants coverage install
+.PHONY: clean
 .DEFAULT_GOAL := help
 
 help:

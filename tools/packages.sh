@@ -2,9 +2,9 @@
 # packages.sh purpose...: installs the Debian packages that these purposes need and this machine lacks.
 #
 # Purposes: build demo test ecosystem packages bench lint sanitizers fuzz coverage. Where nothing is missing no package
-# manager runs, so
-# that a complete machine works without a network. Otherwise the package lists are fetched once and the missing packages
-# installed, through sudo where the caller is not root. Fails with the list of packages where that cannot be done.
+# manager runs, so that a complete machine works without a network. Otherwise the package lists are fetched once and the
+# missing packages installed, through sudo where the caller is not root. Fails with the list of packages where that
+# cannot be done.
 set -eu
 
 packages_for() {

@@ -45,9 +45,11 @@ END
 for side in ours reference; do
   rm -f hpccoutf.txt
   mpi_run $side hpcc
-  [ "$status" = 0 ] && grep -q '^Success=1' hpccoutf.txt || { cat printed hpccoutf.txt && exit 1; }
-  grep -E '^\|\|.*FAILED' hpccoutf.txt > $side.failed || true
-  grep -cE '(\.\. |\) *)(PASSED|FAILED)' hpccoutf.txt > $side.count
+  if [ "$status" != 0 ] || ! grep -q '^Success=1' hpccoutf.txt; then
+    cat printed hpccoutf.txt && exit 1
+  fi
+  grep -E '^\|\|.*FAILED' hpccoutf.txt > "$side".failed || true
+  grep -cE '(\.\. |\) *)(PASSED|FAILED)' hpccoutf.txt > "$side".count
   sed -n 's/^HPL_Tflops=/HPL, Tflop\/s: /p' hpccoutf.txt
 done
 verdict "HPL"

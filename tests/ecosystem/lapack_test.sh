@@ -2,6 +2,7 @@
 # lapack_test.sh folder [type...]: LAPACK's testers, linear equations and eigenvalues, over the element types s d c z.
 . "$(dirname "$0")/common.sh"
 shift
+[ $# != 0 ] || set -- s d c z
 testers=$libraries/lapack
 need $testers/xlintstd
 
@@ -18,9 +19,9 @@ tester() {
 }
 
 for side in ours reference; do
-  : > $side.failed
-  : > $side.counts
-  for type in ${*:-s d c z}; do
+  : > "$side".failed
+  : > "$side".counts
+  for type; do
     tester $side xlintst"$type" "$type"test.in
     tester $side xlintstrf"$type" "$type"test_rfp.in
     case $type in d) tester $side xlintstds dstest.in ;; z) tester $side xlintstzc zctest.in ;; esac
@@ -31,6 +32,6 @@ for side in ours reference; do
       tester $side xeigtst"$type" "$type$input.in"
     done
   done
-  awk '{ sum += $1 } END { print sum }' $side.counts > $side.count
+  awk '{ sum += $1 } END { print sum }' $side.counts > "$side".count
 done
 verdict "LAPACK testers"

@@ -6,10 +6,10 @@ shift 2
 need /usr/bin/python3 /usr/lib/python3/dist-packages/pytest /usr/lib/python3/dist-packages/scipy
 
 for side in ours reference; do
-  run $side /usr/bin/python3 -m pytest -p no:cacheprovider -q -rfE --pyargs "$@"
+  run "$side" /usr/bin/python3 -m pytest -p no:cacheprovider -q -rfE --pyargs "$@"
   grep -qE '^[0-9].* passed' printed || { cat printed && exit 1; }
-  sed -nE 's/^(FAILED|ERROR) ([^ ]*).*/\2/p' printed > $side.failed
-  sed -nE 's/^(.*, )?([0-9]+) passed.*/\2/p' printed > $side.count
+  sed -nE 's/^(FAILED|ERROR) ([^ ]*).*/\2/p' printed > "$side".failed
+  tail -1 printed | grep -oE '[0-9]+ (passed|failed)' | awk '{ sum += $1 } END { print sum }' > "$side".count
   tail -1 printed
 done
 verdict "$what"

@@ -10,12 +10,12 @@ if [ $# = 0 ]; then
 fi
 
 for side in ours reference; do
-  : > $side.failed
-  : > $side.counts
+  : > "$side".failed
+  : > "$side".counts
   for tester; do
     name=$(basename "$tester")
-    mpi_run $side "$tester"
-    [ "$status" = 0 ] || echo "$name: ended with status $status" >> $side.failed
+    mpi_run "$side" "$tester"
+    [ "$status" = 0 ] || echo "$name: ended with status $status" >> "$side".failed
     # Both kinds of summary: the number of tests with a verdict, and a table by routine.
     awk -v name="$name" '
       /tests completed and (passed|failed)|tests completed without checking|tests passed|tests failed/ { ran += $1 }
@@ -23,10 +23,10 @@ for side in ours reference; do
       /^ *\|  *P[SDCZ]/ { ran += $4 + $5; bad += $5 }
       END { print ran + 0, bad + 0 }' printed > numbers
     read -r ran bad < numbers
-    [ "$ran" != 0 ] || echo "$name: no test ran" >> $side.failed
-    repeat "$bad" "$name" >> $side.failed
-    echo "$ran" >> $side.counts
+    [ "$ran" != 0 ] || echo "$name: no test ran" >> "$side".failed
+    repeat "$bad" "$name" >> "$side".failed
+    echo "$ran" >> "$side".counts
   done
-  awk '{ sum += $1 } END { print sum }' $side.counts > $side.count
+  awk '{ sum += $1 } END { print sum }' "$side".counts > "$side".count
 done
 verdict "ScaLAPACK testers"

@@ -1,5 +1,5 @@
-# Programs that no one here wrote, on libblas.so.3 of the companions and on the reference BLAS. `make test-long` installs
-# and runs them; docs/ecosystem.md has what passes.
+# Programs that no one here wrote, on libblas.so.3 of the companions and on the reference BLAS. `make test-long`
+# installs and runs them; docs/ecosystem.md has what passes.
 if(NOT TARGET interfaces OR QTB_INSTRUMENT)
   return()
 endif()
