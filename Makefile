@@ -12,8 +12,8 @@ MUTANTS ?= .
 # The lists (*.def) are laid out by hand.
 sources = $(shell git ls-files '*.cpp' '*.h' '*.c')
 
-.PHONY: help build interfaces packages demo test test-long bench lint format asan tsan fuzz mutants coverage install
-.PHONY: clean
+.PHONY: help build interfaces packages
+.PHONY: demo test test-long bench lint format asan tsan fuzz mutants coverage install clean
 .DEFAULT_GOAL := help
 
 help:
@@ -47,8 +47,7 @@ interfaces:
 packages:
 	@tools/packages.sh build packages
 	cmake --preset release
-	cmake --build --preset release -j $(JOBS) --target qtb interfaces
-	cd build/release && cpack
+	cmake --build --preset release -j $(JOBS) --target packages
 
 demo:
 	@tools/packages.sh demo

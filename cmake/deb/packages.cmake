@@ -4,7 +4,7 @@
 #                                alternatives of libblas.so.3 and libblas64.so.3 point to
 #   development   libqtb-dev     headers, names to link against, pkg-config and CMake packages
 #   tools         qtb-tools      programs, where an installation has some
-# cpack builds what `make packages` has built by then, and not all else.
+# cpack packs what the target `packages` has built by then, and builds nothing itself.
 set(CMAKE_SKIP_INSTALL_ALL_DEPENDENCY ON)
 set(CPACK_GENERATOR DEB)
 set(CPACK_PACKAGE_DIRECTORY ${PROJECT_BINARY_DIR}/packages)
@@ -57,3 +57,9 @@ set(CPACK_DEBIAN_TOOLS_PACKAGE_DEPENDS "${library_package} (= ${PROJECT_VERSION}
 set(CPACK_COMPONENT_TOOLS_DESCRIPTION "dense linear-algebra kernels, programs
 Programs that tell what the library does on a machine and in a program.")
 include(CPack)
+
+add_custom_target(packages COMMAND ${CMAKE_CPACK_COMMAND} WORKING_DIRECTORY ${PROJECT_BINARY_DIR} USES_TERMINAL)
+add_dependencies(packages qtb interfaces)
+if(TARGET tools)
+  add_dependencies(packages tools)
+endif()
