@@ -12,16 +12,18 @@ MUTANTS ?= .
 # The lists (*.def) are laid out by hand.
 sources = $(shell git ls-files '*.cpp' '*.h' '*.c')
 
-.PHONY: help build interfaces tools demo test test-long bench lint format asan tsan fuzz mutants coverage install clean
+.PHONY: help build interfaces tools packages
+.PHONY: demo test test-long bench lint format asan tsan fuzz mutants coverage install clean
 .DEFAULT_GOAL := help
 
 help:
 	@echo 'make build      the library: build/release/libqtb.so'
 	@echo 'make interfaces  the companions that stand in for a BLAS: build/release/interfaces'
 	@echo 'make tools      qtb-info and qtb-trace: build/release/tools'
+	@echo 'make packages   Debian packages of the library, its development files and its tools: build/release/packages'
 	@echo 'make demo       builds and runs the examples'
 	@echo 'make test       builds everything and runs the tests'
-	@echo 'make test-long  more cases, both sanitizers, and the fuzz targets'
+	@echo 'make test-long  more cases, programs of others, both sanitizers, and the fuzz targets'
 	@echo 'make bench      benchmarks, beside PEER=library; bench/run.sh has the other variables'
 	@echo 'make lint       formatting and static analysis'
 	@echo 'make format     formats the sources'
@@ -48,6 +50,11 @@ tools:
 	cmake --preset release
 	cmake --build --preset release -j $(JOBS) --target tools
 
+packages:
+	@tools/packages.sh build packages
+	cmake --preset release
+	cmake --build --preset release -j $(JOBS) --target packages
+
 demo:
 	@tools/packages.sh demo
 	cmake --preset release -D QTB_BUILD_EXAMPLES=ON
@@ -63,7 +70,7 @@ test:
 	ctest --preset release -j $(JOBS)
 
 test-long: asan tsan fuzz
-	@tools/packages.sh build test
+	@tools/packages.sh build test packages ecosystem
 	cmake --preset release -D QTB_BUILD_TESTS=ON
 	cmake --build --preset release -j $(JOBS)
 	ctest --preset long -j $(JOBS)

@@ -3,8 +3,10 @@
 # charts and the summary (summary.md) are kept in BUILD_FOLDER/bench-results.
 #
 # Environment:
-#   BENCH_PARTS            what to run (default: slot level1 level2 kernels gemm flat families threads level3 balance)
+#   BENCH_PARTS            what to run (default: slot face level1 level2 kernels gemm flat families threads level3
+#                            balance)
 #                            slot     what a dispatch slot costs
+#                            face     what a companion costs a call, and a process, beside the reference BLAS
 #                            level1   Level 1 on one thread and on all, and beside the peer
 #                            level2   Level 2: every option and increment in cache, odd leading dimensions, some beyond
 #                                     the caches, and on all threads
@@ -28,7 +30,7 @@
 set -eu
 build=$1
 results=$build/bench-results
-parts=${BENCH_PARTS:-slot level1 level2 kernels gemm flat families threads level3 balance}
+parts=${BENCH_PARTS:-slot face level1 level2 kernels gemm flat families threads level3 balance}
 threads=$(nproc)
 products=sgemm,dgemm,cgemm,zgemm
 mkdir -p "$results"
@@ -66,6 +68,14 @@ beside_peer() {
 part_slot() {
   heading 'a slot'
   "$build/bench/slot_cost" | tee "$results/slot-$tier.txt"
+}
+
+reference=/usr/lib/x86_64-linux-gnu/blas/libblas.so.3
+part_face() {
+  [ -x "$build/bench/companion_cost" ] && [ -e $reference ] || return 0
+  heading 'a companion'
+  "$build/bench/companion_cost" "$library" "$build/interfaces/libblas.so.3" $reference "$build/bench/one_call" |
+    tee "$results/face-$tier.txt"
 }
 
 level1() { # name filter

@@ -1,9 +1,10 @@
 #!/bin/sh
 # packages.sh purpose...: installs the Debian packages that these purposes need and this machine lacks.
 #
-# Purposes: build demo test bench lint sanitizers fuzz coverage. Where nothing is missing no package manager runs, so
-# that a complete machine works without a network. Otherwise the package lists are fetched once and the missing packages
-# installed, through sudo where the caller is not root. Fails with the list of packages where that cannot be done.
+# Purposes: build demo test ecosystem packages bench lint sanitizers fuzz coverage. Where nothing is missing no package
+# manager runs, so that a complete machine works without a network. Otherwise the package lists are fetched once and the
+# missing packages installed, through sudo where the caller is not root. Fails with the list of packages where that
+# cannot be done.
 set -eu
 
 packages_for() {
@@ -16,6 +17,12 @@ packages_for() {
       echo libgtest-dev binutils libc-dev-bin qemu-user gfortran libblas3 libblas-test libblas64-test
       echo groff-base man-db
       ;;
+    # Programs that use a BLAS, with suites of their own where they have some, and the reference LAPACK under them.
+    ecosystem)
+      echo libblas3 liblapack3 liblapack-test python3-numpy python3-scipy python3-pytest python3-hypothesis octave \
+        r-base-core hpcc scalapack-mpi-test openmpi-bin
+      ;;
+    packages) echo dpkg-dev ;;
     bench) echo libbenchmark-dev libopenblas0-pthread libblis4-pthread gnuplot-nox ;;
     lint) echo clang clang-format clang-tidy libomp-dev shellcheck ;;
     # libomp-dev has the OpenMP runtime that the thread sanitizer understands, llvm the symbolizer of its reports.

@@ -54,7 +54,7 @@ expect() {
   fi
 }
 
-expect "nothing missing" 0 "" 0 "" build test demo bench lint sanitizers fuzz coverage
+expect "nothing missing" 0 "" 0 "" build test demo ecosystem packages bench lint sanitizers fuzz coverage
 expect "missing for another purpose" 0 "" 0 gcovr build test
 expect "one missing" 0 "apt-get update,apt-get install ninja-build" 0 ninja-build build test
 expect "missing twice" 0 "apt-get update,apt-get install clang libomp-dev" 0 "libomp-dev clang" fuzz sanitizers
