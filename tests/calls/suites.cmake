@@ -1,2 +1,2 @@
 # The descriptions of calls that tests and benchmarks share.
-qtb_add_test(description_test SOURCES calls/description_test.cpp)
+qtb_add_test(description_test BRIEF SOURCES calls/description_test.cpp)

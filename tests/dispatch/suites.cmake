@@ -1,6 +1,6 @@
-qtb_add_test(slots_test SOURCES dispatch/slots_test.cpp dispatch/recording_kernels.cpp
+qtb_add_test(slots_test BRIEF SOURCES dispatch/slots_test.cpp dispatch/recording_kernels.cpp
   LIBRARIES qtb_static qtb_platform_fake)
-qtb_add_test(slot_table_test SOURCES dispatch/table_test.cpp LIBRARIES qtb_static qtb_platform_static)
+qtb_add_test(slot_table_test BRIEF SOURCES dispatch/table_test.cpp LIBRARIES qtb_static qtb_platform_static)
 
 # Static, since the system's dynamic loader refuses to start on vendors that it does not know; neither the sanitizers
 # nor clang's OpenMP runtime come that way.

@@ -3,9 +3,9 @@ if(NOT TARGET interfaces)
   return()
 endif()
 set(companions ${PROJECT_BINARY_DIR}/interfaces)
-qtb_add_test(best_tier_test SOURCES interfaces/best_tier_test.cpp LIBRARIES qtb_static qtb_platform_fake)
-qtb_add_test(companion_reports_test SOURCES interfaces/reports_test.cpp LIBRARIES qtb::lp64)
-qtb_add_test(threads_calls_test SOURCES interfaces/threads_calls_test.cpp ../interfaces/threads.cpp
+qtb_add_test(best_tier_test BRIEF SOURCES interfaces/best_tier_test.cpp LIBRARIES qtb_static qtb_platform_fake)
+qtb_add_test(companion_reports_test BRIEF SOURCES interfaces/reports_test.cpp LIBRARIES qtb::lp64)
+qtb_add_test(threads_calls_test BRIEF SOURCES interfaces/threads_calls_test.cpp ../interfaces/threads.cpp
   LIBRARIES qtb_static qtb_platform_fake)
 if(NOT QTB_INSTRUMENT)
   # A team is counted where g++ begins it.

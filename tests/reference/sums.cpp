@@ -62,6 +62,19 @@ CompensatedSum sum_of(QtbInt first, QtbInt last, Strip x, Strip y) {
   return {sum.re, sum.im, sum.gauge};
 }
 
+// Four columns at a time, so that a sum is loaded and stored once for all of them.
+template <class R>
+void add_all_columns(std::size_t rows, std::size_t columns, const R *a, const R *y, R *__restrict sum) {
+  std::size_t l = 0;
+  for (; l + 4 <= columns; l += 4) {
+    const R *const a0 = a + l * rows, *const a1 = a0 + rows, *const a2 = a1 + rows, *const a3 = a2 + rows;
+    const R y0 = y[l], y1 = y[l + 1], y2 = y[l + 2], y3 = y[l + 3];
+    for (std::size_t i = 0; i < rows; ++i) sum[i] += (a0[i] * y0 + a1[i] * y1) + (a2[i] * y2 + a3[i] * y3);
+  }
+  for (; l < columns; ++l)
+    for (std::size_t i = 0; i < rows; ++i) sum[i] += a[i + l * rows] * y[l];
+}
+
 }  // namespace
 
 bool moderate(double value) {
@@ -92,6 +105,13 @@ WideSum wide_sum(QtbInt first, QtbInt last, Strip x, Strip y, bool complex) {
     sum.gauge += static_cast<double>(magnitude(a) * magnitude(b));
   }
   return sum;
+}
+
+void add_columns(std::size_t rows, std::size_t columns, const float *a, const float *y, float *sum) {
+  add_all_columns(rows, columns, a, y, sum);
+}
+void add_columns(std::size_t rows, std::size_t columns, const double *a, const double *y, double *sum) {
+  add_all_columns(rows, columns, a, y, sum);
 }
 
 }  // namespace qtb::reference

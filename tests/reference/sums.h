@@ -66,4 +66,9 @@ struct WideSum {
 };
 WideSum wide_sum(QtbInt first, QtbInt last, Strip x, Strip y, bool complex);
 
+// sum += A*y for A of rows by columns elements, column by column without a gap. In plain arithmetic and in any order:
+// for whole numbers whose sums all are exact.
+void add_columns(std::size_t rows, std::size_t columns, const float *a, const float *y, float *sum);
+void add_columns(std::size_t rows, std::size_t columns, const double *a, const double *y, double *sum);
+
 }  // namespace qtb::reference

@@ -1,13 +1,13 @@
-qtb_add_test(cpu_test SOURCES service/cpu_test.cpp LIBRARIES qtb_static qtb_platform_fake)
-qtb_add_test(cache_test SOURCES service/cache_test.cpp LIBRARIES qtb_static qtb_platform_fake)
+qtb_add_test(cpu_test BRIEF SOURCES service/cpu_test.cpp LIBRARIES qtb_static qtb_platform_fake)
+qtb_add_test(cache_test BRIEF SOURCES service/cache_test.cpp LIBRARIES qtb_static qtb_platform_fake)
 qtb_add_test(thread_settings_test SOURCES service/thread_settings_test.cpp fuzz/environment_fuzz.cpp
   LIBRARIES qtb_static qtb_platform_fake)
 target_compile_definitions(thread_settings_test PRIVATE QTB_TEST_CORPUS="${CMAKE_CURRENT_SOURCE_DIR}/fuzz/corpus")
-qtb_add_test(cores_test SOURCES service/cores_test.cpp LIBRARIES qtb_static qtb_platform_fake)
-qtb_add_test(threads_test SOURCES service/threads_test.cpp LIBRARIES qtb_static qtb_platform_fake)
-qtb_add_test(override_test SOURCES service/override_test.cpp LIBRARIES qtb_static qtb_platform_fake)
-qtb_add_test(memory_test SOURCES service/memory_test.cpp LIBRARIES qtb_static qtb_platform_fake)
-qtb_add_test(catalog_file_test SOURCES service/catalog_file_test.cpp LIBRARIES qtb_platform_static)
+qtb_add_test(cores_test BRIEF SOURCES service/cores_test.cpp LIBRARIES qtb_static qtb_platform_fake)
+qtb_add_test(threads_test BRIEF SOURCES service/threads_test.cpp LIBRARIES qtb_static qtb_platform_fake)
+qtb_add_test(override_test BRIEF SOURCES service/override_test.cpp LIBRARIES qtb_static qtb_platform_fake)
+qtb_add_test(memory_test BRIEF SOURCES service/memory_test.cpp LIBRARIES qtb_static qtb_platform_fake)
+qtb_add_test(catalog_file_test BRIEF SOURCES service/catalog_file_test.cpp LIBRARIES qtb_platform_static)
 
 # On the real operating system: a program that is started under different circumstances, and an allocator library.
 function(add_service_facts name)
@@ -28,7 +28,7 @@ foreach(variant complete three_hooks null_hook)
   set_target_properties(qmalloc_${variant} PROPERTIES OUTPUT_NAME qmalloc
     LIBRARY_OUTPUT_DIRECTORY ${CMAKE_CURRENT_BINARY_DIR}/qmalloc/${variant})
 endforeach()
-qtb_add_test(linux_test SOURCES service/linux_test.cpp LIBRARIES qtb_static qtb_platform_static)
+qtb_add_test(linux_test BRIEF SOURCES service/linux_test.cpp LIBRARIES qtb_static qtb_platform_static)
 target_compile_definitions(linux_test PRIVATE QTB_TEST_FACTS="$<TARGET_FILE:service_facts>"
   QTB_TEST_FACTS_RPATH="$<TARGET_FILE:service_facts_rpath>"
   QTB_TEST_FACTS_RUNPATH="$<TARGET_FILE:service_facts_runpath>"

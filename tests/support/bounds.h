@@ -5,7 +5,9 @@
 // Where the gauge reaches a quarter of the overflow limit only the class (finite, infinite, NaN) is compared.
 #pragma once
 
+#include <bit>
 #include <cmath>
+#include <cstring>
 #include <limits>
 
 #include "blas/types.h"
@@ -55,26 +57,51 @@ double wide_error_ratio(R got, Quad want, Quad gauge, double c, double alpha_mag
   return static_cast<double>(error / bound);
 }
 
+// A number as two doubles: its leading 53 bits, and the 60 bits behind them, rounded. Cut out of the number as it is
+// stored, since its own arithmetic is procedures of the compiler; those do what is near the ends of a double's range.
+struct TwoDoubles {
+  double high, low;
+};
+inline TwoDoubles split(Quad v) {
+  unsigned __int128 bits;
+  static_assert(sizeof bits == sizeof v);
+  std::memcpy(&bits, &v, sizeof bits);
+  constexpr int bias = 16383, double_bias = 1023, low_bits = 60, fraction = 112, double_fraction = 52, most = 900;
+  const int exponent = static_cast<int>(static_cast<std::uint64_t>(bits >> fraction) & 0x7FFF) - bias;
+  if (exponent < -most || exponent > most) {
+    const double high = static_cast<double>(v);
+    return {high, static_cast<double>(v - Quad(high))};
+  }
+  const std::uint64_t sign = static_cast<std::uint64_t>(bits >> 127) << 63;
+  const auto power = [&](int e) { return sign | static_cast<std::uint64_t>(e + double_bias) << double_fraction; };
+  const std::uint64_t leading =
+      static_cast<std::uint64_t>(bits >> low_bits) & ((std::uint64_t{1} << double_fraction) - 1);
+  const std::int64_t rest =
+      static_cast<std::int64_t>(static_cast<std::uint64_t>(bits) & ((std::uint64_t{1} << low_bits) - 1));
+  return {std::bit_cast<double>(power(exponent) | leading),
+          static_cast<double>(rest) * std::bit_cast<double>(power(exponent - fraction))};
+}
+
 // The same, in doubles where these decide: neither near the ends of their range nor with a ratio near 1. The difference
 // of two doubles, less the part of the expected value beyond a double, is rounded by less than 2^-50 of itself.
-template <class R>
-double error_ratio(R got, Quad want, Quad gauge, double c, double alpha_magnitude = 1) {
+template <class R, class Gauge>
+double error_ratio(R got, Quad want, Gauge gauge, double c, double alpha_magnitude = 1) {
   constexpr double least = 0x1p-900, doubtful = 0x1p-40;
   constexpr double most = static_cast<double>(std::numeric_limits<R>::max()) / 8;
-  const double scale = static_cast<double>(gauge), high = static_cast<double>(want);
+  const auto [high, low] = split(want);
+  const double scale = static_cast<double>(gauge);
   if (scale >= least && scale <= most && std::fabs(high) <= most && std::isfinite(got)) {
-    const double low = static_cast<double>(want - Quad(high));
     const double error = std::fabs((static_cast<double>(got) - high) - low);
     constexpr double eta = std::numeric_limits<R>::denorm_min();
     const double ratio = error / (c * unit_roundoff<R> * scale + c * eta * (alpha_magnitude > 1 ? alpha_magnitude : 1));
     if (std::fabs(ratio - 1) > doubtful) return ratio;
   }
-  return wide_error_ratio(got, want, gauge, c, alpha_magnitude);
+  return wide_error_ratio(got, want, Quad(gauge), c, alpha_magnitude);
 }
 
 // The same for a result of any type: the larger ratio of its parts.
-template <class T>
-double error_ratio(T got, QuadComplex want, Quad gauge, double c, double alpha_magnitude = 1) {
+template <class T, class Gauge>
+double error_ratio(T got, QuadComplex want, Gauge gauge, double c, double alpha_magnitude = 1) {
   if constexpr (is_complex<T>)
     return std::fmax(error_ratio(got.re, want.re, gauge, c, alpha_magnitude),
                      error_ratio(got.im, want.im, gauge, c, alpha_magnitude));

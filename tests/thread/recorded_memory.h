@@ -6,7 +6,10 @@
 #pragma once
 
 #include <omp.h>
+#include <sys/mman.h>
+#include <unistd.h>
 
+#include <array>
 #include <atomic>
 #include <cstdint>
 #include <cstdlib>
@@ -47,7 +50,31 @@ inline RecordedMemory recorded_memory;
 inline std::mutex recorded_memory_mutex;
 
 constexpr std::size_t memory_mark = 64 * 1024, memory_page = 4096;
-constexpr unsigned char memory_mark_byte = 0x5A;
+inline const auto memory_mark_bytes = [] {
+  std::array<unsigned char, memory_mark> mark;
+  mark.fill(0x5A);
+  return mark;
+}();
+
+// Pages full of 0xFF, private ones: what a test does not touch of its large buffers costs nothing. They come from a
+// file without a name, which is as long as the largest request so far.
+inline unsigned char *map_nans(std::size_t bytes) {
+  static const int file = memfd_create("nans", 0);
+  static std::size_t length = 0;
+  static const std::vector<unsigned char> chunk(1024 * 1024, 0xFF);
+  while (length < bytes) {
+    const ssize_t written = write(file, chunk.data(), chunk.size());
+    if (written <= 0) std::abort();
+    length += static_cast<std::size_t>(written);
+  }
+  void *const pages = mmap(nullptr, bytes, PROT_READ | PROT_WRITE, MAP_PRIVATE, file, 0);
+  if (pages == MAP_FAILED) std::abort();
+  return static_cast<unsigned char *>(pages);
+}
+// The pages of a piece of memory, from the one that it begins in.
+inline std::size_t mapped_bytes(std::size_t distance, std::uint64_t size) {
+  return (distance % memory_page + size + memory_mark + memory_page - 1) / memory_page * memory_page;
+}
 
 inline void *recorded_malloc(std::uint64_t size, std::int32_t alignment) {
   const std::lock_guard lock(recorded_memory_mutex);
@@ -57,11 +84,8 @@ inline void *recorded_malloc(std::uint64_t size, std::int32_t alignment) {
   for (const MemoryRequest &earlier : memory.requests) of_thread += earlier.thread == thread;
   void *given = nullptr;
   if (!memory.fails || !memory.fails(static_cast<long>(memory.requests.size()), thread, of_thread)) {
-    const std::size_t bytes = memory.distance + size + memory_mark;
-    auto *const base = static_cast<unsigned char *>(
-        std::aligned_alloc(memory_page, (bytes + memory_page - 1) / memory_page * memory_page));
-    std::memset(base + memory.distance, 0xFF, size);
-    std::memset(base + memory.distance + size, memory_mark_byte, memory_mark);
+    unsigned char *const base = map_nans(mapped_bytes(memory.distance, size));
+    std::memcpy(base + memory.distance + size, memory_mark_bytes.data(), memory_mark);
     given = base + memory.distance;
     memory.held[given] = size;
   }
@@ -80,13 +104,10 @@ inline void recorded_free(void *pointer) {
     return;
   }
   const unsigned char *const end = static_cast<unsigned char *>(pointer) + held->second;
-  for (std::size_t i = 0; i < memory_mark; ++i)
-    if (end[i] != memory_mark_byte) {
-      ++memory.faults;
-      break;
-    }
+  if (std::memcmp(end, memory_mark_bytes.data(), memory_mark) != 0) ++memory.faults;
+  const std::size_t distance = reinterpret_cast<std::uintptr_t>(pointer) % memory_page;
+  munmap(static_cast<unsigned char *>(pointer) - distance, mapped_bytes(distance, held->second));
   memory.held.erase(held);
-  std::free(reinterpret_cast<void *>(reinterpret_cast<std::uintptr_t>(pointer) / memory_page * memory_page));
 }
 
 // For programs with the whole library on the fake system: puts this memory behind the memory service, ahead of its

@@ -7,12 +7,15 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <array>
+#include <functional>
 #include <string>
 #include <vector>
 
 #include "tests/kernels/level3/buffer_memory.h"
 #include "tests/kernels/level3/pieces.h"
+#include "tests/reference/sums.h"
 
 namespace qtb::test {
 namespace {
@@ -94,15 +97,21 @@ Numbers draw_integers(QtbInt rows, QtbInt cols) {
 
 Numbers product_of(const Numbers &a, const Numbers &b, bool complex) {
   Numbers c(a.rows, b.cols);
-  for (QtbInt j = 0; j < b.cols; j++)
-    for (QtbInt l = 0; l < a.cols; l++) {
-      const double re = b.re[b.at(l, j)], im = b.im[b.at(l, j)];
-      const std::size_t from = a.at(0, l), to = c.at(0, j);
-      for (std::size_t i = 0; i < static_cast<std::size_t>(a.rows); i++) {
-        c.re[to + i] += a.re[from + i] * re - a.im[from + i] * im;
-        if (complex) c.im[to + i] += a.re[from + i] * im + a.im[from + i] * re;
-      }
-    }
+  const std::size_t rows = static_cast<std::size_t>(a.rows), columns = static_cast<std::size_t>(a.cols);
+  const auto add = [&](const std::vector<double> &from, const double *by, double *to) {
+    reference::add_columns(rows, columns, from.data(), by, to);
+  };
+  std::vector<double> negative(columns);
+  for (QtbInt j = 0; j < b.cols; j++) {
+    const double *const b_re = b.re.data() + b.at(0, j), *const b_im = b.im.data() + b.at(0, j);
+    double *const c_re = c.re.data() + c.at(0, j), *const c_im = c.im.data() + c.at(0, j);
+    add(a.re, b_re, c_re);
+    if (!complex) continue;
+    std::transform(b_im, b_im + columns, negative.begin(), std::negate<>());
+    add(a.im, negative.data(), c_re);
+    add(a.re, b_im, c_im);
+    add(a.im, b_re, c_im);
+  }
   return c;
 }
 

@@ -148,12 +148,12 @@ class Session {
     if constexpr (is_complex<T>)
       if (want.outcome == Outcome::real_value && got.im != 0) return wrong;
     if (want.outcome == Outcome::residual)
-      return test::error_ratio(T{}, want.value, Quad(want.gauge), e.roundings, e.alpha_magnitude);
+      return test::error_ratio(T{}, want.value, want.gauge, e.roundings, e.alpha_magnitude);
     if (exact()) {
       const QuadComplex g = test::widen(got);
       return g.re == want.value.re && g.im == want.value.im ? 0 : wrong;
     }
-    return test::error_ratio(got, want.value, Quad(want.gauge), e.roundings, e.alpha_magnitude);
+    return test::error_ratio(got, want.value, want.gauge, e.roundings, e.alpha_magnitude);
   }
 
   template <class F>

@@ -403,7 +403,7 @@ TEST_P(Level2Drivers, InsideTheCallersRegionEachCallIsTheSlots) {
   EXPECT_EQ(stand_ins.calls.size(), 15U);
 }
 
-// level2_small_team_test allows five threads: all that ask for more are cut by the team that comes.
+// The run small_team allows five threads: all that ask for more are cut by the team that comes.
 TEST_P(Level2Drivers, ATeamSmallerThanAskedForIsTheOneThatIsCutFor) {
   const QtbInt n = 80, inc = 1;
   const char trans = 'N';

@@ -4,6 +4,7 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <random>
 #include <string>
 #include <vector>
@@ -11,6 +12,7 @@
 #include "blas/shapes.h"
 #include "blas/thread/drivers.h"
 #include "tests/reference/level3.h"
+#include "tests/reference/sums.h"
 #include "tests/support/guarded.h"
 #include "tests/support/placed.h"
 
@@ -111,33 +113,31 @@ class GemmProblem {
 
   std::vector<T> exact_product() const {
     const auto m = static_cast<std::size_t>(shape.m), k = static_cast<std::size_t>(shape.k);
-    std::vector<Real<T>> a_re(m * k), a_im(is_complex<T> ? m * k : 0), re(m), im(m);
+    using R = Real<T>;
+    std::vector<R> a_re(m * k), a_im(is_complex<T> ? m * k : 0), y_re(k), y_im(is_complex<T> ? k : 0), re(m), im(m);
     std::vector<T> product;
     product.reserve(m * static_cast<std::size_t>(shape.n));
     for (std::size_t l = 0; l < k; ++l)
       for (std::size_t i = 0; i < m; ++i)
         put(operand(shape.transa, a, lda, static_cast<QtbInt>(i), static_cast<QtbInt>(l)), a_re, a_im, i + l * m);
+    const bool adds = !reference::is_value(widen(beta), 0);
     for (QtbInt j = 0; j < shape.n; ++j) {
-      std::fill(re.begin(), re.end(), Real<T>(0));
-      std::fill(im.begin(), im.end(), Real<T>(0));
-      for (std::size_t l = 0; l < k; ++l) {
-        const T y = operand(shape.transb, b, ldb, static_cast<QtbInt>(l), j);
-        if constexpr (is_complex<T>) {
-          for (std::size_t i = 0; i < m; ++i) re[i] += a_re[i + l * m] * y.re - a_im[i + l * m] * y.im;
-          for (std::size_t i = 0; i < m; ++i) im[i] += a_re[i + l * m] * y.im + a_im[i + l * m] * y.re;
-        } else {
-          for (std::size_t i = 0; i < m; ++i) re[i] += a_re[i + l * m] * y;
-        }
+      for (std::size_t l = 0; l < k; ++l) put(operand(shape.transb, b, ldb, static_cast<QtbInt>(l), j), y_re, y_im, l);
+      std::fill(re.begin(), re.end(), R(0));
+      reference::add_columns(m, k, a_re.data(), y_re.data(), re.data());
+      if constexpr (is_complex<T>) {
+        std::fill(im.begin(), im.end(), R(0));
+        reference::add_columns(m, k, a_re.data(), y_im.data(), im.data());
+        reference::add_columns(m, k, a_im.data(), y_re.data(), im.data());
+        for (R &y : y_im) y = -y;
+        reference::add_columns(m, k, a_im.data(), y_im.data(), re.data());
       }
+      const T *const old = before.data() + j * ldc;
       for (std::size_t i = 0; i < m; ++i) {
-        const std::size_t at = i + static_cast<std::size_t>(j * ldc);
-        if constexpr (is_complex<T>) {
-          const T x = {re[i], im[i]};
-          const T scaled = reference::is_value(widen(beta), 0) ? number<T>(0) : times(beta, before[at]);
-          product.push_back(plus(times(alpha, x), scaled));
-        } else {
-          product.push_back(alpha * re[i] + (beta == 0 ? 0 : beta * before[at]));
-        }
+        if constexpr (is_complex<T>)
+          product.push_back(plus(times(alpha, T{re[i], im[i]}), adds ? times(beta, old[i]) : number<T>(0)));
+        else
+          product.push_back(alpha * re[i] + (adds ? beta * old[i] : 0));
       }
     }
     return product;
@@ -173,21 +173,27 @@ class GemmProblem {
     std::uniform_real_distribution<double> part(-1, 1);
     std::uniform_int_distribution<int> whole(-4, 4);
     const auto draw = [&] { return shape.whole_numbers ? whole(random) : part(random); };
-    for (std::size_t i = 0; i < array.size(); ++i) {
-      if (is_read && static_cast<QtbInt>(i) % ld < rows) {
-        const double re = draw();
-        array[i] = number<T>(re, is_complex<T> ? draw() : 0);
-      } else {
-        store_signalling_nan<T>(array.data() + i);
+    const std::size_t column = static_cast<std::size_t>(ld), read = is_read ? static_cast<std::size_t>(rows) : 0;
+    for (std::size_t j = 0; j < array.size(); j += column) {
+      const std::size_t end = std::min(column, array.size() - j);
+      for (std::size_t i = 0; i < end; ++i) {
+        if (i < read) {
+          const double re = draw();
+          array[j + i] = number<T>(re, is_complex<T> ? draw() : 0);
+        } else {
+          store_signalling_nan<T>(array.data() + j + i);
+        }
       }
     }
   }
   void expect_spare_rows() {
-    for (std::size_t i = 0; i < c.size(); ++i)
-      if (static_cast<QtbInt>(i) % ldc >= shape.m && !same_bits(c[i], before[i])) {
-        ADD_FAILURE() << text_of(shape) << ": a spare row of C was written";
-        return;
-      }
+    const auto m = static_cast<std::size_t>(shape.m), column = static_cast<std::size_t>(ldc);
+    for (std::size_t j = 0; j < c.size(); j += column)
+      for (std::size_t i = j + m; i < std::min(j + column, c.size()); ++i)
+        if (!same_bits(c[i], before[i])) {
+          ADD_FAILURE() << text_of(shape) << ": a spare row of C was written";
+          return;
+        }
   }
 };
 

@@ -1,6 +1,7 @@
 // The strategy and plan that a GEMM's team takes: points to be read beside the rules, a sweep over teams, classes and
 // extents against a second transcription of them, and that a plan depends on nothing but what it is for.
 
+#include <algorithm>
 #include <cstdlib>
 #include <set>
 #include <tuple>
@@ -128,11 +129,14 @@ unsigned tiers_of(int machine_class) {
 
 // Positive numbers one below, at and one above each limit, without repetition.
 std::vector<Int> around(const std::vector<Int> &limits) {
-  std::set<Int> all;
+  std::vector<Int> all;
+  all.reserve(3 * limits.size());
   for (const Int limit : limits)
     for (const Int v : {limit - 1, limit, limit + 1})
-      if (v > 0) all.insert(v);
-  return {all.begin(), all.end()};
+      if (v > 0) all.push_back(v);
+  std::sort(all.begin(), all.end());
+  all.erase(std::unique(all.begin(), all.end()), all.end());
+  return all;
 }
 
 // Every number that a rule compares an extent with, and some beyond.

@@ -2,7 +2,7 @@
 // out on the result, of which each element has to be covered once, from the right rows and columns of the operands. The
 // matrices are addresses that nothing touches.
 //
-// level3_small_team_test allows five threads: the drivers then cut for the team that comes.
+// The run small_team allows five threads: the drivers then cut for the team that comes.
 
 #include <xmmintrin.h>
 
