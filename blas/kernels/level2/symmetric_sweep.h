@@ -126,6 +126,7 @@ struct MirroredRows {
   // column after another, lane for lane; the lowest lanes of the sums stand side by side and take one row after
   // another.
   static constexpr bool takes_blocks = count == 4 && !is_complex<T> && !requires { y.inc; };
+  static constexpr int own_vectors = takes_blocks ? count / lanes<T> : 1;  // of the group's own rows
   [[gnu::always_inline]] QtbInt blocks(QtbInt rows) {
     if (rows < lanes<T>) return rows;
     Vec<T> lowest[count / lanes<T>];
@@ -184,21 +185,22 @@ struct MirroredRows {
   template <bool upper>
   [[gnu::always_inline]] void triangle() {
     repeat<count>([&](auto p) __attribute__((always_inline)) {
-      single<upper ? p.value + 1 : 0, upper ? count : p.value, p.value>();
+      constexpr int begin = upper ? p.value + 1 : 0, end = upper ? count : p.value;
+      single<begin, end, p.value>();
     });
   }
   // The same, with the group's own elements of y in vectors, and not stored yet: what loads four elements at once waits
   // long for four stores.
   template <bool upper>
-  [[gnu::always_inline]] void triangle(Vec<T> (&own)[count / lanes<T>]) {
+  [[gnu::always_inline]] void triangle(Vec<T> (&own)[own_vectors]) {
     Vec<T> of_y[count];
     repeat<count>([&](auto p) __attribute__((always_inline)) {
-      of_y[p.value] = row_of_y < upper ? p.value + 1 : 0, upper ? count : p.value, p.value > ();
+      constexpr int begin = upper ? p.value + 1 : 0, end = upper ? count : p.value;
+      of_y[p.value] = row_of_y<begin, end, p.value>();
       advance(1);
     });
-    repeat<count / lanes<T>>([&](auto k) __attribute__((always_inline)) {
-      own[k.value] = lowest_of(of_y + k.value * lanes<T>);
-    });
+    repeat<own_vectors>([&](auto k)
+                            __attribute__((always_inline)) { own[k.value] = lowest_of(of_y + k.value * lanes<T>); });
   }
 
  private:
@@ -246,11 +248,11 @@ template <bool upper, int count, class X, class Y, class T>
   using Walk = MirroredRows<T, count, X, Y>;
   Walk walk{factor, AnyColumns<T, count>(columns), x, y, ColumnFactors<T, count>(factor), {}};
   if constexpr (Walk::takes_blocks) {
-    Vec<T> own[count / lanes<T>];
+    Vec<T> own[Walk::own_vectors];
     if constexpr (upper) walk.rectangle(rows);
     walk.template triangle<upper>(own);
     if constexpr (!upper) walk.rectangle(rows);
-    repeat<count / lanes<T>>([&](auto k) __attribute__((always_inline)) {
+    repeat<Walk::own_vectors>([&](auto k) __attribute__((always_inline)) {
       constexpr int at = k.value * lanes<T>;
       const Vec<T> totals = sum_lanes_of(walk.sums.sum + at);
       store_unaligned(y.p + to_triangle + at, add(own[k.value], mul(broadcast(alpha), totals)));
