@@ -42,9 +42,19 @@ class Sweeps {
   void small_stack() const {
     // The routines that keep a tile on the stack say so; the others work on any thread.
     const std::string name = routine_.name();
-    const bool tile =
-        name.find("syr2k") == 1 || name.find("her2k") == 1 || name.find("syrk") == 1 || name.find("herk") == 1;
-    sweep(times(8), Values::rounding, {0, (tile ? std::size_t{256} : std::size_t{64}) * 1024}, 500000);
+    const bool two_factors = name.find("syr2k") == 1 || name.find("her2k") == 1;
+    const bool tile = two_factors || name.find("syrk") == 1 || name.find("herk") == 1;
+    const bool large_tile = two_factors && name[0] == 'z';
+    const std::size_t stack = (large_tile ? std::size_t{384} : tile ? std::size_t{256} : std::size_t{64}) * 1024;
+    sweep(times(8), Values::rounding, {0, stack}, 500000);
+    // Beyond every tile.
+    Session session(routine_.name(), {0, stack});
+    for (int number = 0; number < times(2); ++number) {
+      Problem p = draw_problem(seed_of(routine_.name(), 600000 + number), Values::rounding);
+      p.m = p.n = 140 + number;
+      p.k = 9;
+      if (!try_one(p, session)) return;
+    }
   }
 
  private:
