@@ -7,7 +7,7 @@ info=$build/tools/qtb-info
 work=$(mktemp -d)
 trap 'rm -rf "$work"' EXIT
 cd "$work"
-unset QTB_DEBUG_CPU_TYPE QTB_NUM_THREADS QTB_DOMAIN_NUM_THREADS QTB_DYNAMIC OMP_NUM_THREADS
+unset QTB_DEBUG_CPU_TYPE QTB_TIER QTB_NUM_THREADS QTB_DOMAIN_NUM_THREADS QTB_DYNAMIC OMP_NUM_THREADS
 
 # expect pattern: fails unless a line of the output is such.
 expect() { grep -qE -e "$1" output || { echo "no line $1 in" && cat output && exit 1; }; }
@@ -21,8 +21,17 @@ expect "^  a call takes +[0-9]+ at most: "
 expect "^  order 1000 +[0-9]+ buffers, [0-9.]+ MiB$"
 
 QTB_DEBUG_CPU_TYPE=1 "$info" > output
-expect "^  libqtb.so +sse3: as the variable asks"
-expect "^  companions +sse3: as the variable asks"
+expect "^  libqtb.so +sse3: as QTB_DEBUG_CPU_TYPE asks"
+expect "^  companions +sse3: as QTB_DEBUG_CPU_TYPE asks"
+QTB_TIER=def "$info" > output
+expect "^  libqtb.so +def: as QTB_TIER asks"
+QTB_TIER=native "$info" > output
+expect "^  libqtb.so +(def|sse3|ssse3|sse42|avx): as QTB_TIER asks"
+QTB_TIER=sse3 QTB_DEBUG_CPU_TYPE=0 "$info" > output
+expect "^  libqtb.so +def: as QTB_DEBUG_CPU_TYPE asks"
+QTB_TIER=nonsense "$info" > output
+expect "^QTB WARNING: QTB_TIER=nonsense is no tier of this library\.$"
+expect "^  libqtb.so +(def|sse3|ssse3|sse42|avx): the "
 QTB_DEBUG_CPU_TYPE=nonsense "$info" > output
 expect "^  libqtb.so +(def|sse3|ssse3|sse42|avx): the "
 QTB_DYNAMIC=FALSE QTB_NUM_THREADS=7 "$info" > output

@@ -48,14 +48,24 @@ std::vector<TierRow> tier_rows() {
 #undef QTB_INFO_TIER
 }
 
-// The number that QTB_DEBUG_CPU_TYPE forces, or -1. The services decide the same way: here it is said why.
-const char *asked_tier() {
-  const char *const text = std::getenv("QTB_DEBUG_CPU_TYPE");
-  return text != nullptr && *text != '\0' ? text : nullptr;
+// An environment variable as the services read it, "" where it is absent.
+std::string variable(const char *name) {
+  const char *const text = std::getenv(name);
+  return text != nullptr ? text : "";
+}
+void print_variable(const char *name) {
+  if (const std::string value = variable(name); !value.empty()) std::printf("  %s=%s\n", name, value.c_str());
+}
+
+// The variable that decided the tier, "" if none did. The services decide the same way: here it is said why.
+std::string deciding_variable(const std::string &tier) {
+  const std::string number = variable("QTB_DEBUG_CPU_TYPE"), name = variable("QTB_TIER");
+  const int value = std::atoi(number.c_str());
+  if (number == "0" || (value > 0 && value <= largest_asked_tier)) return "QTB_DEBUG_CPU_TYPE";
+  return name == "native" || name == tier ? "QTB_TIER" : "";
 }
 
 void print_tiers() {
-  const char *const asked = asked_tier();
   const int best = qtb_serv_cpu_detect();
   int by_rules = tier_def;
   const std::vector<TierRow> rows = tier_rows();
@@ -71,16 +81,13 @@ void print_tiers() {
 
   std::printf("\ntier\n");
   const char *const best_name = rows[static_cast<std::size_t>(best)].name;
-  if (asked != nullptr) std::printf("  QTB_DEBUG_CPU_TYPE=%s\n", asked);
+  for (const char *name : {"QTB_DEBUG_CPU_TYPE", "QTB_TIER"}) print_variable(name);
+  const std::string decides = deciding_variable(best_name), as_asked = "as " + decides + " asks";
   std::printf("  companions    %s: %s\n", best_name,
-              asked != nullptr ? "as the variable asks, or the best of the processor if it names no tier"
-                               : "the highest whose instructions the processor and the system have");
-  // Without the variable, or with one that names no tier, the rules of the product hold.
-  const int number = asked != nullptr ? std::atoi(asked) : -1;
-  const bool forced =
-      asked != nullptr && ((number > 0 && number <= largest_asked_tier) || std::strcmp(asked, "0") == 0);
-  std::printf("  libqtb.so     %s: %s\n", forced ? best_name : rows[static_cast<std::size_t>(by_rules)].name,
-              forced                    ? "as the variable asks"
+              !decides.empty() ? as_asked.c_str() : "the highest whose instructions the processor and the system have");
+  // Where no variable decides, the rules of the product hold.
+  std::printf("  libqtb.so     %s: %s\n", !decides.empty() ? best_name : rows[static_cast<std::size_t>(by_rules)].name,
+              !decides.empty()          ? as_asked.c_str()
               : qtb_serv_cpu_is_belmo() ? "the highest that is taken unasked and that the processor has"
                                         : "the one for every processor, since the vendor is another");
 }
@@ -102,11 +109,6 @@ int count(const ProcessorSet &set) {
   int sum = 0;
   for (const std::uint64_t word : set.words) sum += std::popcount(word);
   return sum;
-}
-
-void print_variable(const char *name) {
-  const char *const value = std::getenv(name);
-  if (value != nullptr && *value != '\0') std::printf("  %s=%s\n", name, value);
 }
 
 const char *reason(const ThreadSettings &s, int threads, bool has_all) {
