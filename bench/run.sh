@@ -21,7 +21,7 @@
 #   BENCH_LONG             with any value, square products of sizes 2000 and 4000 too, and Level 2 with every option at
 #                          every size
 #   BENCH_QUICK            with any value, Level 2 and Level 3 at few sizes with few options, in about a minute and a
-#                          half a tier and in four
+#                          half a tier and in six
 #   BENCH_FILTER           regular expression of the Level-1 cases (default: all)
 #   BENCH_MIN_TIME         seconds per Level-1 case (default 0.005)
 #   PEER                   path of another BLAS shared library to compare with; PEER2 and PEER3 more of them
