@@ -20,12 +20,6 @@ set(qtb_asan -fsanitize=address,undefined -fno-sanitize=vptr,alignment,null,obje
 # Kernels are straight-line code of thousands of accesses, each watched by a call in place of a test of its own.
 set(QTB_INSTRUMENT_KERNELS "")
 
-# Without it the run path to clang's OpenMP runtime is padded with an empty entry, which stands for the working
-# directory: the library then loads no allocator.
-if(QTB_INSTRUMENT)
-  set(CMAKE_NO_BUILTIN_CHRPATH ON)
-endif()
-
 # Tells the sources that every load and store is watched.
 if(QTB_INSTRUMENT MATCHES "^(asan|tsan|fuzz)$")
   add_compile_definitions(QTB_WATCHED)
