@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <atomic>
 
+#include "blas/tier_names.h"
 #include "service/cpu.h"
 #include "service/threads.h"
 
@@ -40,9 +41,4 @@ int qtb_get_num_threads() { return qtb_serv_get_max_threads(domain_blas); }
 void blas_set_num_threads(int threads) { ask_of_all(threads); }
 int blas_get_num_threads() { return qtb_serv_get_max_threads(domain_blas); }
 
-const char *qtb_get_tier() {
-#define QTB_TIER_TEXT(tier, TIER) #tier,
-  static constexpr const char *names[tier_count] = {QTB_FOR_EACH_TIER(QTB_TIER_TEXT)};
-#undef QTB_TIER_TEXT
-  return names[qtb_serv_cpu_detect()];
-}
+const char *qtb_get_tier() { return qtb::tier_names[qtb_serv_cpu_detect()]; }

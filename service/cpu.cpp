@@ -9,6 +9,7 @@
 #include <cstdlib>
 #include <cstring>
 
+#include "blas/tier_names.h"
 #include "service/cpuid.h"
 #include "service/messages.h"
 #include "service/platform/platform.h"
@@ -35,11 +36,10 @@ int qtb_serv_cpu_has_baseline() { return 1; }
 
 enum Taken { by_itself, if_asked };
 struct TierTest {
-  const char *name;
   int (*passes)();
   Taken taken;
 };
-#define QTB_TIER_TEST(tier, TIER, flags, processor, taken, ...) {#tier, qtb_serv_cpu_has_##processor, taken},
+#define QTB_TIER_TEST(tier, TIER, flags, processor, taken, ...) {qtb_serv_cpu_has_##processor, taken},
 constexpr TierTest tier_tests[tier_count] = {QTB_TIER_ROWS(QTB_TIER_TEST)};
 #undef QTB_TIER_TEST
 
@@ -80,7 +80,7 @@ std::int32_t named_tier() {
   if (length < sizeof text) {
     if (std::strcmp(text, "native") == 0) return native_tier();
     for (std::int32_t tier = 0; tier < tier_count; ++tier) {
-      if (std::strcmp(text, tier_tests[tier].name) != 0) continue;
+      if (std::strcmp(text, qtb::tier_names[tier]) != 0) continue;
       if (can_run(tier)) return tier;
       why = message_tier_lacking;
     }

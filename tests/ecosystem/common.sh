@@ -49,6 +49,15 @@ run() {
   fi
 }
 
+# tally side: what a program of ours printed in the last run, a line "failed NAME" for each failure and one "count N".
+tally() {
+  if [ "$status" != 0 ] || ! grep -q '^count ' printed; then
+    cat printed && exit 1
+  fi
+  sed -n 's/^failed //p' printed > "$1".failed
+  sed -n 's/^count //p' printed > "$1".count
+}
+
 # repeat n text: n lines, so that a list of failures grows with their number.
 repeat() {
   awk -v n="$1" -v text="$2" 'BEGIN { for (i = 1; i <= n; ++i) printf "%s, failure %d\n", text, i }'

@@ -9,10 +9,6 @@ for side in ours reference; do
   R_LD_LIBRARY_PATH=$work/$side:/usr/lib/R/lib
   export R_LD_LIBRARY_PATH
   run $side Rscript --vanilla products.R
-  if [ "$status" != 0 ] || ! grep -q '^count ' printed; then
-    cat printed && exit 1
-  fi
-  sed -n 's/^failed //p' printed > "$side".failed
-  sed -n 's/^count //p' printed > "$side".count
+  tally $side
 done
 verdict "R"

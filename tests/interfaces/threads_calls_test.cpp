@@ -17,13 +17,7 @@ using Environment = std::map<std::string, std::string>;
 template <class Body>
 void on_eight_cores(const Environment &environment, Body body) {
   in_child([&] {
-    fake.processors.assign(8, {});
-    for (std::uint32_t p = 0; p < 8; ++p) {
-      fake.processors[p].vendor = "AuthenticAMD";
-      fake.processors[p].identifier = p;
-    }
-    insert_processors(&fake.online, 0, 7);
-    fake.process = fake.online;
+    set_cores(8);
     fake.environment = environment;
     omp_set_num_threads(8);
     body();

@@ -24,6 +24,16 @@ void insert_processors(ProcessorSet *set, int first, int last) {
   for (int p = first; p <= last; ++p) set->insert(p);
 }
 
+void set_cores(int count) {
+  fake.processors.assign(static_cast<std::size_t>(count), {});
+  for (std::uint32_t p = 0; p < fake.processors.size(); ++p) {
+    fake.processors[p].vendor = "AuthenticAMD";
+    fake.processors[p].identifier = p;
+  }
+  insert_processors(&fake.online, 0, count - 1);
+  fake.process = fake.online;
+}
+
 }  // namespace qtb::test
 
 using namespace qtb::test;

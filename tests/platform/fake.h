@@ -38,6 +38,9 @@ CpuidRegisters fake_cache(std::uint32_t type, std::uint32_t line_size, std::uint
 // The processors first to last, both included, added to a set.
 void insert_processors(ProcessorSet *set, int first, int last);
 
+// Makes the machine one of so many cores, of one thread each, all of which the process may use.
+void set_cores(int count);
+
 struct FakeSystem {
   std::map<std::string, std::string> environment;
   std::vector<std::string> environment_reads;  // the names asked for, in order

@@ -24,13 +24,7 @@ namespace {
 void expect_threads(int threads, const ThreadSettings &settings) {
   in_child([&] {
     given = settings;
-    fake.processors.assign(8, {});
-    for (std::uint32_t p = 0; p < 8; ++p) {
-      fake.processors[p].vendor = "AuthenticAMD";
-      fake.processors[p].identifier = p;
-    }
-    insert_processors(&fake.online, 0, 7);
-    fake.process = fake.online;
+    set_cores(8);
     omp_set_num_threads(6);
     EXPECT_EQ(qtb_serv_get_max_threads(domain_blas), threads);
   });

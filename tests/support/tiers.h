@@ -2,15 +2,11 @@
 #pragma once
 
 #include "blas/dispatch/slots.h"
+#include "blas/tier_names.h"
 
 namespace qtb::test {
 
-inline const char *tier_name(int tier) {
-#define QTB_TIER_TEXT(name, NAME) #name,
-  static const char *const names[] = {QTB_FOR_EACH_TIER(QTB_TIER_TEXT)};
-#undef QTB_TIER_TEXT
-  return names[tier];
-}
+inline const char *tier_name(int tier) { return tier_names[tier]; }
 
 // Whether this processor has the instructions of a tier, whatever its vendor: the compiler's own test for each word of
 // the list of tiers.

@@ -11,6 +11,7 @@
 #include <vector>
 
 #include "blas/dispatch/slots.h"
+#include "blas/tier_names.h"
 #include "service/cache.h"
 #include "service/cpu.h"
 #include "service/cpuid.h"
@@ -37,13 +38,13 @@ std::string vendor() {
 }
 
 struct TierRow {
-  const char *name, *bit;
+  const char *bit;
   bool has, by_itself;
 };
 std::vector<TierRow> tier_rows() {
   constexpr auto qtb_serv_cpu_has_baseline = [] { return 1; };
 #define QTB_INFO_TIER(tier, TIER, flags, processor, taken, ...) \
-  {#tier, #processor, qtb_serv_cpu_has_##processor() != 0, std::strcmp(#taken, "by_itself") == 0},
+  {#processor, qtb_serv_cpu_has_##processor() != 0, std::strcmp(#taken, "by_itself") == 0},
   return {QTB_TIER_ROWS(QTB_INFO_TIER)};
 #undef QTB_INFO_TIER
 }
@@ -80,13 +81,13 @@ void print_tiers() {
               extended && (platform_saved_state() & 6) == 6 ? "16 and 32 bytes" : "16 bytes");
 
   std::printf("\ntier\n");
-  const char *const best_name = rows[static_cast<std::size_t>(best)].name;
+  const char *const best_name = tier_names[best];
   for (const char *name : {"QTB_DEBUG_CPU_TYPE", "QTB_TIER"}) print_variable(name);
   const std::string decides = deciding_variable(best_name), as_asked = "as " + decides + " asks";
   std::printf("  companions    %s: %s\n", best_name,
               !decides.empty() ? as_asked.c_str() : "the highest whose instructions the processor and the system have");
   // Where no variable decides, the rules of the product hold.
-  std::printf("  libqtb.so     %s: %s\n", !decides.empty() ? best_name : rows[static_cast<std::size_t>(by_rules)].name,
+  std::printf("  libqtb.so     %s: %s\n", !decides.empty() ? best_name : tier_names[by_rules],
               !decides.empty()          ? as_asked.c_str()
               : qtb_serv_cpu_is_belmo() ? "the highest that is taken unasked and that the processor has"
                                         : "the one for every processor, since the vendor is another");

@@ -1,6 +1,7 @@
 // A traced call: the routine of the library behind this one, timed.
 #pragma once
 
+#include "include/qtb/cblas.h"
 #include "tools/trace/record.h"
 
 namespace qtb::trace {
@@ -53,15 +54,15 @@ struct Reader {
   requires std::is_enum_v<Option>
   static char letter(Option option) {
     switch (static_cast<int>(option)) {
-      case 111:  // CblasNoTrans, CblasNonUnit
-      case 131: return 'N';
-      case 112: return 'T';
-      case 113: return 'C';
-      case 121:  // CblasUpper, CblasUnit
-      case 132: return 'U';
-      case 122:  // CblasLower, CblasLeft
-      case 141: return 'L';
-      case 142: return 'R';
+      case CblasNoTrans:
+      case CblasNonUnit: return 'N';
+      case CblasTrans: return 'T';
+      case CblasConjTrans: return 'C';
+      case CblasUpper:
+      case CblasUnit: return 'U';
+      case CblasLower:
+      case CblasLeft: return 'L';
+      case CblasRight: return 'R';
       default: return '?';
     }
   }
